@@ -1,0 +1,104 @@
+// Base: Part 3.3's section base class, the array rewrites under ArrayLock and lookUpECNO:.
+#include "LogGenerator/Base.h"
+
+#include "LogGenerator/ArrayLock.h"
+#include "Platform/ProgrammingError.h"
+#include "Platform/SystemLog.h"
+#include "PropertyList/Array.h"
+#include "PropertyList/Dictionary.h"
+
+namespace vantorel {
+
+Base::Base() = default;
+Base::~Base() = default;
+
+Base* Base::initWithDict(ClassDictionary& classDict, CodeDictionary& codeDict) {
+    classDict[getSectionName()] = this;
+    updateLogCodeDict(codeDict);
+    return this;
+}
+
+std::string Base::getSectionName() const {
+    ProgrammingError::unrecognisedOperation("Base", "getSectionName", this);
+}
+
+std::vector<int32_t> Base::getLogCodeArray() const {
+    ProgrammingError::unrecognisedOperation("Base", "getLogCodeArray", this);
+}
+
+void Base::updateWithData(ByteView, int32_t) {
+    ProgrammingError::unrecognisedOperation("Base", "updateWithData:logCode:", this);
+}
+
+void Base::updateSectionRef(const Value& container) {
+    dictionaryRef_ = container.asDictionary();
+    arrayRef_ = container.asArray();
+    SystemLog::log(SystemLog::kWarning, "%s", getSectionName().c_str());
+}
+
+void Base::updateLogCodeDict(CodeDictionary& codeDict) {
+    const std::vector<int32_t> codes = getLogCodeArray();
+    SystemLog::log(SystemLog::kWarning, "Array Count: %d", static_cast<int>(codes.size()));
+    for (int32_t code : codes) codeDict.add(std::to_string(code)).push_back(this);
+}
+
+void Base::clearElementsInArray(Array& array) {
+    ArrayLock::lockArray();
+    array.clear();
+    ArrayLock::unlockArray();
+}
+
+void Base::replaceArray(Array& array, const Array& With) {
+    ArrayLock::lockArray();
+    // Copy first: the source may be the array itself.
+    std::vector<Value> items(With.begin(), With.end());
+    array.clear();
+    for (auto& v : items) array.append(std::move(v));
+    ArrayLock::unlockArray();
+}
+
+int32_t Base::lookUpECNO(uint32_t value) {
+    if (value >= 524288) return 0;  // any of bits 19 to 31 set
+    if (value >= 417648) return -1;
+    // Lower bounds (inclusive), scanning downward; irregular spacing kept as listed.
+    static const uint32_t kBounds[] = {331809, 263625, 209464, 166442, 132269, 105124, 83563, 66436,
+                                       52831,  42024,  33441,  26622,  21206,  16904,  13487, 10772,
+                                       8616,   6903,   5543,   4462,   3604,   2922,   2241,  1950,
+                                       1608,   1337,   1121,   950,    814,    706};
+    int32_t db = -2;
+    for (uint32_t bound : kBounds) {
+        if (value >= bound) return db;
+        --db;
+    }
+    return 0;  // 705 and below: 0, not -32
+}
+
+DictionaryRef Base::sectionDictionary() const { return dictionaryRef_.lock(); }
+ArrayRef Base::sectionArray() const { return arrayRef_.lock(); }
+
+void Base::setValue(const std::string& key, const std::string& text) const {
+    if (auto d = sectionDictionary()) d->set(key, Value(text));
+}
+
+void Base::clearSectionArray() const {
+    if (auto a = sectionArray()) clearElementsInArray(*a);
+}
+
+void Base::replaceSectionArray(const Array& with) const {
+    if (auto a = sectionArray()) replaceArray(*a, with);
+}
+
+const char* Base::tableText(const char* const* table, size_t count, unsigned value, const char* fallback) {
+    if (value >= count || table[value] == nullptr) return fallback;
+    return table[value];
+}
+
+PropertyListResult Base::parseExtraPayload(ByteView record) {
+    return PropertyListSerialization::read(record.size() > 13 ? record.subspan(13) : ByteView());
+}
+
+void Base::logUnknownCode(int32_t logCode) {
+    SystemLog::log(SystemLog::kError, "Received an unknown log message: %d", logCode);
+}
+
+}  // namespace vantorel

@@ -1,0 +1,98 @@
+// LogGenerator: Part 3.1's abstract decoder, history and decoder choice.
+#include "LogGenerator/LogGenerator.h"
+
+#include "LogGenerator/UTRAN/UTRANLogGenerator.h"
+#include "Platform/DateDescription.h"
+#include "Platform/ProgrammingError.h"
+#include "Platform/StringFormat.h"
+#include "Platform/SystemLog.h"
+#include "Platform/TelephonyIdentifiers.h"
+#include "PropertyList/Array.h"
+#include "PropertyList/Dictionary.h"
+
+namespace vantorel {
+
+LogGenerator::LogGenerator() {
+    SystemLog::log(SystemLog::kWarning, "Creating Log object: %p", static_cast<void*>(this));
+}
+
+LogGenerator::~LogGenerator() = default;
+
+void LogGenerator::updateState(Dictionary&, ByteView) {
+    ProgrammingError::unrecognisedOperation("LogGenerator", "updateState:withData:", this);
+}
+
+DictionaryRef LogGenerator::generateLogUsingState(Dictionary&) {
+    ProgrammingError::unrecognisedOperation("LogGenerator", "generateLogUsingState:", this);
+}
+
+DictionaryRef LogGenerator::getStartCommand() {
+    ProgrammingError::unrecognisedOperation("LogGenerator", "getStartCommand", this);
+}
+
+Value LogGenerator::getSaveContentsFromState(Dictionary&) {
+    ProgrammingError::unrecognisedOperation("LogGenerator", "getSaveContentsFromState:", this);
+}
+
+void LogGenerator::updateHistoryInState(Dictionary& state) {
+    ArrayRef history = state.get("History").asArray();
+    if (history) {
+        if (history->size() >= 5) history->removeRange(0, history->size() - 4);
+    } else {
+        history = Array::create();
+        state.set("History", Value(history));
+    }
+
+    // The entry is built from these pairs in order and stops at the first absent
+    // value (kept as the spec states it: no "DisplayState" gives an empty entry).
+    auto entry = Dictionary::create();
+    const std::string date = DateDescription::now();
+    const std::string description = StringFormat::format("Snapshot (%s)", DateDescription::now().c_str());
+    const std::pair<const char*, Value> pairs[] = {
+        {"DisplayState", state.get("DisplayState").deepCopy()},
+        {"Display", state.get("Display").deepCopy()},
+        {"ExtraInfo", state.get("ExtraInfo").deepCopy()},
+        {"Date", Value(date)},
+        {"Description", Value(description)},
+    };
+    for (const auto& [key, value] : pairs) {
+        if (value.isNull()) break;
+        entry->set(key, value);
+    }
+    history->append(Value(entry));
+}
+
+namespace {
+
+using Factory = std::unique_ptr<LogGenerator> (*)();
+
+struct TechnologyRow {
+    const char* identifier;
+    Factory generator;  // null until the technology's decoder is built
+};
+
+// Part 2.2's table, in its order; first match wins.
+const TechnologyRow kTechnologies[] = {
+    {kTSLogChannelTechnology_IFX, nullptr},           // GSMLogGenerator, Part 8.1
+    {kTSLogChannelTechnology_Morvek_GSM, nullptr},    // MVK_GSMLogGenerator, Part 5.1
+    {kTSLogChannelTechnology_Morvek_CDMA, nullptr},   // C2KLogGenerator, Part 4.1
+    {kTSLogChannelTechnology_Morvek_LTE, nullptr},    // LTELogGenerator, Part 6.1
+    {kTSLogChannelTechnology_Morvek_UTRAN2, &UTRANLogGenerator::generator},
+};
+
+}  // namespace
+
+std::unique_ptr<LogGenerator> LogGenerator::generatorFromTechnology(const std::string& technology) {
+    for (const auto& row : kTechnologies) {
+        if (technology != row.identifier) continue;
+        if (!row.generator) return nullptr;
+        // A decoder that could not set itself up (Part 7.1: no template resource) is
+        // unusable: the model gets none, as for an unknown identifier.
+        std::unique_ptr<LogGenerator> generator = row.generator();
+        if (!generator || !generator->isUsable()) return nullptr;
+        return generator;
+    }
+    return nullptr;
+}
+
+}  // namespace vantorel

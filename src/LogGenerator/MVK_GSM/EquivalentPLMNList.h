@@ -1,0 +1,15 @@
+// EquivalentPLMNList: the "Equivalent PLMN List" list section of Part 5.2 (0x7150).
+#pragma once
+
+#include "LogGenerator/Base.h"
+
+namespace vantorel {
+
+class EquivalentPLMNList : public Base {
+public:
+    std::string getSectionName() const override;
+    std::vector<int32_t> getLogCodeArray() const override;
+    void updateWithData(ByteView data, int32_t logCode) override;
+};
+
+}  // namespace vantorel

@@ -1,0 +1,67 @@
+// GSMNeighbhorMeasurements: Part 7.2's "GSM Neighbor Cell List" section: decodes record 0xD00E but, as required, only clears its list.
+#include "LogGenerator/UTRAN/GSMNeighbhorMeasurements.h"
+
+#include "Platform/ByteReader.h"
+#include "Platform/StringFormat.h"
+#include "Platform/SystemLog.h"
+#include "PropertyList/Array.h"
+#include "PropertyList/Dictionary.h"
+
+namespace vantorel {
+
+namespace {
+
+// Record 0xD00E (offsets from the record's first byte; at least 17 bytes):
+//   16            entry count n
+//   17 + 8*i      entry i, 8 bytes:
+//     0           "Cell ID" bits 0-7
+//     1           bits 0-5 "Cell ID" bits 8-13; bit 6 "Band Indicator"; bit 7 "BSIC Valid"
+//     2           "NCC"
+//     3           "BCC"
+//     4..5        "ARFCN", u16 LE
+//     6..7        "RSSI", s16 LE
+constexpr size_t kMinLength = 17;
+constexpr size_t kCountOffset = 16;
+constexpr size_t kFirstEntry = 17;
+constexpr size_t kEntrySize = 8;
+
+std::string decimal(int v) { return StringFormat::format("%d", v); }
+
+}  // namespace
+
+std::string GSMNeighbhorMeasurements::getSectionName() const { return "GSM Neighbor Cell List"; }
+
+std::vector<int32_t> GSMNeighbhorMeasurements::getLogCodeArray() const { return {kLogCode}; }
+
+void GSMNeighbhorMeasurements::updateWithData(ByteView data, int32_t logCode) {
+    SystemLog::log(SystemLog::kWarning, "%s", "GSM Neighbor Cell List");
+    if (logCode != kLogCode) return;
+
+    const ByteReader reader(data);
+    if (reader.size() < kMinLength) return;
+
+    clearSectionArray();
+
+    const unsigned count = reader.u8(kCountOffset).value_or(0);
+    auto list = Array::create();
+    for (unsigned i = 0; i < count; ++i) {
+        const size_t offset = kFirstEntry + kEntrySize * i;
+        if (!reader.has(offset, kEntrySize)) break;  // stop at the record's end
+        const uint8_t b0 = reader.u8(offset).value_or(0);
+        const uint8_t b1 = reader.u8(offset + 1).value_or(0);
+
+        auto entry = Dictionary::create();
+        entry->set("Cell ID", Value(decimal(b0 | ((b1 & 0x3F) << 8))));
+        entry->set("Band Indicator", Value(decimal((b1 >> 6) & 0x01)));
+        entry->set("BSIC Valid", Value(decimal((b1 >> 7) & 0x01)));
+        entry->set("NCC", Value(decimal(reader.u8(offset + 2).value_or(0))));
+        entry->set("BCC", Value(decimal(reader.u8(offset + 3).value_or(0))));
+        entry->set("ARFCN", Value(decimal(reader.u16(offset + 4).value_or(0))));
+        entry->set("RSSI", Value(decimal(reader.s16(offset + 6).value_or(0))));
+        list->append(Value(entry));
+    }
+    // Required as stated (Part 7.2): the list is built but never put into the
+    // section's array, so the display shows an empty list after the first record.
+}
+
+}  // namespace vantorel

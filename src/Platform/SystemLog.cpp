@@ -1,0 +1,47 @@
+// SystemLog: syslog with the spec's priorities, a stderr mirror and a test observer (DESIGN.md "Platform stand-ins").
+#include "Platform/SystemLog.h"
+
+#include "Platform/StringFormat.h"
+
+#include <atomic>
+#include <cstdarg>
+#include <cstdio>
+#include <mutex>
+#include <syslog.h>
+
+namespace vantorel {
+
+namespace {
+std::atomic<bool> gMirror{false};
+std::mutex gObserverMutex;
+SystemLog::Observer gObserver;
+std::once_flag gOpenOnce;
+}  // namespace
+
+void SystemLog::log(int priority, const char* format, ...) {
+    va_list args;
+    va_start(args, format);
+    std::string line = StringFormat::vformat(format, args);
+    va_end(args);
+    write(priority, line);
+}
+
+void SystemLog::write(int priority, const std::string& line) {
+    if (priority != kConsole) {
+        std::call_once(gOpenOnce, [] { openlog("vantorel", LOG_PID, LOG_USER); });
+        syslog(priority, "%s", line.c_str());
+    }
+    if (gMirror.load()) std::fprintf(stderr, "vantorel[%d]: %s\n", priority, line.c_str());
+    std::lock_guard<std::mutex> lock(gObserverMutex);
+    if (gObserver) gObserver(priority, line);
+}
+
+void SystemLog::setMirrorToStderr(bool on) { gMirror.store(on); }
+bool SystemLog::mirrorToStderr() { return gMirror.load(); }
+
+void SystemLog::setObserver(Observer observer) {
+    std::lock_guard<std::mutex> lock(gObserverMutex);
+    gObserver = std::move(observer);
+}
+
+}  // namespace vantorel

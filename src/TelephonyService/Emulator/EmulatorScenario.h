@@ -1,0 +1,62 @@
+// EmulatorScenario: the abstract synthetic modem that the emulator backend runs on a clock, one subclass per technology (DESIGN.md "The telephony service"; records of Part 3.2).
+#pragma once
+
+#include "PropertyList/Value.h"
+
+#include <chrono>
+#include <cstdint>
+#include <random>
+#include <string>
+#include <vector>
+
+namespace vantorel {
+
+// A scenario is a scripted modem for one technology. The backend answers
+// "GetTechnology" with technology(), then every tickInterval() asks for
+// recordsForTick(n), n = 0, 1, 2, ..., and streams each returned message (a
+// Morvek-channel record, possibly behind the 0x81 0x00 prefix) as one message.
+//
+// Determinism: everything random comes from the scenario's own std::mt19937
+// (whose output sequence the C++ standard fixes) through the integer helpers
+// below, never through the standard distributions (whose results differ between
+// library implementations). So a given seed and the same sequence of calls give
+// the same bytes on every machine.
+class EmulatorScenario {
+public:
+    explicit EmulatorScenario(uint64_t seed);
+    virtual ~EmulatorScenario();
+
+    EmulatorScenario(const EmulatorScenario&) = delete;
+    EmulatorScenario& operator=(const EmulatorScenario&) = delete;
+
+    // The technology identifier the modem reports (TelephonyIdentifiers.h).
+    virtual std::string technology() const = 0;
+    // One line for --help listings.
+    virtual std::string description() const = 0;
+    // Time between two ticks.
+    virtual std::chrono::milliseconds tickInterval() const;
+    // The messages the modem sends at tick n, in sending order. Called with
+    // n = 0, 1, 2, ... in order; the scenario may keep state between calls.
+    virtual std::vector<Bytes> recordsForTick(uint64_t tick) = 0;
+
+    uint64_t seed() const { return seed_; }
+
+protected:
+    // Restarts the random sequence from the seed (for scenarios that replay).
+    void reseed();
+    // The next raw 32-bit number of the sequence.
+    uint32_t random();
+    // An integer in [low, high] (both included; low <= high).
+    int32_t uniform(int32_t low, int32_t high);
+    // True with the given probability in percent (0 never, 100 always).
+    bool chance(uint32_t percent);
+    // The record time stamp (bytes 5..12, never read by the decoders) of tick n,
+    // in the modem's format: 1.25 ms units since start in bits 16..63, bits 0..15 zero.
+    uint64_t timestampForTick(uint64_t tick) const;
+
+private:
+    uint64_t seed_;
+    std::mt19937 engine_;
+};
+
+}  // namespace vantorel

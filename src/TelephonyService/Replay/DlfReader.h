@@ -1,0 +1,28 @@
+// DlfReader: reads a QXDM DLF file (Part 3.4's format) into the Morvek records it holds (DESIGN.md "The telephony service", Replay/).
+#pragma once
+
+#include "PropertyList/Value.h"
+#include "TelephonyService/Replay/RecordedLog.h"
+
+#include <string>
+
+namespace vantorel {
+
+// A DLF file is a raw concatenation of records, no file header or trailer:
+//   0..1 len u16 LE (12 + payload length) | 2..3 code u16 LE | 4..11 time stamp u64 LE | 12.. payload
+// Part 3.4's writer leads with a 161-byte version record of code 0x1FFD; it is read like
+// any other record (an entry with code 0x1FFD). Each record becomes the Morvek record
+// type byte 1 + the record. Records carry no sync marks, so at the first record with
+// len < 12 (malformed) or running past the end of the file (truncated) reading stops;
+// the records before it are kept.
+class DlfReader {
+public:
+    static constexpr uint16_t kVersionReportCode = 0x1FFD;
+    static constexpr size_t kRecordHeaderLength = 12;
+
+    // A file that cannot be read gives a log with `error` set ("<path>: <reason>").
+    static RecordedLog readFile(const std::string& path);
+    static RecordedLog readBytes(ByteView data);
+};
+
+}  // namespace vantorel

@@ -1,0 +1,74 @@
+// RecordedLog: entries and counters shared by the recorded-stream readers, with the file loader and the per-code summary (DESIGN.md "The telephony service", Replay/).
+#include "TelephonyService/Replay/RecordedLog.h"
+
+#include "Platform/StringFormat.h"
+
+#include <QFile>
+#include <QFileInfo>
+
+#include <utility>
+
+namespace vantorel {
+
+size_t RecordedLog::count(uint16_t logCode) const {
+    auto it = codeCounts.find(logCode);
+    return it == codeCounts.end() ? 0 : it->second;
+}
+
+void RecordedLog::addEntry(uint16_t logCode, uint64_t timeStamp, Bytes record) {
+    entries.push_back(RecordedEntry{logCode, timeStamp, std::move(record)});
+    ++logPackets;
+    ++codeCounts[logCode];
+}
+
+void RecordedLog::addProblem(uint64_t offset, const std::string& what, const std::string& why) {
+    if (problems.size() >= kMaxProblems) return;
+    problems.push_back(StringFormat::format("%s at byte %llu: %s", what.c_str(),
+                                            static_cast<unsigned long long>(offset), why.c_str()));
+}
+
+std::string RecordedLog::summary() const {
+    std::string out;
+    if (!ok()) out += "error: " + error + "\n";
+    out += StringFormat::format(
+        "frames %zu, log packets %zu, other packets %zu, bad CRC %zu, malformed %zu, truncated %zu\n", frames,
+        logPackets, otherPackets, badCrc, malformed, truncated);
+    for (const auto& [code, n] : codeCounts) out += StringFormat::format("0x%04X  %zu\n", code, n);
+    for (const auto& p : problems) out += p + "\n";
+    const size_t allProblems = badCrc + malformed + truncated;
+    if (allProblems > problems.size())
+        out += StringFormat::format("(%zu more problems not listed)\n", allProblems - problems.size());
+    return out;
+}
+
+std::optional<Bytes> RecordedLog::loadFile(const std::string& path, std::string* error) {
+    auto fail = [&](const QString& reason) -> std::optional<Bytes> {
+        if (error) *error = path + ": " + reason.toStdString();
+        return std::nullopt;
+    };
+    const QString qpath = QString::fromStdString(path);
+    // QFile opens a directory on some platforms and then reads nothing: say so instead.
+    if (QFileInfo(qpath).isDir()) return fail(QStringLiteral("is a directory"));
+    QFile file(qpath);
+    if (!file.open(QIODevice::ReadOnly)) return fail(file.errorString());
+    Bytes data;
+    const qint64 size = file.size();
+    if (size > 0) {
+        data.resize(static_cast<size_t>(size));
+        qint64 done = 0;
+        while (done < size) {
+            const qint64 n = file.read(reinterpret_cast<char*>(data.data()) + done, size - done);
+            if (n < 0) return fail(file.errorString());
+            if (n == 0) break;  // the file shrank while being read: keep what is there
+            done += n;
+        }
+        data.resize(static_cast<size_t>(done));
+    } else {
+        // Size unknown (a pipe or special file): read to the end.
+        const QByteArray all = file.readAll();
+        data.assign(all.begin(), all.end());
+    }
+    return data;
+}
+
+}  // namespace vantorel
