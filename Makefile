@@ -6,6 +6,9 @@ ASAN_DIR := build/asan
 RELEASE_DIR := build/release
 CMAKE_FLAGS ?=
 
+BENCH_DIR := build/bench
+BENCH_FLAGS ?= --benchmark_min_time=0.5
+
 .PHONY: all deps build test run bench clean
 
 all: build
@@ -23,6 +26,17 @@ test: deps
 	@cmake -S . -B $(ASAN_DIR) -G Ninja -DCMAKE_BUILD_TYPE=Debug -DVANTOREL_SANITIZE=ON $(CMAKE_FLAGS) >/dev/null
 	@cmake --build $(ASAN_DIR) -j $(JOBS)
 	@cd $(ASAN_DIR) && ctest --output-on-failure -j $(JOBS)
+
+# The main job on the embedded default: the monitor on the built-in modem emulator
+# (an in-process telephony service on its own thread), live, in the terminal view.
+run: build
+	@$(RELEASE_DIR)/src/vantorel-cli watch
+
+# Google Benchmark figures (docs/performance.md): QMDL deframing, routing, tree building.
+bench: deps
+	@cmake -S . -B $(BENCH_DIR) -G Ninja -DCMAKE_BUILD_TYPE=Release -DVANTOREL_TESTS=OFF -DVANTOREL_BENCH=ON $(CMAKE_FLAGS) >/dev/null
+	@cmake --build $(BENCH_DIR) -j $(JOBS) --target vantorel-bench
+	@$(BENCH_DIR)/bench/vantorel-bench $(BENCH_FLAGS)
 
 clean:
 	rm -rf build

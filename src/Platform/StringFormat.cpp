@@ -16,17 +16,18 @@ std::string StringFormat::format(const char* format, ...) {
 }
 
 std::string StringFormat::vformat(const char* format, va_list args) {
+    // Display strings are short: one pass into a stack buffer, a second only when
+    // the text does not fit.
+    char small[256];
     va_list copy;
     va_copy(copy, args);
-    int n = std::vsnprintf(nullptr, 0, format, copy);
+    int n = std::vsnprintf(small, sizeof small, format, copy);
     va_end(copy);
-    std::string out;
-    if (n > 0) {
-        std::vector<char> buf(static_cast<size_t>(n) + 1);
-        std::vsnprintf(buf.data(), buf.size(), format, args);
-        out.assign(buf.data(), static_cast<size_t>(n));
-    }
-    return out;
+    if (n <= 0) return std::string();
+    if (static_cast<size_t>(n) < sizeof small) return std::string(small, static_cast<size_t>(n));
+    std::vector<char> buf(static_cast<size_t>(n) + 1);
+    std::vsnprintf(buf.data(), buf.size(), format, args);
+    return std::string(buf.data(), static_cast<size_t>(n));
 }
 
 }  // namespace vantorel

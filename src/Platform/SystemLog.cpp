@@ -8,6 +8,7 @@
 #include <cstdio>
 #include <mutex>
 #include <syslog.h>
+#include <unistd.h>
 
 namespace vantorel {
 
@@ -16,6 +17,9 @@ std::atomic<bool> gMirror{false};
 std::mutex gObserverMutex;
 SystemLog::Observer gObserver;
 std::once_flag gOpenOnce;
+// Without a syslog socket every syslog(3) call tries (and fails) to connect again:
+// four system calls per line. Lines then go only to the mirror and the observer.
+bool gHaveSyslog = false;
 }  // namespace
 
 void SystemLog::log(int priority, const char* format, ...) {
@@ -28,8 +32,11 @@ void SystemLog::log(int priority, const char* format, ...) {
 
 void SystemLog::write(int priority, const std::string& line) {
     if (priority != kConsole) {
-        std::call_once(gOpenOnce, [] { openlog("vantorel", LOG_PID, LOG_USER); });
-        syslog(priority, "%s", line.c_str());
+        std::call_once(gOpenOnce, [] {
+            gHaveSyslog = ::access("/dev/log", W_OK) == 0;
+            if (gHaveSyslog) openlog("vantorel", LOG_PID, LOG_USER);
+        });
+        if (gHaveSyslog) syslog(priority, "%s", line.c_str());
     }
     if (gMirror.load()) std::fprintf(stderr, "vantorel[%d]: %s\n", priority, line.c_str());
     std::lock_guard<std::mutex> lock(gObserverMutex);

@@ -1,0 +1,217 @@
+// LocalMessagePort: a named local message port on a QLocalServer: frames in, replies and notifications out, invalidation (Part 2.1; DESIGN.md "Message ports"; docs/protocol.md).
+#include "Platform/LocalMessagePort.h"
+
+#include "Platform/MessagePortFrame.h"
+#include "Platform/SystemLog.h"
+
+#include <QLocalServer>
+#include <QLocalSocket>
+#include <QPointer>
+
+#include <algorithm>
+
+namespace vantorel {
+
+namespace {
+
+// How long create() waits for a port already listening under the name to answer.
+// A live server accepts at once (the kernel queues the connection); a stale socket
+// file refuses at once, so this only bounds a pathological case.
+constexpr int kProbeTimeoutMs = 500;
+
+ByteView viewOf(const QByteArray& bytes) {
+    return ByteView(reinterpret_cast<const uint8_t*>(bytes.constData()), static_cast<size_t>(bytes.size()));
+}
+
+void writeFrame(QLocalSocket* socket, const Bytes& frame) {
+    socket->write(reinterpret_cast<const char*>(frame.data()), static_cast<qint64>(frame.size()));
+    socket->flush();  // non-blocking: writes what the socket takes now, the event loop the rest
+}
+
+}  // namespace
+
+// One connected peer and the decoder of its byte stream.
+struct LocalMessagePort::Peer {
+    QLocalSocket* socket = nullptr;  // a child of the port, deleted by closePeer()
+    MessagePortFrameDecoder decoder;
+};
+
+LocalMessagePort::LocalMessagePort(std::string name, ReceiveCallback callback)
+    : name_(std::move(name)), callback_(std::move(callback)) {}
+
+LocalMessagePort::~LocalMessagePort() {
+    // Destruction is not invalidation: the callback is not called (like releasing a port).
+    valid_ = false;
+    while (!peers_.empty()) closePeer(peers_.back()->socket);
+    if (server_) server_->close();
+}
+
+std::unique_ptr<LocalMessagePort> LocalMessagePort::create(const std::string& name, ReceiveCallback callback) {
+    std::unique_ptr<LocalMessagePort> port(new LocalMessagePort(name, std::move(callback)));
+    if (!port->listen()) return nullptr;
+    return port;
+}
+
+bool LocalMessagePort::listen() {
+    if (name_.empty()) {
+        SystemLog::log(SystemLog::kError, "%s", "Message port: cannot listen under an empty name");
+        return false;
+    }
+    server_ = new QLocalServer(this);
+    const QString name = QString::fromStdString(name_);
+    if (!server_->listen(name)) {
+        if (server_->serverError() != QAbstractSocket::AddressInUseError) {
+            SystemLog::log(SystemLog::kError, "Message port %s: cannot listen (%s)", name_.c_str(),
+                           server_->errorString().toStdString().c_str());
+            return false;
+        }
+        // The name is taken: by a live port (then this one cannot exist) or by a
+        // socket file that a dead process left behind (then it is removed).
+        QLocalSocket probe;
+        probe.connectToServer(name);
+        const bool live = probe.waitForConnected(kProbeTimeoutMs);
+        probe.abort();
+        if (live) {
+            SystemLog::log(SystemLog::kError, "Message port %s: the name is in use by a live port", name_.c_str());
+            return false;
+        }
+        QLocalServer::removeServer(name);
+        if (!server_->listen(name)) {
+            SystemLog::log(SystemLog::kError, "Message port %s: cannot listen (%s)", name_.c_str(),
+                           server_->errorString().toStdString().c_str());
+            return false;
+        }
+    }
+    connect(server_, &QLocalServer::newConnection, this, &LocalMessagePort::acceptPeers);
+    return true;
+}
+
+void LocalMessagePort::setInvalidationCallback(InvalidationCallback callback) { invalidation_ = std::move(callback); }
+
+int LocalMessagePort::peerCount() const { return static_cast<int>(peers_.size()); }
+
+void LocalMessagePort::acceptPeers() {
+    while (server_ && server_->hasPendingConnections()) {
+        QLocalSocket* socket = server_->nextPendingConnection();
+        if (!socket) break;
+        socket->setParent(this);
+        auto peer = std::make_unique<Peer>();
+        peer->socket = socket;
+        peers_.push_back(std::move(peer));
+        // Queued, so that a callback may close the peer or delete the port without
+        // the socket being inside its own signal emission at that moment.
+        QPointer<QLocalSocket> guard(socket);
+        connect(
+            socket, &QLocalSocket::readyRead, this,
+            [this, guard] {
+                if (guard) readPeer(guard);
+            },
+            Qt::QueuedConnection);
+        connect(
+            socket, &QLocalSocket::disconnected, this,
+            [this, guard] {
+                if (guard) peerGone(guard);
+            },
+            Qt::QueuedConnection);
+    }
+}
+
+LocalMessagePort::Peer* LocalMessagePort::findPeer(QLocalSocket* socket) const {
+    for (const auto& peer : peers_) {
+        if (peer->socket == socket) return peer.get();
+    }
+    return nullptr;
+}
+
+void LocalMessagePort::closePeer(QLocalSocket* socket) {
+    auto it = std::find_if(peers_.begin(), peers_.end(), [socket](const auto& p) { return p->socket == socket; });
+    if (it == peers_.end()) return;
+    peers_.erase(it);
+    disconnect(socket, nullptr, this, nullptr);
+    socket->abort();
+    delete socket;
+}
+
+void LocalMessagePort::readPeer(QLocalSocket* socket) {
+    Peer* peer = findPeer(socket);
+    if (!peer || !valid_) return;
+    const QByteArray chunk = socket->readAll();
+    if (chunk.isEmpty()) return;
+    const std::vector<MessagePortFrame> frames = peer->decoder.feed(viewOf(chunk));
+    const bool malformed = peer->decoder.failed();
+    const std::string reason = peer->decoder.error();
+    if (!frames.empty()) hadPeer_ = true;
+
+    // Callbacks may invalidate or delete the port, or close this peer: re-check
+    // after each one and touch nothing that may be gone.
+    QPointer<LocalMessagePort> self(this);
+    QPointer<QLocalSocket> guard(socket);
+    for (const MessagePortFrame& frame : frames) {
+        // Replies and notifications travel only towards remote ports; one sent to
+        // a local port is ignored.
+        if (frame.kind != MessagePortFrame::Kind::Message && frame.kind != MessagePortFrame::Kind::Request) continue;
+        std::optional<Bytes> result;
+        if (ReceiveCallback callback = callback_) result = callback(frame.messageId, frame.data);
+        if (!self || !valid_) return;
+        if (!guard || !findPeer(guard)) return;
+        if (frame.kind == MessagePortFrame::Kind::Request) {
+            MessagePortFrame reply;
+            reply.kind = MessagePortFrame::Kind::Reply;
+            reply.messageId = frame.messageId;
+            if (result) reply.data = std::move(*result);
+            writeFrame(guard, reply.encode());
+        }
+    }
+
+    if (malformed) {
+        ++malformed_;
+        SystemLog::log(SystemLog::kError, "Message port %s: malformed frame from a peer (%s); connection closed",
+                       name_.c_str(), reason.c_str());
+        closePeer(socket);
+        invalidateIfDeserted();
+    }
+}
+
+void LocalMessagePort::peerGone(QLocalSocket* socket) {
+    if (!findPeer(socket)) return;
+    // Whatever the peer wrote before it closed is still delivered.
+    QPointer<LocalMessagePort> self(this);
+    readPeer(socket);
+    if (!self) return;
+    closePeer(socket);
+    invalidateIfDeserted();
+}
+
+void LocalMessagePort::invalidateIfDeserted() {
+    if (valid_ && hadPeer_ && peers_.empty() && !staysValidWithoutPeers_) invalidate();
+}
+
+void LocalMessagePort::invalidate() {
+    if (!valid_) return;
+    valid_ = false;
+    if (server_) {
+        disconnect(server_, nullptr, this, nullptr);
+        server_->close();
+    }
+    while (!peers_.empty()) closePeer(peers_.back()->socket);
+    // A copy: the callback may clear it or delete the port.
+    if (InvalidationCallback callback = invalidation_) callback(this);
+}
+
+int LocalMessagePort::broadcastNotification(int32_t messageId, ByteView data) {
+    if (!valid_) return 0;
+    MessagePortFrame frame;
+    frame.kind = MessagePortFrame::Kind::Notification;
+    frame.messageId = messageId;
+    frame.data.assign(data.begin(), data.end());
+    const Bytes bytes = frame.encode();
+    int queued = 0;
+    for (const auto& peer : peers_) {
+        if (peer->socket->state() != QLocalSocket::ConnectedState) continue;
+        writeFrame(peer->socket, bytes);
+        ++queued;
+    }
+    return queued;
+}
+
+}  // namespace vantorel

@@ -1,0 +1,208 @@
+// RemoteMessagePort: a remote message port on a QLocalSocket: blocking requests with send/receive timeouts, streaming posts, notifications, invalidation (Parts 2.1, 2.2; DESIGN.md "Message ports"; docs/protocol.md).
+#include "Platform/RemoteMessagePort.h"
+
+#include "Platform/MessagePortFrame.h"
+#include "Platform/SystemLog.h"
+
+#include <QDeadlineTimer>
+#include <QLocalSocket>
+#include <QPointer>
+
+#include <algorithm>
+#include <climits>
+#include <cmath>
+#include <deque>
+#include <utility>
+
+namespace vantorel {
+
+namespace {
+
+qint64 toMilliseconds(double seconds) {
+    if (!(seconds > 0)) return 0;  // also NaN
+    return static_cast<qint64>(std::min(std::llround(seconds * 1000.0), static_cast<long long>(INT_MAX)));
+}
+
+int remainingMs(const QDeadlineTimer& deadline) {
+    return static_cast<int>(std::clamp<qint64>(deadline.remainingTime(), 0, INT_MAX));
+}
+
+}  // namespace
+
+struct RemoteMessagePort::Impl {
+    MessagePortFrameDecoder decoder;
+    std::deque<std::pair<int32_t, Bytes>> pending;  // notifications not yet delivered
+    bool deliveryScheduled = false;
+    bool drainPending = false;  // bytes were queued since drained() was last emitted
+};
+
+RemoteMessagePort::RemoteMessagePort(std::string name) : name_(std::move(name)), impl_(std::make_unique<Impl>()) {}
+
+RemoteMessagePort::~RemoteMessagePort() {
+    // Releasing is not invalidating: no callback.
+    if (socket_) disconnect(socket_, nullptr, this, nullptr);
+}
+
+std::unique_ptr<RemoteMessagePort> RemoteMessagePort::lookup(const std::string& name, int timeoutMs) {
+    if (name.empty()) return nullptr;
+    std::unique_ptr<RemoteMessagePort> port(new RemoteMessagePort(name));
+    RemoteMessagePort* p = port.get();
+    p->socket_ = new QLocalSocket(p);
+    p->socket_->connectToServer(QString::fromStdString(name));
+    if (!p->socket_->waitForConnected(std::max(0, timeoutMs))) return nullptr;
+    // Queued, so that callbacks run from the event loop and never inside the
+    // socket's own signal emission or inside sendRequest().
+    connect(p->socket_, &QLocalSocket::readyRead, p, [p] { p->readAvailable(); }, Qt::QueuedConnection);
+    connect(p->socket_, &QLocalSocket::disconnected, p, [p] { p->peerClosed(); }, Qt::QueuedConnection);
+    connect(p->socket_, &QLocalSocket::bytesWritten, p, [p] { p->checkDrained(); }, Qt::QueuedConnection);
+    return port;
+}
+
+bool RemoteMessagePort::isValid() const {
+    return !invalidated_ && socket_ && socket_->state() == QLocalSocket::ConnectedState;
+}
+
+void RemoteMessagePort::setInvalidationCallback(InvalidationCallback callback) { invalidation_ = std::move(callback); }
+
+void RemoteMessagePort::setNotificationCallback(NotificationCallback callback) { notification_ = std::move(callback); }
+
+int64_t RemoteMessagePort::bytesPending() const { return socket_ ? socket_->bytesToWrite() : 0; }
+
+bool RemoteMessagePort::pump(std::optional<Bytes>* reply, bool* gotReply) {
+    if (!socket_ || socket_->bytesAvailable() <= 0) return true;
+    const QByteArray chunk = socket_->readAll();
+    const auto frames = impl_->decoder.feed(
+        ByteView(reinterpret_cast<const uint8_t*>(chunk.constData()), static_cast<size_t>(chunk.size())));
+    for (const MessagePortFrame& frame : frames) {
+        switch (frame.kind) {
+        case MessagePortFrame::Kind::Reply:
+            // Any id answers the request in flight; a reply with no request in
+            // flight belongs to one that timed out and is dropped.
+            if (reply && gotReply && !*gotReply) {
+                *reply = frame.data;
+                *gotReply = true;
+            }
+            break;
+        case MessagePortFrame::Kind::Notification:
+            impl_->pending.emplace_back(frame.messageId, frame.data);
+            scheduleDelivery();
+            break;
+        case MessagePortFrame::Kind::Message:
+        case MessagePortFrame::Kind::Request:
+            break;  // a remote port is not a receiver: ignored
+        }
+    }
+    if (impl_->decoder.failed()) {
+        SystemLog::log(SystemLog::kError, "Message port %s: malformed frame from the remote port (%s); connection closed",
+                       name_.c_str(), impl_->decoder.error().c_str());
+        disconnect(socket_, nullptr, this, nullptr);
+        socket_->abort();
+        // The invalidation callback runs from the event loop, as for a peer that closed.
+        QMetaObject::invokeMethod(this, [this] { peerClosed(); }, Qt::QueuedConnection);
+        return false;
+    }
+    return true;
+}
+
+int32_t RemoteMessagePort::sendRequest(int32_t messageId, ByteView data, double sendTimeout, double receiveTimeout,
+                                       std::optional<Bytes>* reply) {
+    if (!isValid()) return IsInvalid;
+    // What arrived before this request (also what the kernel holds and the event
+    // loop has not read yet): notifications are kept, replies are stale.
+    if (socket_->bytesAvailable() <= 0) socket_->waitForReadyRead(0);
+    if (!pump(nullptr, nullptr)) return TransportError;
+    if (socket_->state() != QLocalSocket::ConnectedState) return BecameInvalidError;
+
+    MessagePortFrame frame;
+    frame.kind = reply ? MessagePortFrame::Kind::Request : MessagePortFrame::Kind::Message;
+    frame.messageId = messageId;
+    frame.data.assign(data.begin(), data.end());
+    const Bytes bytes = frame.encode();
+    const qint64 written = socket_->write(reinterpret_cast<const char*>(bytes.data()), static_cast<qint64>(bytes.size()));
+    if (written != static_cast<qint64>(bytes.size())) {
+        return socket_->state() == QLocalSocket::ConnectedState ? TransportError : BecameInvalidError;
+    }
+    impl_->drainPending = true;
+
+    const QDeadlineTimer sendDeadline(toMilliseconds(sendTimeout));
+    socket_->flush();
+    while (socket_->bytesToWrite() > 0) {
+        if (socket_->state() != QLocalSocket::ConnectedState) return BecameInvalidError;
+        if (sendDeadline.hasExpired()) return SendTimeout;
+        socket_->waitForBytesWritten(remainingMs(sendDeadline));
+    }
+    if (!reply) return Success;
+
+    reply->reset();
+    bool gotReply = false;
+    const QDeadlineTimer receiveDeadline(toMilliseconds(receiveTimeout));
+    while (true) {
+        if (!pump(reply, &gotReply)) return TransportError;
+        if (gotReply) return Success;
+        if (socket_->state() != QLocalSocket::ConnectedState) return BecameInvalidError;
+        if (receiveDeadline.hasExpired()) return ReceiveTimeout;
+        socket_->waitForReadyRead(remainingMs(receiveDeadline));
+    }
+}
+
+bool RemoteMessagePort::post(int32_t messageId, ByteView data) {
+    if (!isValid()) return false;
+    MessagePortFrame frame;
+    frame.kind = MessagePortFrame::Kind::Message;
+    frame.messageId = messageId;
+    frame.data.assign(data.begin(), data.end());
+    const Bytes bytes = frame.encode();
+    const qint64 written = socket_->write(reinterpret_cast<const char*>(bytes.data()), static_cast<qint64>(bytes.size()));
+    if (written != static_cast<qint64>(bytes.size())) return false;
+    impl_->drainPending = true;
+    socket_->flush();  // non-blocking: what the socket does not take now, the event loop writes
+    return true;
+}
+
+void RemoteMessagePort::checkDrained() {
+    if (!impl_->drainPending || !socket_ || socket_->bytesToWrite() != 0) return;
+    impl_->drainPending = false;
+    emit drained();
+}
+
+void RemoteMessagePort::readAvailable() {
+    if (invalidated_) return;
+    pump(nullptr, nullptr);
+}
+
+void RemoteMessagePort::scheduleDelivery() {
+    if (impl_->deliveryScheduled) return;
+    impl_->deliveryScheduled = true;
+    QMetaObject::invokeMethod(this, [this] { deliverPending(); }, Qt::QueuedConnection);
+}
+
+void RemoteMessagePort::deliverPending() {
+    impl_->deliveryScheduled = false;
+    // The callback may send requests (which queue more notifications) or delete the port.
+    QPointer<RemoteMessagePort> self(this);
+    while (self && !impl_->pending.empty()) {
+        std::pair<int32_t, Bytes> item = std::move(impl_->pending.front());
+        impl_->pending.pop_front();
+        if (NotificationCallback callback = notification_) callback(item.first, item.second);
+    }
+}
+
+void RemoteMessagePort::peerClosed() {
+    if (invalidated_) return;
+    invalidated_ = true;
+    if (InvalidationCallback callback = invalidation_) callback(this);
+}
+
+void RemoteMessagePort::invalidate() {
+    if (invalidated_) return;
+    invalidated_ = true;
+    impl_->pending.clear();
+    if (socket_) {
+        disconnect(socket_, nullptr, this, nullptr);
+        socket_->abort();
+    }
+    // A copy: the callback may clear it or delete the port.
+    if (InvalidationCallback callback = invalidation_) callback(this);
+}
+
+}  // namespace vantorel

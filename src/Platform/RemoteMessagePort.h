@@ -1,0 +1,82 @@
+// RemoteMessagePort: a remote message port looked up by name (QLocalSocket): requests with send and receive timeouts, validity, invalidation (Part 2.1, 2.2; DESIGN.md "Message ports").
+#pragma once
+
+#include "PropertyList/Value.h"
+
+#include <QObject>
+
+#include <functional>
+#include <memory>
+#include <optional>
+#include <string>
+
+class QLocalSocket;
+
+namespace vantorel {
+
+class RemoteMessagePort : public QObject {
+    Q_OBJECT
+public:
+    // Request results, as a message port's send status: 0 is success.
+    enum Status : int32_t {
+        Success = 0,
+        SendTimeout = -1,
+        ReceiveTimeout = -2,
+        IsInvalid = -3,
+        TransportError = -4,
+        BecameInvalidError = -5,
+    };
+    using NotificationCallback = std::function<void(int32_t messageId, const Bytes& data)>;
+    using InvalidationCallback = std::function<void(RemoteMessagePort* port)>;
+
+    // Connects to the local port of that name; null when none answers within
+    // timeoutMs.
+    static std::unique_ptr<RemoteMessagePort> lookup(const std::string& name, int timeoutMs = 1000);
+    ~RemoteMessagePort() override;
+
+    const std::string& name() const { return name_; }
+
+    // Sends a Message (reply == nullptr) or a Request (reply != nullptr) frame and
+    // blocks the calling thread: up to sendTimeout seconds for the write, then up
+    // to receiveTimeout seconds for the Reply, which is stored in *reply. Frames
+    // of other kinds read meanwhile are kept and delivered later.
+    int32_t sendRequest(int32_t messageId, ByteView data, double sendTimeout, double receiveTimeout,
+                        std::optional<Bytes>* reply);
+    // Queues a Message frame without blocking (for streaming from an event loop);
+    // false when the port is invalid.
+    bool post(int32_t messageId, ByteView data);
+    // Bytes queued but not yet written to the peer (back-pressure for streaming).
+    int64_t bytesPending() const;
+
+    bool isValid() const;
+    void invalidate();  // closes the connection; calls the invalidation callback once if set
+    void setInvalidationCallback(InvalidationCallback callback);
+    // Notification frames pushed by the peer (the telephony service's notifications).
+    void setNotificationCallback(NotificationCallback callback);
+
+signals:
+    // All queued bytes have been written (bytesPending() is 0).
+    void drained();
+
+private:
+    explicit RemoteMessagePort(std::string name);
+    void readAvailable();
+    void deliverPending();
+    // Reads what the socket holds: a Reply goes to *reply when one is awaited
+    // (else it is stale and dropped), notifications are queued. False when the
+    // stream was malformed (the connection is then closed).
+    bool pump(std::optional<Bytes>* reply, bool* gotReply);
+    void scheduleDelivery();
+    void peerClosed();
+    void checkDrained();
+
+    std::string name_;
+    QLocalSocket* socket_ = nullptr;
+    bool invalidated_ = false;
+    InvalidationCallback invalidation_;
+    NotificationCallback notification_;
+    struct Impl;
+    std::unique_ptr<Impl> impl_;
+};
+
+}  // namespace vantorel

@@ -1,0 +1,71 @@
+// EmulatorBackend: scenario lookup by technology and the tick timer of the emulated modem (DESIGN.md "The telephony service", Emulator/).
+#include "TelephonyService/EmulatorBackend.h"
+
+#include "Platform/StringFormat.h"
+#include "Platform/TechnologyNames.h"
+#include "Platform/TelephonyIdentifiers.h"
+#include "TelephonyService/Emulator/UTRANScenario.h"
+
+namespace vantorel {
+
+EmulatorBackend::EmulatorBackend(std::unique_ptr<EmulatorScenario> scenario, std::chrono::milliseconds tickInterval,
+                                 QObject* parent)
+    : ModemBackend(parent),
+      scenario_(std::move(scenario)),
+      interval_(tickInterval.count() > 0 ? tickInterval : scenario_->tickInterval()) {
+    timer_.setTimerType(Qt::PreciseTimer);
+    connect(&timer_, &QTimer::timeout, this, &EmulatorBackend::tick);
+}
+
+EmulatorBackend::~EmulatorBackend() = default;
+
+std::unique_ptr<EmulatorScenario> EmulatorBackend::scenarioFor(const std::string& technology, std::string* error,
+                                                               uint64_t seed) {
+    const std::optional<std::string> identifier = technologyIdentifier(technology, error);
+    if (!identifier) return nullptr;
+    if (*identifier == kTSLogChannelTechnology_Morvek_UTRAN2) return std::make_unique<UTRANScenario>(seed);
+    if (error)
+        *error = StringFormat::format("no emulator scenario for %s yet (available: %s)", technology.c_str(),
+                                      availableScenarios().c_str());
+    return nullptr;
+}
+
+std::string EmulatorBackend::availableScenarios() {
+    return "utran";
+}
+
+std::string EmulatorBackend::technology() const {
+    return scenario_->technology();
+}
+
+std::string EmulatorBackend::description() const {
+    return StringFormat::format("emulator (%s scenario, seed %llu, tick %lld ms)",
+                                TechnologyNames::shortName(scenario_->technology()).c_str(),
+                                static_cast<unsigned long long>(scenario_->seed()),
+                                static_cast<long long>(interval_.count()));
+}
+
+void EmulatorBackend::start() {
+    if (state() == State::Streaming) return;
+    setState(State::Streaming);
+    // Tick 0 from the event loop right away, then the interval (set in tick()).
+    timer_.start(0);
+}
+
+void EmulatorBackend::stop() {
+    timer_.stop();
+    setState(State::Idle);
+}
+
+void EmulatorBackend::tick() {
+    if (state() != State::Streaming) return;
+    if (timer_.interval() != static_cast<int>(interval_.count())) timer_.setInterval(static_cast<int>(interval_.count()));
+    const std::vector<Bytes> records = scenario_->recordsForTick(nextTick_++);
+    for (const Bytes& record : records) {
+        emitMessage(0, record);
+        // A slot may have stopped us (the service shutting down).
+        if (state() != State::Streaming) return;
+    }
+}
+
+}  // namespace vantorel

@@ -1,0 +1,54 @@
+// EmulatorBackend: the modem backend that runs an EmulatorScenario on a timer, one tick per tickInterval (DESIGN.md "The telephony service", Emulator/).
+#pragma once
+
+#include "TelephonyService/Emulator/EmulatorScenario.h"
+#include "TelephonyService/ModemBackend.h"
+
+#include <QTimer>
+
+#include <chrono>
+#include <memory>
+#include <string>
+
+namespace vantorel {
+
+// start() runs tick 0 from the event loop at once, then one tick per interval; the
+// records of tick n are emitted together, in the scenario's order. Ticks go on
+// counting across stop() / start() (a modem does not rewind). Pausing is ignored:
+// a live modem does not wait for its listener.
+class EmulatorBackend : public ModemBackend {
+    Q_OBJECT
+public:
+    // tickInterval zero: the scenario's own.
+    explicit EmulatorBackend(std::unique_ptr<EmulatorScenario> scenario,
+                             std::chrono::milliseconds tickInterval = std::chrono::milliseconds(0),
+                             QObject* parent = nullptr);
+    ~EmulatorBackend() override;
+
+    // The scenario for a technology name (ifx, gsm, cdma, lte, utran, any case) or full
+    // identifier; null with *error set when the name is unknown or the technology has no
+    // scenario yet ("no emulator scenario for <TECH> yet (available: utran)").
+    static std::unique_ptr<EmulatorScenario> scenarioFor(const std::string& technology, std::string* error,
+                                                         uint64_t seed = 1);
+    // "utran", the names scenarioFor() knows.
+    static std::string availableScenarios();
+
+    std::string technology() const override;
+    std::string description() const override;
+    void start() override;
+    void stop() override;
+
+    std::chrono::milliseconds tickInterval() const { return interval_; }
+    // Ticks run so far.
+    uint64_t ticks() const { return nextTick_; }
+
+private:
+    void tick();
+
+    std::unique_ptr<EmulatorScenario> scenario_;
+    std::chrono::milliseconds interval_;
+    QTimer timer_;
+    uint64_t nextTick_ = 0;
+};
+
+}  // namespace vantorel

@@ -1,0 +1,67 @@
+// ModemBackend: the abstract modem behind the telephony service: a technology, a state, and a stream of messages (DESIGN.md "The telephony service").
+#pragma once
+
+#include "PropertyList/Value.h"
+
+#include <QObject>
+
+#include <cstdint>
+#include <optional>
+#include <string>
+
+namespace vantorel {
+
+// A backend plays the modem: it reports one technology identifier ("GetTechnology"),
+// and between start() and stop() emits messageReady for every message the modem
+// sends (a Morvek-channel record, an IFX message, or whatever junk the modem makes),
+// in order, on the thread the backend lives in. stateChanged follows every change of
+// state(). A backend that can wait (a replay) sends nothing while paused (the service's
+// flow control); a live modem (the emulator) does not wait.
+class ModemBackend : public QObject {
+    Q_OBJECT
+public:
+    enum class State { Idle, Streaming, Finished, Failed };
+    // "Idle", "Streaming", "Finished", "Failed" (the "State" of BackendStateChanged).
+    static const char* stateName(State state);
+
+    explicit ModemBackend(QObject* parent = nullptr);
+    ~ModemBackend() override;
+
+    // The technology identifier (TelephonyIdentifiers.h) the modem reports.
+    virtual std::string technology() const = 0;
+    // One line for status output: "emulator (...)", "replay of ...".
+    virtual std::string description() const = 0;
+
+    State state() const { return state_; }
+    // Starts streaming (from the beginning after Idle or Finished); no-op while Streaming.
+    virtual void start() = 0;
+    // Stops streaming; the state becomes Idle.
+    virtual void stop() = 0;
+
+    void setPaused(bool paused);
+    bool isPaused() const { return paused_; }
+
+    // Messages emitted since construction.
+    uint64_t messagesEmitted() const { return emitted_; }
+
+    // The identifier for a technology name (ifx, gsm, cdma, lte, utran, any case) or a
+    // full identifier; empty with *error set ("unknown technology ...") otherwise.
+    static std::optional<std::string> technologyIdentifier(const std::string& name, std::string* error);
+
+signals:
+    void messageReady(int32_t messageId, const vantorel::Bytes& data);
+    void stateChanged(vantorel::ModemBackend::State state);
+
+protected:
+    void setState(State state);
+    void emitMessage(int32_t messageId, const Bytes& data);
+    // Called after the paused flag changed.
+    virtual void pausedChanged() {}
+
+private:
+    State state_ = State::Idle;
+    bool paused_ = false;
+    uint64_t emitted_ = 0;
+};
+
+}  // namespace vantorel

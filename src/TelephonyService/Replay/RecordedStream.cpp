@@ -1,0 +1,91 @@
+// RecordedStream: format detection and the common timed-message view of captures, DLF and QMDL files (DESIGN.md "The telephony service", Replay/).
+#include "TelephonyService/Replay/RecordedStream.h"
+
+#include "Platform/ByteReader.h"
+#include "Platform/StringFormat.h"
+#include "TelephonyService/Replay/DiagPacket.h"
+#include "TelephonyService/Replay/DlfReader.h"
+#include "TelephonyService/Replay/QmdlReader.h"
+
+#include <utility>
+
+namespace vantorel {
+
+namespace {
+
+// Walks <len u16><code u16>... records from the start; true when the content is a DLF
+// chain (see the class comment). A QMDL file starts with a DIAG body (10 00 <len> ...,
+// or text and event packets) inside HDLC escaping, which chains only by accident and
+// then not to the exact end of a file.
+bool looksLikeDlf(ByteView data) {
+    ByteReader r(data);
+    size_t offset = 0;
+    size_t records = 0;
+    while (offset < r.size()) {
+        const std::optional<uint16_t> length = r.u16(offset);
+        if (!length || *length < DlfReader::kRecordHeaderLength || !r.has(offset, *length)) return false;
+        if (records == 0 && r.u16(offset + 2) == DlfReader::kVersionReportCode) return true;
+        ++records;
+        offset += *length;
+    }
+    return records >= 2;
+}
+
+}  // namespace
+
+RecordedStream::Format RecordedStream::detect(ByteView data) {
+    if (CaptureReader::hasMagic(data)) return Format::Capture;
+    if (looksLikeDlf(data)) return Format::Dlf;
+    return Format::Qmdl;
+}
+
+const char* RecordedStream::formatName(Format format) {
+    switch (format) {
+    case Format::Capture: return "capture";
+    case Format::Dlf: return "DLF";
+    case Format::Qmdl: return "QMDL";
+    }
+    return "unknown";
+}
+
+RecordedStream RecordedStream::open(const std::string& path, const std::string& technology) {
+    RecordedStream stream;
+    auto data = RecordedLog::loadFile(path, &stream.report_.error);
+    if (!data) return stream;
+    stream = fromBytes(*data, technology);
+    if (!stream.ok()) stream.report_.error = path + ": " + stream.report_.error;
+    return stream;
+}
+
+RecordedStream RecordedStream::fromBytes(ByteView data, const std::string& technology) {
+    RecordedStream stream;
+    stream.format_ = detect(data);
+    stream.technology_ = technology;
+    if (stream.format_ == Format::Capture) {
+        Capture capture = CaptureReader::readBytes(data);
+        stream.report_ = std::move(capture.report);
+        if (!stream.ok()) return stream;
+        if (!capture.technology.empty()) {
+            stream.technology_ = std::move(capture.technology);
+            stream.technologyFromFile_ = true;
+        }
+        stream.messages_ = std::move(capture.messages);
+        return stream;
+    }
+    stream.report_ = stream.format_ == Format::Dlf ? DlfReader::readBytes(data) : QmdlReader::readBytes(data);
+    stream.messages_.reserve(stream.report_.entries.size());
+    for (RecordedEntry& entry : stream.report_.entries)
+        stream.messages_.push_back(
+            TimedMessage{DiagPacket::microsecondsSince1970(entry.timeStamp), 0, std::move(entry.record)});
+    stream.report_.entries.clear();
+    stream.report_.entries.shrink_to_fit();
+    return stream;
+}
+
+std::string RecordedStream::summary() const {
+    std::string out = StringFormat::format("%s, technology %s, %zu messages\n", formatName(),
+                                           technology_.empty() ? "unknown" : technology_.c_str(), messages_.size());
+    return out + report_.summary();
+}
+
+}  // namespace vantorel

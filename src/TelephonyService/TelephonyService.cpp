@@ -1,0 +1,422 @@
+// TelephonyService: the service's well-known port, log channels, streaming with log masks and flow control, notifications and recording (DESIGN.md "The telephony service"; Parts 2.1, 2.2, 3.2; docs/protocol.md).
+#include "TelephonyService/TelephonyService.h"
+
+#include "Platform/LocalMessagePort.h"
+#include "Platform/RemoteMessagePort.h"
+#include "Platform/StringFormat.h"
+#include "Platform/SystemLog.h"
+#include "Platform/TechnologyNames.h"
+#include "Platform/TelephonyServiceConnection.h"
+#include "PropertyList/Dictionary.h"
+#include "PropertyList/PropertyListSerialization.h"
+#include "TelephonyService/EmulatorBackend.h"
+#include "TelephonyService/ReplayBackend.h"
+#include "TelephonyService/Replay/CaptureWriter.h"
+
+#include <QCoreApplication>
+#include <QFileInfo>
+
+#include <atomic>
+#include <cmath>
+#include <vector>
+
+namespace vantorel {
+
+namespace {
+
+constexpr int kHealthIntervalMs = 500;
+
+// Dictionary → XML plist bytes; our own dictionaries of strings and numbers always serialise.
+Bytes xml(const DictionaryRef& dict) {
+    return PropertyListSerialization::write(Value(dict), PropertyListSerialization::Format::XML).value_or(Bytes{});
+}
+
+Bytes channelReply(int32_t code, const std::string& portName) {
+    auto reply = Dictionary::create();
+    reply->set("ErrorDomain", Value::integer(code == TelephonyService::kNoError ? 0 : TelephonyService::kErrorDomain));
+    reply->set("ErrorCode", Value::integer(code));
+    reply->set("PortName", Value(portName));
+    return xml(reply);
+}
+
+}  // namespace
+
+TelephonyService::TelephonyService(TelephonyServiceOptions options, QObject* parent)
+    : QObject(parent), options_(std::move(options)) {
+    connect(&healthTimer_, &QTimer::timeout, this, &TelephonyService::checkHealth);
+}
+
+TelephonyService::~TelephonyService() {
+    status_ = nullptr;  // whatever the callback refers to may be gone already
+    stop();
+}
+
+std::unique_ptr<ModemBackend> TelephonyService::createBackend(const TelephonyServiceOptions& options,
+                                                              std::string* error) {
+    auto fail = [error](std::string text) -> std::unique_ptr<ModemBackend> {
+        if (error) *error = std::move(text);
+        return nullptr;
+    };
+    if (options.backendFactory) {
+        std::unique_ptr<ModemBackend> backend = options.backendFactory();
+        if (!backend) return fail("the backend could not be made");
+        return backend;
+    }
+    if (options.emulate.empty() == options.replay.empty())
+        return fail("give exactly one of --emulate TECH and --replay FILE");
+    if (!options.emulate.empty()) {
+        std::unique_ptr<EmulatorScenario> scenario = EmulatorBackend::scenarioFor(options.emulate, error, options.seed);
+        if (!scenario) return nullptr;
+        return std::make_unique<EmulatorBackend>(std::move(scenario), options.tickInterval);
+    }
+
+    std::string technology;
+    if (!options.technology.empty()) {
+        const std::optional<std::string> identifier = ModemBackend::technologyIdentifier(options.technology, error);
+        if (!identifier) return nullptr;
+        technology = *identifier;
+    }
+    if (!std::isfinite(options.speed) || options.speed < 0)
+        return fail(StringFormat::format("speed %g: give 0 (as fast as the client takes it) or more", options.speed));
+    RecordedStream stream = RecordedStream::open(options.replay, technology);
+    if (!stream.ok()) return fail(stream.error());
+    if (stream.technology().empty())
+        return fail(StringFormat::format(
+            "%s is a %s file, which does not say which modem recorded it: --technology TECH is needed (names: %s)",
+            options.replay.c_str(), stream.formatName(), TechnologyNames::listing().c_str()));
+    if (stream.technologyFromFile() && !technology.empty() && technology != stream.technology())
+        SystemLog::log(SystemLog::kWarning, "Telephony service: --technology %s ignored, the capture %s says %s",
+                       options.technology.c_str(), options.replay.c_str(), stream.technology().c_str());
+    const std::string name = QFileInfo(QString::fromStdString(options.replay)).fileName().toStdString();
+    return std::make_unique<ReplayBackend>(std::move(stream), options.speed, options.loop, name);
+}
+
+bool TelephonyService::start(std::string* error) {
+    if (port_) return true;
+    stopping_ = false;
+    portName_ = options_.portName.empty() ? TelephonyServiceConnection::defaultServiceName() : options_.portName;
+
+    if (!backend_) {
+        backend_ = createBackend(options_, error);
+        if (!backend_) return false;
+    }
+
+    port_ = LocalMessagePort::create(portName_,
+                                     [this](int32_t messageId, const Bytes& data) { return receiveOnServicePort(messageId, data); });
+    if (!port_) {
+        if (error)
+            *error = StringFormat::format("cannot listen on port %s: the name is in use (is another service running?)",
+                                          portName_.c_str());
+        return false;
+    }
+    // Clients come and go on the well-known port; it serves until stop().
+    port_->setStaysValidWithoutPeers(true);
+    port_->setInvalidationCallback([this](LocalMessagePort*) {
+        if (!stopping_) SystemLog::log(SystemLog::kError, "Telephony service: port %s was invalidated", portName_.c_str());
+    });
+
+    // Only now: a port in use must not have truncated an earlier recording.
+    if (!options_.record.empty()) {
+        recorder_ = CaptureWriter::create(options_.record, backend_->technology(), error);
+        if (!recorder_) {
+            port_->setInvalidationCallback(nullptr);
+            port_.reset();
+            return false;
+        }
+    }
+
+    connect(backend_.get(), &ModemBackend::messageReady, this, &TelephonyService::sendMessage);
+    connect(backend_.get(), &ModemBackend::stateChanged, this, &TelephonyService::backendStateChanged);
+    healthTimer_.start(kHealthIntervalMs);
+    return true;
+}
+
+void TelephonyService::stop() {
+    stopping_ = true;
+    healthTimer_.stop();
+    std::vector<uint64_t> numbers;
+    for (const auto& entry : channels_) numbers.push_back(entry.first);
+    for (uint64_t number : numbers) closeChannel(number, "the service stopped");
+    if (backend_) {
+        disconnect(backend_.get(), nullptr, this, nullptr);
+        backend_->stop();
+    }
+    if (port_) {
+        port_->setInvalidationCallback(nullptr);
+        malformedFromClosedPorts_ += port_->malformedFrames();
+        port_->invalidate();
+        port_.reset();
+    }
+    if (recorder_) {
+        recorder_->flush();
+        recorder_.reset();
+    }
+}
+
+bool TelephonyService::isListening() const {
+    return port_ && port_->isValid();
+}
+
+TelephonyService::Counters TelephonyService::counters() const {
+    Counters c = counters_;
+    c.openChannels = channels_.size();
+    c.malformedFrames = malformedFramesNow();
+    return c;
+}
+
+uint64_t TelephonyService::malformedFramesNow() const {
+    uint64_t n = malformedFromClosedPorts_;
+    if (port_) n += port_->malformedFrames();
+    for (const auto& entry : channels_) n += entry.second->port->malformedFrames();
+    return n;
+}
+
+std::string TelephonyService::startupLine() const {
+    return StringFormat::format("listening on %s, backend %s, technology %s", portName_.c_str(),
+                                backend_ ? backend_->description().c_str() : "none",
+                                backend_ ? backend_->technology().c_str() : "none");
+}
+
+void TelephonyService::statusLine(const std::string& line) {
+    if (status_)
+        status_(line);
+    else
+        SystemLog::log(SystemLog::kNotice, "Telephony service: %s", line.c_str());
+}
+
+// ---- the well-known port ----
+
+std::optional<Bytes> TelephonyService::receiveOnServicePort(int32_t messageId, const Bytes& data) {
+    auto malformed = [&](const char* why) {
+        ++counters_.malformedRequests;
+        SystemLog::log(SystemLog::kWarning, "Telephony service: malformed request on %s (%s)", portName_.c_str(), why);
+        return channelReply(kMalformedRequest, "");
+    };
+    if (messageId != kCreateLogChannelMessageId) return malformed("unknown message id");
+    const PropertyListResult parsed = PropertyListSerialization::readDictionary(data);
+    if (!parsed) return malformed("not a property-list dictionary");
+    const DictionaryRef request = parsed.value->asDictionary();
+    const std::string* name = request->get("Request").asString();
+    if (!name || *name != "CreateLogChannel") return malformed("not a CreateLogChannel request");
+    const std::string* clientPort = request->get("PortName").asString();
+    if (!clientPort || clientPort->empty()) return malformed("no PortName");
+    return createLogChannel(*clientPort);
+}
+
+Bytes TelephonyService::createLogChannel(const std::string& clientPortName) {
+    if (!backend_ || backend_->state() == ModemBackend::State::Failed) {
+        SystemLog::log(SystemLog::kError, "Telephony service: no log channel for %s: the backend failed",
+                       clientPortName.c_str());
+        return channelReply(kBackendFailed, "");
+    }
+    std::unique_ptr<RemoteMessagePort> client = RemoteMessagePort::lookup(clientPortName, kClientLookupTimeoutMs);
+    if (!client) {
+        SystemLog::log(SystemLog::kError, "Telephony service: no log channel for %s: that port does not answer",
+                       clientPortName.c_str());
+        return channelReply(kClientPortUnreachable, "");
+    }
+    // Process-wide, so two services (on two threads) never make the same name.
+    static std::atomic<uint64_t> nextNumber{0};
+    const uint64_t number = ++nextNumber;
+    const std::string name = StringFormat::format("%s.channel.%lld.%llu", portName_.c_str(),
+                                                  static_cast<long long>(QCoreApplication::applicationPid()),
+                                                  static_cast<unsigned long long>(number));
+    std::unique_ptr<LocalMessagePort> port = LocalMessagePort::create(
+        name, [this, number](int32_t messageId, const Bytes& data) { return receiveOnChannel(number, messageId, data); });
+    if (!port) {
+        SystemLog::log(SystemLog::kError, "Telephony service: no log channel for %s: cannot listen on %s",
+                       clientPortName.c_str(), name.c_str());
+        return channelReply(kBackendFailed, "");
+    }
+    port->setInvalidationCallback([this, number](LocalMessagePort*) { scheduleClose(number, "the client closed it"); });
+    client->setInvalidationCallback(
+        [this, number](RemoteMessagePort*) { scheduleClose(number, "the client's receive port went away"); });
+    connect(client.get(), &RemoteMessagePort::drained, this, [this, number] {
+        auto it = channels_.find(number);
+        if (it == channels_.end() || !it->second->congested) return;
+        it->second->congested = false;
+        updateFlow();
+    });
+
+    auto channel = std::make_unique<Channel>();
+    channel->number = number;
+    channel->clientPortName = clientPortName;
+    channel->port = std::move(port);
+    channel->client = std::move(client);
+    channels_[number] = std::move(channel);
+    ++counters_.channelsServed;
+    statusLine(StringFormat::format("client connected: channel %llu on %s for %s; %zu open",
+                                    static_cast<unsigned long long>(number), name.c_str(), clientPortName.c_str(),
+                                    channels_.size()));
+    return channelReply(kNoError, name);
+}
+
+// ---- channels ----
+
+std::optional<Bytes> TelephonyService::receiveOnChannel(uint64_t number, int32_t messageId, const Bytes& data) {
+    auto it = channels_.find(number);
+    if (it == channels_.end() || it->second->closing) return std::nullopt;
+    Channel& channel = *it->second;
+    auto malformed = [&](const char* why) -> std::optional<Bytes> {
+        ++counters_.malformedRequests;
+        SystemLog::log(SystemLog::kWarning, "Telephony service: channel %llu: ignoring a message (%s)",
+                       static_cast<unsigned long long>(number), why);
+        return std::nullopt;
+    };
+    if (messageId != kChannelMessageId) return malformed("unknown message id");
+    const PropertyListResult parsed = PropertyListSerialization::readDictionary(data);
+    if (!parsed) return malformed("not a property-list dictionary");
+    const DictionaryRef command = parsed.value->asDictionary();
+
+    if (command->contains("GetTechnology")) {
+        auto reply = Dictionary::create();
+        reply->set("GetTechnology", Value(backend_->technology()));
+        return xml(reply);
+    }
+    if (const Value* state = command->find("SetState")) {
+        const std::string* text = state->asString();
+        if (text && *text == "Streaming") {
+            startStreaming(channel, *command);
+        } else if (channel.streaming) {
+            channel.streaming = false;
+            statusLine(StringFormat::format("channel %llu stopped streaming", static_cast<unsigned long long>(number)));
+            updateFlow();
+        }
+        return std::nullopt;
+    }
+    return malformed("unknown command");
+}
+
+void TelephonyService::startStreaming(Channel& channel, const Dictionary& command) {
+    std::string problem;
+    channel.mask = LogMask::fromStartCommand(command, &problem);
+    if (!problem.empty())
+        SystemLog::log(SystemLog::kWarning, "Telephony service: channel %llu: %s",
+                       static_cast<unsigned long long>(channel.number), problem.c_str());
+    bool othersStreaming = false;
+    for (const auto& entry : channels_)
+        if (entry.second.get() != &channel && entry.second->streaming && !entry.second->closing) othersStreaming = true;
+    channel.streaming = true;
+    statusLine(StringFormat::format("channel %llu streaming (%s)", static_cast<unsigned long long>(channel.number),
+                                    channel.mask.description().c_str()));
+    const ModemBackend::State state = backend_->state();
+    // A finished replay starts over for a client that comes after it, not under a
+    // client that is still watching it.
+    if (state == ModemBackend::State::Idle || (state == ModemBackend::State::Finished && !othersStreaming))
+        backend_->start();
+    updateFlow();
+}
+
+void TelephonyService::scheduleClose(uint64_t number, const char* why) {
+    auto it = channels_.find(number);
+    if (it == channels_.end() || it->second->closing) return;
+    it->second->closing = true;
+    const std::string reason = why;
+    QMetaObject::invokeMethod(this, [this, number, reason] { closeChannel(number, reason); }, Qt::QueuedConnection);
+}
+
+void TelephonyService::closeChannel(uint64_t number, const std::string& why) {
+    auto it = channels_.find(number);
+    if (it == channels_.end()) return;
+    std::unique_ptr<Channel> channel = std::move(it->second);
+    channels_.erase(it);
+    channel->port->setInvalidationCallback(nullptr);
+    channel->client->setInvalidationCallback(nullptr);
+    disconnect(channel->client.get(), nullptr, this, nullptr);
+    malformedFromClosedPorts_ += channel->port->malformedFrames();
+    channel->port->invalidate();
+    channel->client->invalidate();
+    statusLine(StringFormat::format("client left: channel %llu closed (%s) after %llu messages; %zu open",
+                                    static_cast<unsigned long long>(number), why.c_str(),
+                                    static_cast<unsigned long long>(channel->sent), channels_.size()));
+    if (stopping_) return;
+    // Nobody listens any more: the modem's logging is switched off (docs/protocol.md).
+    if (channels_.empty() && backend_ && backend_->state() == ModemBackend::State::Streaming) {
+        backend_->stop();
+        statusLine("no client left: backend stopped");
+    }
+    updateFlow();
+}
+
+// ---- streaming ----
+
+void TelephonyService::sendMessage(int32_t messageId, const Bytes& data) {
+    bool sent = false;
+    bool congestion = false;
+    for (auto& [number, channel] : channels_) {
+        if (!channel->streaming || channel->closing || !channel->mask.forwards(data)) continue;
+        if (!channel->client->post(messageId, data)) {
+            scheduleClose(number, "the client's receive port went away");
+            continue;
+        }
+        sent = true;
+        ++channel->sent;
+        ++counters_.messagesSent;
+        if (!channel->congested && channel->client->bytesPending() >= kHighWaterBytes) {
+            channel->congested = true;
+            congestion = true;
+        }
+    }
+    if (sent && recorder_) {
+        if (recorder_->write(CaptureWriter::nowMicros(), messageId, data)) {
+            ++counters_.messagesRecorded;
+        } else {
+            SystemLog::log(SystemLog::kError, "Telephony service: recording stopped: %s", recorder_->error().c_str());
+            recorder_.reset();
+        }
+    }
+    if (congestion) updateFlow();
+}
+
+void TelephonyService::updateFlow() {
+    if (!backend_) return;
+    bool streaming = false;
+    bool congested = false;
+    for (const auto& entry : channels_) {
+        const Channel& channel = *entry.second;
+        if (!channel.streaming || channel.closing) continue;
+        streaming = true;
+        congested = congested || channel.congested;
+    }
+    backend_->setPaused(!streaming || congested);
+}
+
+void TelephonyService::backendStateChanged(ModemBackend::State state) {
+    auto info = Dictionary::create();
+    info->set("State", Value(ModemBackend::stateName(state)));
+    info->set("Technology", Value(backend_->technology()));
+    auto notification = Dictionary::create();
+    notification->set("Name", Value("BackendStateChanged"));
+    notification->set("Info", Value(info));
+    if (port_) port_->broadcastNotification(kNotificationMessageId, xml(notification));
+
+    if (state == ModemBackend::State::Finished) {
+        const auto* replay = qobject_cast<const ReplayBackend*>(backend_.get());
+        const RecordedLog* report = replay ? &replay->stream().report() : nullptr;
+        statusLine(StringFormat::format(
+            "replay finished: %llu messages replayed, %llu sent to clients; bad frames: %zu in the file, %llu from clients",
+            static_cast<unsigned long long>(backend_->messagesEmitted()),
+            static_cast<unsigned long long>(counters_.messagesSent),
+            report ? report->badCrc + report->malformed + report->truncated : 0,
+            static_cast<unsigned long long>(malformedFramesNow())));
+    } else if (state == ModemBackend::State::Failed) {
+        statusLine("backend failed");
+    }
+    if (recorder_) recorder_->flush();
+}
+
+void TelephonyService::checkHealth() {
+    const uint64_t malformed = malformedFramesNow();
+    if (malformed > malformedReported_) {
+        statusLine(StringFormat::format("%llu malformed frames from clients so far (connections closed, still serving)",
+                                        static_cast<unsigned long long>(malformed)));
+        malformedReported_ = malformed;
+    }
+    // A client that died without its invalidation reaching us.
+    for (const auto& entry : channels_)
+        if (!entry.second->closing && !entry.second->client->isValid())
+            scheduleClose(entry.first, "the client's receive port went away");
+    if (recorder_) recorder_->flush();
+}
+
+}  // namespace vantorel

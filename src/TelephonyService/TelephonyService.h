@@ -1,0 +1,147 @@
+// TelephonyService: the telephony service the model talks to: a well-known message port, network-monitor log channels with their log masks, a modem backend, recording (DESIGN.md "The telephony service"; Parts 2.1, 2.2, 3.2; docs/protocol.md).
+#pragma once
+
+#include "PropertyList/Value.h"
+#include "TelephonyService/LogMask.h"
+#include "TelephonyService/ModemBackend.h"
+
+#include <QObject>
+#include <QTimer>
+
+#include <chrono>
+#include <cstdint>
+#include <functional>
+#include <map>
+#include <memory>
+#include <optional>
+#include <string>
+
+namespace vantorel {
+
+class CaptureWriter;
+class LocalMessagePort;
+class RemoteMessagePort;
+
+// What the service runs, as vantorel-telephonyd's options say it.
+struct TelephonyServiceOptions {
+    std::string portName;    // the well-known port; empty: TelephonyServiceConnection::defaultServiceName()
+    std::string emulate;     // --emulate TECH (exactly one of emulate / replay)
+    std::string replay;      // --replay FILE
+    std::string technology;  // --technology TECH, for files that do not carry one
+    double speed = 1.0;      // --speed X (replay)
+    bool loop = false;       // --loop (replay)
+    std::string record;      // --record FILE: every message sent, as a capture
+    uint64_t seed = 1;       // emulator scenario seed
+    std::chrono::milliseconds tickInterval{0};  // emulator tick; zero: the scenario's
+    // Builds the backend instead of emulate / replay (tests, embedders); called on the
+    // service's thread.
+    std::function<std::unique_ptr<ModemBackend>()> backendFactory;
+};
+
+// The service side of docs/protocol.md:
+//   - the well-known port answers a Request with message id 1 and the XML plist
+//     {"Request": "CreateLogChannel", "PortName": <client's receive port>} with
+//     {"ErrorDomain", "ErrorCode", "PortName"}: 0/0 and the channel's port name, or
+//     domain 1 with code 1 (malformed request), 2 (client port unreachable),
+//     3 (backend failed) and an empty name;
+//   - each channel has a port "<well-known name>.channel.<pid>.<n>" that answers
+//     {"GetTechnology": ...} with {"GetTechnology": <identifier>} and takes the start
+//     command {"SetState": "Streaming", "SetMorvekLogCodes": [...], "SetTsExtraCodes": [...]}
+//     as the channel's log mask (LogMask); another "SetState" stops the channel's stream;
+//   - messages go to the client's receive port as Message frames, one record each, only
+//     while the channel streams and only those its mask forwards;
+//   - backend state changes are broadcast to the well-known port's connected clients as
+//     Notification frames (id 0) {"Name": "BackendStateChanged", "Info": {"State", "Technology"}}.
+// The backend starts on the first start command (and again after a finished replay when
+// a start command comes while no channel streams) and stops when the last channel is
+// freed (a replay then starts over for the next client; the emulator's ticks go on
+// counting). A replay waits (is paused) while no channel streams or while a client has
+// more than kHighWaterBytes not yet taken. A client that goes away (its receive port, or
+// its connection to the channel port) frees its channel. Everything runs on the thread
+// that calls start(); the receive callbacks come from that thread's event loop.
+class TelephonyService : public QObject {
+    Q_OBJECT
+public:
+    static constexpr int32_t kCreateLogChannelMessageId = 1;
+    static constexpr int32_t kChannelMessageId = 0;
+    static constexpr int32_t kNotificationMessageId = 0;
+    static constexpr int32_t kErrorDomain = 1;
+    enum ErrorCode : int32_t { kNoError = 0, kMalformedRequest = 1, kClientPortUnreachable = 2, kBackendFailed = 3 };
+    static constexpr int64_t kHighWaterBytes = 1 << 20;
+    static constexpr int kClientLookupTimeoutMs = 500;
+
+    struct Counters {
+        uint64_t messagesSent = 0;       // Message frames posted to clients (one per channel)
+        uint64_t messagesRecorded = 0;   // messages written by --record
+        uint64_t channelsServed = 0;     // channels created since start
+        uint64_t openChannels = 0;       // channels open now
+        uint64_t malformedFrames = 0;    // invalid frames the ports received from clients
+        uint64_t malformedRequests = 0;  // valid frames whose content was not a request we know
+    };
+    using StatusCallback = std::function<void(const std::string& line)>;
+
+    explicit TelephonyService(TelephonyServiceOptions options, QObject* parent = nullptr);
+    ~TelephonyService() override;
+
+    // The backend the options ask for; null with *error set (unknown technology, file
+    // missing or unreadable, no scenario yet, a QMDL / DLF file without --technology, ...).
+    static std::unique_ptr<ModemBackend> createBackend(const TelephonyServiceOptions& options, std::string* error);
+
+    // Builds the backend and the recorder and listens on the well-known port; false with
+    // *error set when any of it fails (then nothing is left open).
+    bool start(std::string* error);
+    // Closes every channel and the port, stops the backend, flushes the recording.
+    void stop();
+    bool isListening() const;
+
+    const std::string& portName() const { return portName_; }
+    ModemBackend* backend() const { return backend_.get(); }
+    Counters counters() const;
+    // "listening on <port>, backend <description>, technology <identifier>"
+    std::string startupLine() const;
+
+    // Progress lines (a client came or went, a replay ended), on the service's thread.
+    void setStatusCallback(StatusCallback callback) { status_ = std::move(callback); }
+
+private:
+    struct Channel {
+        uint64_t number = 0;
+        std::string clientPortName;
+        std::unique_ptr<LocalMessagePort> port;
+        std::unique_ptr<RemoteMessagePort> client;
+        bool streaming = false;
+        bool congested = false;
+        bool closing = false;
+        LogMask mask;
+        uint64_t sent = 0;
+    };
+
+    std::optional<Bytes> receiveOnServicePort(int32_t messageId, const Bytes& data);
+    Bytes createLogChannel(const std::string& clientPortName);
+    std::optional<Bytes> receiveOnChannel(uint64_t number, int32_t messageId, const Bytes& data);
+    void startStreaming(Channel& channel, const Dictionary& command);
+    // Frees the channel from the event loop (never inside one of its ports' callbacks).
+    void scheduleClose(uint64_t number, const char* why);
+    void closeChannel(uint64_t number, const std::string& why);
+    void sendMessage(int32_t messageId, const Bytes& data);
+    void backendStateChanged(ModemBackend::State state);
+    void updateFlow();
+    void checkHealth();
+    void statusLine(const std::string& line);
+    uint64_t malformedFramesNow() const;
+
+    TelephonyServiceOptions options_;
+    std::string portName_;
+    std::unique_ptr<ModemBackend> backend_;
+    std::unique_ptr<CaptureWriter> recorder_;
+    std::unique_ptr<LocalMessagePort> port_;
+    std::map<uint64_t, std::unique_ptr<Channel>> channels_;
+    QTimer healthTimer_;
+    StatusCallback status_;
+    Counters counters_;
+    uint64_t malformedFromClosedPorts_ = 0;
+    uint64_t malformedReported_ = 0;
+    bool stopping_ = false;
+};
+
+}  // namespace vantorel

@@ -1,0 +1,97 @@
+// vantorel-telephonyd: the telephony service as a program of its own, on the modem emulator or a recorded stream (DESIGN.md "The telephony service"; docs/protocol.md).
+#include "Platform/QuitOnSignal.h"
+#include "Platform/SystemLog.h"
+#include "Platform/TechnologyNames.h"
+#include "Platform/TelephonyServiceConnection.h"
+#include "TelephonyService/TelephonyService.h"
+
+#include <QCommandLineParser>
+#include <QCoreApplication>
+
+#include <cstdio>
+#include <string>
+
+using namespace vantorel;
+
+namespace {
+
+int fail(const std::string& text) {
+    std::fprintf(stderr, "vantorel-telephonyd: %s\n", text.c_str());
+    return 1;
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    QCoreApplication app(argc, argv);
+    QCoreApplication::setApplicationName(QStringLiteral("vantorel-telephonyd"));
+
+    const QString names = QString::fromStdString(TechnologyNames::listing());
+    QCommandLineParser parser;
+    parser.setApplicationDescription(QStringLiteral(
+        "Vantorel's telephony service: answers GetTechnology, applies each log channel's log mask and streams "
+        "the modem's records, from the modem emulator or a recorded stream."));
+    parser.addHelpOption();
+    const QCommandLineOption emulate(QStringLiteral("emulate"),
+                                     QStringLiteral("Run the modem emulator for TECH (%1).").arg(names),
+                                     QStringLiteral("TECH"));
+    const QCommandLineOption replay(QStringLiteral("replay"),
+                                    QStringLiteral("Replay FILE: a capture, a QXDM DLF or a QMDL / mi2log file."),
+                                    QStringLiteral("FILE"));
+    const QCommandLineOption speed(QStringLiteral("speed"),
+                                   QStringLiteral("Replay pace: 1 as recorded, 2 twice as fast, 0 as fast as the "
+                                                  "client takes it (default 1). Recorded pauses over 10 s are cut to 10 s."),
+                                   QStringLiteral("X"), QStringLiteral("1"));
+    const QCommandLineOption loop(QStringLiteral("loop"), QStringLiteral("Start the replay over at its end."));
+    const QCommandLineOption technology(
+        QStringLiteral("technology"),
+        QStringLiteral("The technology of a replayed file that does not carry one (QMDL, DLF): %1.").arg(names),
+        QStringLiteral("TECH"));
+    const QCommandLineOption record(QStringLiteral("record"),
+                                    QStringLiteral("Write every message sent to FILE, as a capture."),
+                                    QStringLiteral("FILE"));
+    const QCommandLineOption port(QStringLiteral("port"),
+                                  QStringLiteral("The service's well-known port (default %1).")
+                                      .arg(QString::fromStdString(TelephonyServiceConnection::defaultServiceName())),
+                                  QStringLiteral("NAME"));
+    const QCommandLineOption verbose(QStringLiteral("verbose"), QStringLiteral("Mirror the system log to stderr."));
+    parser.addOptions({emulate, replay, speed, loop, technology, record, port, verbose});
+    parser.process(app);  // --help and unknown options end here
+
+    if (!parser.positionalArguments().isEmpty())
+        return fail("unexpected argument " + parser.positionalArguments().first().toStdString() + " (see --help)");
+    if (parser.isSet(emulate) == parser.isSet(replay)) return fail("give exactly one of --emulate TECH and --replay FILE");
+    if (parser.isSet(emulate) && (parser.isSet(speed) || parser.isSet(loop) || parser.isSet(technology)))
+        return fail("--speed, --loop and --technology apply to --replay only");
+
+    TelephonyServiceOptions options;
+    options.emulate = parser.value(emulate).toStdString();
+    options.replay = parser.value(replay).toStdString();
+    options.technology = parser.value(technology).toStdString();
+    options.loop = parser.isSet(loop);
+    options.record = parser.value(record).toStdString();
+    options.portName = parser.value(port).toStdString();
+    bool speedOk = false;
+    options.speed = parser.value(speed).toDouble(&speedOk);
+    if (!speedOk || options.speed < 0)
+        return fail("--speed " + parser.value(speed).toStdString() + ": give a number, 0 or more");
+    SystemLog::setMirrorToStderr(parser.isSet(verbose));
+
+    const QuitOnSignal quitOnSignal;  // SIGINT / SIGTERM end app.exec() below
+
+    TelephonyService service(options);
+    service.setStatusCallback([](const std::string& line) { std::fprintf(stderr, "vantorel-telephonyd: %s\n", line.c_str()); });
+    std::string error;
+    if (!service.start(&error)) return fail(error);
+    std::fprintf(stderr, "vantorel-telephonyd: %s\n", service.startupLine().c_str());
+
+    const int status = app.exec();
+    service.stop();
+    const TelephonyService::Counters c = service.counters();
+    std::fprintf(stderr,
+                 "vantorel-telephonyd: stopped: %llu messages sent, %llu recorded, %llu channels served, %llu malformed "
+                 "frames\n",
+                 static_cast<unsigned long long>(c.messagesSent), static_cast<unsigned long long>(c.messagesRecorded),
+                 static_cast<unsigned long long>(c.channelsServed), static_cast<unsigned long long>(c.malformedFrames));
+    return status;
+}

@@ -1,0 +1,77 @@
+// MonitorLauncher: the monitor on an embedded or external telephony service (DESIGN.md "Threads": an in-process service runs on its own thread).
+#include "cli/MonitorLauncher.h"
+
+#include "Model/VantorelModel.h"
+#include "Platform/TechnologyNames.h"
+
+#include <QCommandLineParser>
+#include <QMetaObject>
+
+#include <unistd.h>
+
+namespace vantorel {
+
+void MonitorLauncher::addOptions(QCommandLineParser& parser) {
+    const QString techs = QString::fromStdString(TechnologyNames::listing());
+    parser.addOption({"emulate", "Run the built-in modem emulator for TECH (" + techs + ").", "TECH"});
+    parser.addOption({"replay", "Replay a recorded stream: QXDM DLF, QMDL/mi2log or a Vantorel capture.", "FILE"});
+    parser.addOption({"service", "Watch a running vantorel-telephonyd listening on port NAME.", "NAME"});
+    parser.addOption({"technology", "Technology of a replayed file that does not carry one (" + techs + ").", "TECH"});
+    parser.addOption({"speed", "Replay pace: 1 = as recorded, 2 = twice as fast, 0 = as fast as taken.", "X", "1"});
+    parser.addOption({"loop", "Start the replay again at its end."});
+}
+
+std::optional<MonitorLauncher::Source> MonitorLauncher::sourceFrom(const QCommandLineParser& parser,
+                                                                    std::string* error) {
+    Source s;
+    s.emulate = parser.value("emulate").toStdString();
+    s.replay = parser.value("replay").toStdString();
+    s.service = parser.value("service").toStdString();
+    s.technology = parser.value("technology").toStdString();
+    s.loop = parser.isSet("loop");
+    bool ok = false;
+    s.speed = parser.value("speed").toDouble(&ok);
+    if (!ok || s.speed < 0) {
+        *error = "--speed takes a number of 0 or more (1 = as recorded, 0 = as fast as taken)";
+        return std::nullopt;
+    }
+    const int chosen = !s.emulate.empty() + !s.replay.empty() + !s.service.empty();
+    if (chosen > 1) {
+        *error = "choose one of --emulate, --replay and --service";
+        return std::nullopt;
+    }
+    if (chosen == 0) s.emulate = "utran";  // the embedded default
+    return s;
+}
+
+MonitorLauncher::MonitorLauncher() = default;
+
+MonitorLauncher::~MonitorLauncher() {
+    model_.reset();  // closes the ports before the service goes
+    if (service_) service_->stop();
+}
+
+bool MonitorLauncher::start(const Source& source, ApplicationObject* application, std::string* error) {
+    std::string serviceName = source.service;
+    if (source.service.empty()) {
+        TelephonyServiceOptions options;
+        options.portName = "vantorel.embedded." + std::to_string(getpid());
+        options.emulate = source.emulate;
+        options.replay = source.replay;
+        options.technology = source.technology;
+        options.speed = source.speed;
+        options.loop = source.loop;
+        service_ = std::make_unique<TelephonyServiceThread>(options);
+        if (!service_->start(error)) return false;
+        serviceName = service_->portName();
+        description_ = source.replay.empty() ? "emulator (" + source.emulate + ")" : "replay of " + source.replay;
+    } else {
+        description_ = "service " + source.service;
+    }
+    model_ = std::make_unique<VantorelModel>(application, serviceName);
+    VantorelModel* model = model_.get();
+    QMetaObject::invokeMethod(model, [model] { model->restartMonitor(); }, Qt::QueuedConnection);
+    return true;
+}
+
+}  // namespace vantorel

@@ -1,0 +1,50 @@
+// MonitorLauncher: starts the monitor (VantorelModel, Parts 2.1-2.2) on a chosen source: an in-process service running the emulator or a replay, or a running service by name.
+#pragma once
+
+#include "TelephonyService/TelephonyServiceThread.h"
+
+#include <memory>
+#include <string>
+
+class QCommandLineParser;
+
+namespace vantorel {
+
+class ApplicationObject;
+class VantorelModel;
+
+class MonitorLauncher {
+public:
+    struct Source {
+        std::string emulate;     // --emulate TECH
+        std::string replay;      // --replay FILE
+        std::string service;     // --service NAME: a running vantorel-telephonyd
+        std::string technology;  // --technology TECH (replays of files that carry none)
+        double speed = 1.0;
+        bool loop = false;
+    };
+
+    // --emulate, --replay, --service, --technology, --speed, --loop.
+    static void addOptions(QCommandLineParser& parser);
+    // The source the options name; with none of --emulate/--replay/--service, the
+    // embedded default: the emulator's UTRAN scenario. Empty with *error on bad use.
+    static std::optional<Source> sourceFrom(const QCommandLineParser& parser, std::string* error);
+
+    MonitorLauncher();
+    ~MonitorLauncher();
+
+    // Starts the in-process service when the source needs one (on its own thread),
+    // creates the model for `application` and queues restartMonitor on the event
+    // loop. False with *error when the service cannot start.
+    bool start(const Source& source, ApplicationObject* application, std::string* error);
+    VantorelModel* model() const { return model_.get(); }
+    // "emulator (utran)", "replay of FILE", "service NAME".
+    std::string description() const { return description_; }
+
+private:
+    std::unique_ptr<TelephonyServiceThread> service_;
+    std::unique_ptr<VantorelModel> model_;
+    std::string description_;
+};
+
+}  // namespace vantorel

@@ -1,0 +1,26 @@
+// TreeFormatter: the display as text: the tree as the panes show it (Part 2.3), the display dictionary as JSON or as an XML property list.
+#pragma once
+
+#include "Model/VantorelModelNode.h"
+#include "PropertyList/Value.h"
+
+#include <string>
+
+namespace vantorel {
+
+class TreeFormatter {
+public:
+    enum class Format { Tree, Json, Plist };
+    // "tree", "json", "plist" → the format; empty when unknown.
+    static std::optional<Format> parse(const std::string& name);
+
+    // Rows as the panes show them: sorted order, shown names, "(unknown)"; a row
+    // that drills down is followed by its children, indented two blanks a level.
+    static std::string tree(const NodeRef& root);
+    // The display dictionary itself (data as base64, dates as ISO 8601 text).
+    static std::string json(const Value& display);
+    static std::string plist(const Value& display);
+    static std::string format(Format f, const Value& display);
+};
+
+}  // namespace vantorel

@@ -1,0 +1,58 @@
+// Tests for TreeFormatter: the display as the panes show it (Part 2.3), as JSON and as an XML property list.
+#include "cli/TreeFormatter.h"
+
+#include "PropertyList/Array.h"
+#include "PropertyList/Dictionary.h"
+#include "PropertyList/PropertyListSerialization.h"
+
+#include <QJsonDocument>
+#include <QJsonObject>
+#include <gtest/gtest.h>
+
+using namespace vantorel;
+
+namespace {
+Value sampleDisplay() {
+    auto cell = Dictionary::create();
+    cell->set("State", "Cell DCH");
+    cell->set("Count", Value::integer(3));
+    auto root = Dictionary::create();
+    root->set("_sorted", "_sorted");
+    root->set("2;Lists", Value(Array::of({"a"})));
+    root->set("1;RRC Info", Value(cell));
+    root->set("3;Empty", Value(Array::create()));
+    return Value(root);
+}
+}  // namespace
+
+TEST(TreeFormatter, TreeShowsSortedShownNamesUnknownAndEmptyRows) {
+    EXPECT_EQ(TreeFormatter::format(TreeFormatter::Format::Tree, sampleDisplay()),
+              "RRC Info\n"
+              "  State: Cell DCH\n"
+              "  Count: (unknown)\n"
+              "Lists\n"
+              "  0: a\n"
+              "Empty (empty)\n");
+}
+
+TEST(TreeFormatter, JsonIsTheDisplayDictionary) {
+    const std::string json = TreeFormatter::format(TreeFormatter::Format::Json, sampleDisplay());
+    QJsonParseError error;
+    QJsonDocument doc = QJsonDocument::fromJson(QByteArray::fromStdString(json), &error);
+    ASSERT_EQ(error.error, QJsonParseError::NoError);
+    EXPECT_EQ(doc.object()["1;RRC Info"].toObject()["State"].toString(), "Cell DCH");
+    EXPECT_EQ(doc.object()["1;RRC Info"].toObject()["Count"].toInt(), 3);
+    EXPECT_EQ(TreeFormatter::json(Value()), "null\n");
+}
+
+TEST(TreeFormatter, PlistRoundTripsThroughLibplist) {
+    const std::string xml = TreeFormatter::format(TreeFormatter::Format::Plist, sampleDisplay());
+    auto back = PropertyListSerialization::read(ByteView(reinterpret_cast<const uint8_t*>(xml.data()), xml.size()));
+    ASSERT_TRUE(back);
+    EXPECT_EQ(*back.value, sampleDisplay());
+}
+
+TEST(TreeFormatter, FormatNamesParse) {
+    EXPECT_EQ(TreeFormatter::parse("json"), TreeFormatter::Format::Json);
+    EXPECT_FALSE(TreeFormatter::parse("yaml"));
+}

@@ -1,0 +1,70 @@
+// FakeTelephonyService: a telephony service for the model's tests (Parts 2.1, 2.2), built from the real message ports on its own thread, whose answers a test can change.
+#pragma once
+
+#include "Platform/TelephonyIdentifiers.h"
+#include "PropertyList/Value.h"
+
+#include <QThread>
+
+#include <atomic>
+#include <memory>
+#include <mutex>
+#include <string>
+#include <vector>
+
+namespace vantorel::testing {
+
+class FakeServiceWorker;
+
+struct FakeServiceBehaviour {
+    std::string technology = kTSLogChannelTechnology_Morvek_UTRAN2;
+    bool answerGetTechnology = true;  // false: a modem that never answers the query
+    bool answerWithPlist = true;      // false: an answer that is not a property list
+    bool answerHasTechnology = true;  // false: a dictionary without "GetTechnology"
+    int32_t channelErrorCode = 0;     // non-zero: CreateLogChannel fails
+    bool emptyPortName = false;       // the service returns no channel port
+};
+
+class FakeTelephonyService {
+public:
+    using Behaviour = FakeServiceBehaviour;
+
+    explicit FakeTelephonyService(Behaviour behaviour = Behaviour());
+    ~FakeTelephonyService();
+
+    const std::string& name() const { return name_; }
+    void setBehaviour(const Behaviour& behaviour);
+
+    // On the service thread: sends one message to the newest channel's client port.
+    bool send(const Bytes& data, int32_t messageId = 0);
+    // Closes the newest channel's own port (the model's send port dies).
+    void closeChannelPort();
+    // Drops the connection to the newest client's receive port (the model's receive
+    // port is invalidated from outside).
+    void dropClient();
+    // Pushes a notification to every server connection.
+    void notify(const std::string& name);
+
+    int channelsCreated() const { return channels_.load(); }
+    int getTechnologyRequests() const { return queries_.load(); }
+    // The start commands received, as parsed dictionaries.
+    std::vector<Value> startCommands() const;
+    std::vector<std::string> clientPortNames() const;
+
+private:
+    friend class FakeServiceWorker;
+    std::string name_;
+    QThread thread_;
+    FakeServiceWorker* worker_ = nullptr;
+    mutable std::mutex mutex_;
+    Behaviour behaviour_;
+    std::vector<Value> startCommands_;
+    std::vector<std::string> clientPorts_;
+    std::atomic<int> channels_{0};
+    std::atomic<int> queries_{0};
+};
+
+// Runs the Qt event loop until `done` is true or `timeoutMs` passes; true when done.
+bool processEventsUntil(const std::function<bool()>& done, int timeoutMs);
+
+}  // namespace vantorel::testing
