@@ -1,6 +1,8 @@
 // MessagePortFrame: encoding and stream decoding of message-port frames (docs/protocol.md; spec Overview "Platform interfaces", Part 2.1).
 #include "Platform/MessagePortFrame.h"
 
+#include <algorithm>
+
 #include "Platform/ByteReader.h"
 #include "Platform/StringFormat.h"
 
@@ -16,12 +18,12 @@ void putU32(Bytes& out, size_t offset, uint32_t v) {
 
 Bytes MessagePortFrame::encode() const {
     // Header layout in MessagePortFrame.h; the reserved u16 at 2-3 stays 0.
-    Bytes out(kHeaderLength, 0);
+    Bytes out(kHeaderLength + data.size(), 0);
     out[0] = static_cast<uint8_t>(kind);
     out[1] = kVersion;
     putU32(out, 4, static_cast<uint32_t>(messageId));
     putU32(out, 8, static_cast<uint32_t>(data.size()));
-    out.insert(out.end(), data.begin(), data.end());
+    std::copy(data.begin(), data.end(), out.begin() + kHeaderLength);
     return out;
 }
 

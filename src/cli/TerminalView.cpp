@@ -8,6 +8,7 @@
 #include <QDateTime>
 #include <QTimer>
 
+#include <sys/ioctl.h>
 #include <unistd.h>
 
 namespace vantorel {
@@ -46,17 +47,31 @@ std::string TerminalView::screen() const {
         text += " - " + std::to_string(model_->messagesDecoded()) + " messages decoded";
     }
     text += "\n\n";
-    if (model_) text += TreeFormatter::tree(model_->topLevelNodes());
+    if (model_) text += TreeFormatter::compactTree(model_->topLevelNodes());
     return text;
 }
 
 void TerminalView::updateViewControllerFromModel() {
     ++refreshes_;
     status_ = QDateTime::currentDateTime().toString(QStringLiteral("'Updated' yyyy-MM-dd 'at' HH:mm:ss")).toStdString();
-    const std::string text = screen();
-    if (interactive_)
+    std::string text = screen();
+    if (interactive_) {
+        // Keep the top of the display in view: cut to the window's height.
+        winsize size{};
+        if (::ioctl(fileno(out_), TIOCGWINSZ, &size) == 0 && size.ws_row > 2) {
+            size_t rows = 0, pos = 0;
+            while (pos != std::string::npos && rows + 1 < size.ws_row) {
+                pos = text.find('\n', pos);
+                if (pos != std::string::npos) ++pos, ++rows;
+            }
+            if (pos != std::string::npos && pos < text.size()) {
+                size_t hidden = 0;
+                for (size_t i = pos; i < text.size(); ++i) hidden += text[i] == '\n';
+                text = text.substr(0, pos) + "... " + std::to_string(hidden) + " more rows (a taller window shows them)";
+            }
+        }
         std::fprintf(out_, "\x1b[H\x1b[2J%s", text.c_str());  // home, clear, then the screen
-    else
+    } else
         std::fprintf(out_, "----\n%s", text.c_str());
     std::fflush(out_);
 }

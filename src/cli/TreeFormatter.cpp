@@ -14,17 +14,42 @@ namespace vantorel {
 
 namespace {
 
-void appendRows(const NodeRef& node, int depth, std::string& out) {
+bool onlyLeaves(const NodeRef& node) {
+    const auto* children = node->childNodes();
+    if (!children || children->empty()) return false;
+    for (const NodeRef& c : *children)
+        if (!c->value()) return false;
+    return true;
+}
+
+// "UARFCN 10096 | Cell ID 120" for a node of named values; "13 16 13" for a list.
+std::string oneLine(const NodeRef& node, bool withNames) {
+    std::string line;
+    for (const NodeRef& c : *node->childNodes()) {
+        if (!line.empty()) line += withNames ? " | " : " ";
+        line += withNames ? c->displayName() + " " + *c->value() : *c->value();
+    }
+    return line;
+}
+
+void appendRows(const NodeRef& node, int depth, bool compact, std::string& out) {
     const auto* children = node->childNodes();
     if (!children) return;
+    // Array rows are named 0, 1, 2...: a node whose first child is "0" is a list.
+    const bool isList = !children->empty() && (*children)[0]->displayName() == "0";
     for (const NodeRef& child : *children) {
         out.append(static_cast<size_t>(depth) * 2, ' ');
         out += child->displayName();
         if (const std::string* v = child->value()) {
             out += ": " + *v + "\n";
+        } else if (child->childNodes()->empty()) {
+            out += " (empty)\n";
+        } else if (compact && onlyLeaves(child) && (isList || (*child->childNodes())[0]->displayName() == "0")) {
+            const bool named = (*child->childNodes())[0]->displayName() != "0";
+            out += ": " + oneLine(child, named) + "\n";
         } else {
-            out += child->childNodes()->empty() ? " (empty)\n" : "\n";
-            appendRows(child, depth + 1, out);
+            out += "\n";
+            appendRows(child, depth + 1, compact, out);
         }
     }
 }
@@ -69,7 +94,13 @@ std::optional<TreeFormatter::Format> TreeFormatter::parse(const std::string& nam
 
 std::string TreeFormatter::tree(const NodeRef& root) {
     std::string out;
-    if (root) appendRows(root, 0, out);
+    if (root) appendRows(root, 0, false, out);
+    return out;
+}
+
+std::string TreeFormatter::compactTree(const NodeRef& root) {
+    std::string out;
+    if (root) appendRows(root, 0, true, out);
     return out;
 }
 

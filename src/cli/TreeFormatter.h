@@ -17,6 +17,10 @@ public:
     // Rows as the panes show them: sorted order, shown names, "(unknown)"; a row
     // that drills down is followed by its children, indented two blanks a level.
     static std::string tree(const NodeRef& root);
+    // The terminal view's denser form of the same rows: a list whose entries hold only
+    // values shows one line per entry ("0: UARFCN 10096 | Cell ID 120 | ..."), and a
+    // list of plain values one line ("SIR: 13 16 13 12 14 12").
+    static std::string compactTree(const NodeRef& root);
     // The display dictionary itself (data as base64, dates as ISO 8601 text).
     static std::string json(const Value& display);
     static std::string plist(const Value& display);

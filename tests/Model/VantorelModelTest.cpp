@@ -65,8 +65,8 @@ TEST_F(VantorelModelTest, AMessageWithANonZeroMessageIdIsDroppedWithoutTouchingT
     auto model = runningModel();
     ASSERT_TRUE(service.send(rrcRecord(3), 7));
     ASSERT_TRUE(service.send(rrcRecord(2), 0));
-    ASSERT_TRUE(processEventsUntil([&] { return model->messagesDecoded() == 1; }, 2000));
-    processEventsUntil([] { return false; }, 100);
+    ASSERT_TRUE(waitUntil([&] { return model->messagesDecoded() == 1; }, 2000));
+    spin(100);
     EXPECT_EQ(model->messagesDecoded(), 1u);
 }
 
@@ -74,7 +74,7 @@ TEST_F(VantorelModelTest, ClosingThePortsThroughDestroyPortsNeverLogsInvalidated
     auto model = runningModel();
     const int channels = service.channelsCreated();
     model->destroyPorts();
-    processEventsUntil([] { return false; }, 300);
+    spin(300);
     EXPECT_FALSE(anyLineStartsWith(" ***** INVALIDATED"));
     EXPECT_EQ(service.channelsCreated(), channels);
     EXPECT_FALSE(model->isConnected());
@@ -86,9 +86,9 @@ TEST_F(VantorelModelTest, AnInvalidationFromOutsideAlwaysLogsAndRestarts) {
     EXPECT_EQ(service.channelsCreated(), 1);
     // A peer counts once it has sent a frame (docs/protocol.md): one record first.
     ASSERT_TRUE(service.send(rrcRecord(2)));
-    ASSERT_TRUE(processEventsUntil([&] { return model->messagesDecoded() == 1; }, 2000));
+    ASSERT_TRUE(waitUntil([&] { return model->messagesDecoded() == 1; }, 2000));
     service.dropClient();  // the service closes its connection to our receive port
-    ASSERT_TRUE(processEventsUntil([&] { return service.channelsCreated() == 2 && model->isRunning(); }, 3000));
+    ASSERT_TRUE(waitUntil([&] { return service.channelsCreated() == 2 && model->isRunning(); }, 3000));
     EXPECT_TRUE(anyLineStartsWith(" ***** INVALIDATED "));
 }
 
@@ -123,7 +123,7 @@ TEST_F(VantorelModelTest, NoServiceLogsCouldNotCreateTSServerConnectionAndRetrie
     model.startMonitor();
     EXPECT_EQ(countLines("Could not create TSServerConnection"), 1);
     EXPECT_EQ(countLines("Could not create the ports necessary"), 1);
-    ASSERT_TRUE(processEventsUntil([&] { return countLines("Could not create TSServerConnection") >= 3; }, 3000));
+    ASSERT_TRUE(waitUntil([&] { return countLines("Could not create TSServerConnection") >= 3; }, 3000));
     EXPECT_FALSE(model.isRunning());
 }
 
@@ -158,7 +158,7 @@ TEST_F(VantorelModelTest, AnUnknownTechnologyIdentifierLeadsToNoLogGeneratorAndA
     model->startMonitor();
     EXPECT_EQ(countLines("No log generator technology works"), 1);
     EXPECT_TRUE(anyLineStartsWith("Got log generated: "));
-    ASSERT_TRUE(processEventsUntil([&] { return countLines("No log generator technology works") >= 4; }, 5000));
+    ASSERT_TRUE(waitUntil([&] { return countLines("No log generator technology works") >= 4; }, 5000));
     // Three retries, each no sooner than the scaled 5 s after the failure before it.
     EXPECT_GE(timer.elapsed(), 3 * 100);
     EXPECT_FALSE(model->isRunning());
@@ -178,7 +178,7 @@ TEST_F(VantorelModelTest, AModemThatNeverAnswersTheQueryCostsItsTimeoutsThenARet
     EXPECT_EQ(countLines(" ***** Could not send the GetTechnology command (got error=-2)"), 1);
     EXPECT_EQ(countLines("No log generator technology works"), 1);
     service.setBehaviour(FakeTelephonyService::Behaviour());
-    ASSERT_TRUE(processEventsUntil([&] { return model->isRunning(); }, 6000));
+    ASSERT_TRUE(waitUntil([&] { return model->isRunning(); }, 6000));
     EXPECT_GE(service.getTechnologyRequests(), 2);
 }
 
@@ -198,7 +198,7 @@ TEST_F(VantorelModelTest, AReplyThatIsNotAPropertyListOrHasNoAnswerIsLogged) {
 
 TEST_F(VantorelModelTest, TheStartCommandAsksForTheDecodersCodes) {
     auto model = runningModel();
-    ASSERT_TRUE(processEventsUntil([&] { return !service.startCommands().empty(); }, 2000));
+    ASSERT_TRUE(waitUntil([&] { return !service.startCommands().empty(); }, 2000));
     DictionaryRef command = service.startCommands()[0].asDictionary();
     EXPECT_EQ(*command->get("SetState").asString(), "Streaming");
     std::set<int64_t> extra;
@@ -210,24 +210,24 @@ TEST_F(VantorelModelTest, TheStartCommandAsksForTheDecodersCodes) {
 TEST_F(VantorelModelTest, WithNoMessageDecodedSinceThePreviousTickATickNeitherRebuildsTheTreeNorUpdatesTheScreen) {
     auto model = runningModel();
     NodeRef first = model->topLevelNodes();
-    processEventsUntil([] { return false; }, 200);  // five scaled ticks, no data
+    spin(200);  // five scaled ticks, no data
     EXPECT_EQ(app.updates, 0);
     EXPECT_EQ(model->topLevelNodes(), first);  // the same cached tree
 
     ASSERT_TRUE(service.send(rrcRecord(2)));
-    ASSERT_TRUE(processEventsUntil([&] { return app.updates == 1; }, 2000));
+    ASSERT_TRUE(waitUntil([&] { return app.updates == 1; }, 2000));
     EXPECT_NE(model->topLevelNodes(), first);
     for (int i = 0; i < 20; ++i) service.send(rrcRecord(3));
-    ASSERT_TRUE(processEventsUntil([&] { return app.updates >= 2; }, 2000));
-    processEventsUntil([] { return false; }, 200);
+    ASSERT_TRUE(waitUntil([&] { return app.updates >= 2; }, 2000));
+    spin(200);
     EXPECT_EQ(app.updates, 2);  // many messages, one refresh
 }
 
 TEST_F(VantorelModelTest, ASendPortThatDiesWhileRunningIsNoticedAtTheNextTickAndLeadsToAFullRestart) {
     auto model = runningModel();
     service.closeChannelPort();
-    ASSERT_TRUE(processEventsUntil([&] { return anyLineStartsWith(" ***** INVALIDATED "); }, 1000));
-    ASSERT_TRUE(processEventsUntil([&] { return service.channelsCreated() == 2 && model->isRunning(); }, 3000));
+    ASSERT_TRUE(waitUntil([&] { return anyLineStartsWith(" ***** INVALIDATED "); }, 1000));
+    ASSERT_TRUE(waitUntil([&] { return service.channelsCreated() == 2 && model->isRunning(); }, 3000));
     EXPECT_GE(service.getTechnologyRequests(), 2);
 }
 
@@ -242,7 +242,7 @@ TEST_F(VantorelModelTest, StartMonitorWhileRunningDoesNothing) {
 TEST_F(VantorelModelTest, AfterARestartTheNewDecoderFindsThePreviousStateDictionaryWithItsHistoryUntouched) {
     auto model = runningModel();
     service.send(rrcRecord(3));
-    ASSERT_TRUE(processEventsUntil([&] { return model->messagesDecoded() == 1; }, 2000));
+    ASSERT_TRUE(waitUntil([&] { return model->messagesDecoded() == 1; }, 2000));
     model->topLevelNodes();
     model->refresh();
     model->topLevelNodes();
@@ -259,10 +259,10 @@ TEST_F(VantorelModelTest, AfterARestartTheNewDecoderFindsThePreviousStateDiction
 
     // The new decoder shows new records (its sections are bound to a display of its own).
     service.send(rrcRecord(2));
-    ASSERT_TRUE(processEventsUntil([&] { return app.updates >= 1; }, 2000));
+    ASSERT_TRUE(waitUntil([&] { return app.updates >= 1; }, 2000));
     model->topLevelNodes();
     service.send(rrcRecord(2));
-    ASSERT_TRUE(processEventsUntil([&] { return app.updates >= 2; }, 2000));
+    ASSERT_TRUE(waitUntil([&] { return app.updates >= 2; }, 2000));
     NodeRef state = model->nodeAtPath("/Serving Cell/RRC Info/State");
     ASSERT_TRUE(state);
     EXPECT_EQ(*state->value(), "Cell Fach");
@@ -272,7 +272,7 @@ TEST_F(VantorelModelTest, AServiceNotificationSendsRefresh) {
     auto model = runningModel();
     model->updateWithData(rrcRecord(1));  // marks _updated as the receive callback would
     service.notify("BackendStateChanged");
-    ASSERT_TRUE(processEventsUntil([&] { return app.updates == 1; }, 1000));
+    ASSERT_TRUE(waitUntil([&] { return app.updates == 1; }, 1000));
 }
 
 // ---- Part 2.3, model half --------------------------------------------------
@@ -293,10 +293,10 @@ TEST_F(VantorelModelTest, NodeAtPathOfAPathThatNoLongerExistsAfterARebuildReturn
     auto pdp = Dictionary::create();
     pdp->set("APN", "cmnet");
     service.send(RecordBuilder::extraPropertyList(2, Value(Array::of({Value(pdp), Value(pdp)}))));
-    ASSERT_TRUE(processEventsUntil([&] { return app.updates == 1; }, 2000));
+    ASSERT_TRUE(waitUntil([&] { return app.updates == 1; }, 2000));
     ASSERT_TRUE(model->nodeAtPath("/Packet Data/PDP Context Info/1"));
     service.send(RecordBuilder::extraPropertyList(2, Value(Array::of({Value(pdp)}))));
-    ASSERT_TRUE(processEventsUntil([&] { return app.updates == 2; }, 2000));
+    ASSERT_TRUE(waitUntil([&] { return app.updates == 2; }, 2000));
     EXPECT_EQ(model->nodeAtPath("/Packet Data/PDP Context Info/1"), nullptr);
     EXPECT_TRUE(model->nodeAtPath("/Packet Data/PDP Context Info/0"));
 }
@@ -304,7 +304,7 @@ TEST_F(VantorelModelTest, NodeAtPathOfAPathThatNoLongerExistsAfterARebuildReturn
 TEST_F(VantorelModelTest, SaveContentsAreTheDecodersHistoryAndDlf) {
     auto model = runningModel();
     service.send(rrcRecord(3));
-    ASSERT_TRUE(processEventsUntil([&] { return app.updates == 1; }, 2000));
+    ASSERT_TRUE(waitUntil([&] { return app.updates == 1; }, 2000));
     model->topLevelNodes();
     ArrayRef contents = model->getSaveContents().asArray();
     ASSERT_TRUE(contents);

@@ -13,26 +13,14 @@
 #include <memory>
 #include <string>
 #include <unistd.h>
+
+#include "support/EventLoopWait.h"
 #include <vector>
 
 namespace vantorel::test {
 
-// A name no other test (or test process) uses: tag, pid and a counter.
-inline std::string uniquePortName(const char* tag) {
-    static std::atomic<int> counter{0};
-    return StringFormat::format("vantorel-test.%s.%d.%d", tag, static_cast<int>(getpid()), ++counter);
-}
-
-// Runs the calling thread's event loop until pred() holds or timeoutMs passed.
-inline bool waitUntil(const std::function<bool()>& pred, int timeoutMs = 1500) {
-    QDeadlineTimer deadline(timeoutMs);
-    while (!pred()) {
-        if (deadline.hasExpired()) return false;
-        QCoreApplication::processEvents(QEventLoop::AllEvents, 5);
-        QThread::msleep(1);
-    }
-    return true;
-}
+using vantorel::testing::uniquePortName;
+using vantorel::testing::waitUntil;
 
 // The server side of a loopback test: blocking waits of a RemoteMessagePort on the
 // test thread need the LocalMessagePort to be served by another thread's event loop.

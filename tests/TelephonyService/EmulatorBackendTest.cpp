@@ -12,18 +12,9 @@
 namespace vantorel {
 namespace {
 
+using servicetest::Collector;
 using servicetest::spin;
 using servicetest::waitUntil;
-
-struct Collector {
-    std::vector<Bytes> messages;
-    std::vector<ModemBackend::State> states;
-    void attach(ModemBackend& backend) {
-        QObject::connect(&backend, &ModemBackend::messageReady,
-                         [this](int32_t id, const Bytes& data) { if (id == 0) messages.push_back(data); });
-        QObject::connect(&backend, &ModemBackend::stateChanged, [this](ModemBackend::State s) { states.push_back(s); });
-    }
-};
 
 // The records of ticks 0..n-1 of a fresh UTRAN scenario with that seed.
 std::vector<Bytes> scenarioRecords(uint64_t seed, uint64_t ticks) {

@@ -15,19 +15,10 @@
 namespace vantorel {
 namespace {
 
+using servicetest::Collector;
 using servicetest::spin;
 using servicetest::streamOf;
 using servicetest::waitUntil;
-
-struct Collector {
-    std::vector<Bytes> messages;
-    std::vector<ModemBackend::State> states;
-    void attach(ModemBackend& backend) {
-        QObject::connect(&backend, &ModemBackend::messageReady,
-                         [this](int32_t, const Bytes& data) { messages.push_back(data); });
-        QObject::connect(&backend, &ModemBackend::stateChanged, [this](ModemBackend::State s) { states.push_back(s); });
-    }
-};
 
 // n distinct records: code 0xD000 + i % 16, payload byte i, i / 256.
 std::vector<Bytes> numberedRecords(size_t n) {

@@ -23,33 +23,25 @@
 #include <string>
 #include <vector>
 
+#include "TelephonyService/ModemBackend.h"
+#include "support/EventLoopWait.h"
+
 namespace vantorel::servicetest {
 
-// "vantorel.test.<pid>.<n>.<tag>": unique per test run and per call.
-inline std::string uniquePortName(const std::string& tag) {
-    static std::atomic<int> counter{0};
-    return "vantorel.test." + std::to_string(QCoreApplication::applicationPid()) + "." + std::to_string(++counter) +
-           "." + tag;
-}
+using vantorel::testing::spin;
+using vantorel::testing::uniquePortName;
+using vantorel::testing::waitUntil;
 
-// Runs this thread's event loop in short slices until done() or the timeout; returns done().
-inline bool waitUntil(const std::function<bool()>& done, int timeoutMs = 2000) {
-    QDeadlineTimer deadline(timeoutMs);
-    while (!done()) {
-        if (deadline.hasExpired()) return done();
-        QEventLoop loop;
-        QTimer::singleShot(5, &loop, &QEventLoop::quit);
-        loop.exec();
+// Collects what a backend emits: its messages and its state changes, in order.
+struct Collector {
+    std::vector<Bytes> messages;
+    std::vector<ModemBackend::State> states;
+    void attach(ModemBackend& backend) {
+        QObject::connect(&backend, &ModemBackend::messageReady,
+                         [this](int32_t, const Bytes& data) { messages.push_back(data); });
+        QObject::connect(&backend, &ModemBackend::stateChanged, [this](ModemBackend::State s) { states.push_back(s); });
     }
-    return true;
-}
-
-// Runs the event loop for ms milliseconds.
-inline void spin(int ms) {
-    QEventLoop loop;
-    QTimer::singleShot(ms, &loop, &QEventLoop::quit);
-    loop.exec();
-}
+};
 
 // An in-memory capture of the messages (times 1 ms apart unless given), as a RecordedStream.
 inline RecordedStream streamOf(const std::vector<Bytes>& messages, const std::string& technology,

@@ -2,9 +2,7 @@
 #include "cli/DecodeCommand.h"
 #include "cli/InfoCommand.h"
 
-#include "Platform/TelephonyIdentifiers.h"
-#include "TelephonyService/Emulator/UTRANScenario.h"
-#include "TelephonyService/Replay/CaptureWriter.h"
+#include "support/ScenarioCapture.h"
 
 #include <QJsonDocument>
 #include <QJsonObject>
@@ -15,18 +13,10 @@ using namespace vantorel;
 
 namespace {
 
-// A capture of 60 ticks of the UTRAN scenario (seed 1), one message per record.
+// A capture of 60 ticks of the UTRAN scenario (seed 1), then a message id the model drops.
 std::string writeUtranCapture(const QTemporaryDir& dir) {
     const std::string path = dir.filePath("utran.vcap").toStdString();
-    std::string error;
-    auto writer = CaptureWriter::create(path, kTSLogChannelTechnology_Morvek_UTRAN2, &error);
-    EXPECT_TRUE(writer) << error;
-    UTRANScenario scenario(1);
-    int64_t t = 1700000000000000;
-    for (uint64_t tick = 0; tick < 60; ++tick)
-        for (const Bytes& record : scenario.recordsForTick(tick)) writer->write(t += 1000, 0, record);
-    writer->write(t, 5, Bytes{1, 2, 3});  // a message id the model drops
-    writer->flush();
+    vantorel::testing::writeUtranCapture(path, 1, 60, 1000, 5);
     return path;
 }
 

@@ -2,11 +2,9 @@
 #include "cli/MonitorLauncher.h"
 
 #include "Model/VantorelModel.h"
-#include "Platform/TelephonyIdentifiers.h"
-#include "TelephonyService/Emulator/UTRANScenario.h"
-#include "TelephonyService/Replay/CaptureWriter.h"
 #include "cli/TerminalView.h"
-#include "support/FakeTelephonyService.h"
+#include "support/EventLoopWait.h"
+#include "support/ScenarioCapture.h"
 
 #include <QCommandLineParser>
 #include <QTemporaryDir>
@@ -34,15 +32,7 @@ std::string readAll(std::FILE* f) {
 TEST(MonitorLauncher, ServiceWithAReplayedCaptureModelDecoderAndTreeEndToEnd) {
     QTemporaryDir dir;
     const std::string path = dir.filePath("utran.vcap").toStdString();
-    {
-        std::string error;
-        auto writer = CaptureWriter::create(path, kTSLogChannelTechnology_Morvek_UTRAN2, &error);
-        ASSERT_TRUE(writer) << error;
-        UTRANScenario scenario(3);
-        int64_t t = 1700000000000000;
-        for (uint64_t tick = 0; tick < 40; ++tick)
-            for (const Bytes& record : scenario.recordsForTick(tick)) writer->write(t += 500, 0, record);
-    }
+    writeUtranCapture(path, 3, 40, 500);
     std::FILE* out = std::tmpfile();
     TerminalView view(out);
     MonitorLauncher launcher;
@@ -53,7 +43,7 @@ TEST(MonitorLauncher, ServiceWithAReplayedCaptureModelDecoderAndTreeEndToEnd) {
     ASSERT_TRUE(launcher.start(source, &view, &error)) << error;
     view.setModel(launcher.model());
     // Records build the display as they arrive, so the first refresh already shows them.
-    ASSERT_TRUE(processEventsUntil(
+    ASSERT_TRUE(waitUntil(
         [&] {
             NodeRef lac = launcher.model()->nodeAtPath("/Serving Cell/Serving Cell Info/Local Area Code");
             return view.refreshes() >= 1 && lac && *lac->value() == "23071";
@@ -83,7 +73,7 @@ TEST(MonitorLauncher, TheEmbeddedDefaultIsTheUTRANEmulator) {
     ASSERT_TRUE(launcher.start(*source, &view, &error)) << error;
     view.setModel(launcher.model());
     EXPECT_EQ(launcher.description(), "emulator (utran)");
-    ASSERT_TRUE(processEventsUntil([&] { return launcher.model()->messagesDecoded() > 10; }, 10000));
+    ASSERT_TRUE(waitUntil([&] { return launcher.model()->messagesDecoded() > 10; }, 10000));
     EXPECT_EQ(launcher.model()->logGenerator() != nullptr, true);
     std::fclose(out);
 }

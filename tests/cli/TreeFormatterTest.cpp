@@ -56,3 +56,26 @@ TEST(TreeFormatter, FormatNamesParse) {
     EXPECT_EQ(TreeFormatter::parse("json"), TreeFormatter::Format::Json);
     EXPECT_FALSE(TreeFormatter::parse("yaml"));
 }
+
+TEST(TreeFormatter, CompactTreeShowsFlatListEntriesOnOneLine) {
+    auto entry = Dictionary::create();
+    entry->set("UARFCN", "10096");
+    entry->set("Cell ID", "120");
+    auto sir = Dictionary::create();
+    sir->set("CCTRCH ID", "1");
+    sir->set("SIR", Value(Array::of({"13", "16"})));
+    auto root = Dictionary::create();
+    root->set("Neighbor Cell List", Value(Array::of({Value(entry)})));
+    root->set("CCTRCH SIR", Value(Array::of({Value(sir)})));
+    root->set("RRC Info", Value(Dictionary::create()));
+    PathDictionary paths;
+    NodeRef tree = VantorelModelNode::makeTreeFromObject(Value(root), paths);
+    EXPECT_EQ(TreeFormatter::compactTree(tree),
+              "Neighbor Cell List\n"
+              "  0: UARFCN 10096 | Cell ID 120\n"
+              "CCTRCH SIR\n"
+              "  0\n"
+              "    CCTRCH ID: 1\n"
+              "    SIR: 13 16\n"
+              "RRC Info (empty)\n");
+}

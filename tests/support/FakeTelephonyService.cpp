@@ -15,8 +15,6 @@
 namespace vantorel::testing {
 
 namespace {
-std::atomic<int> gCounter{0};
-
 Bytes xml(const Value& v) { return *PropertyListSerialization::write(v, PropertyListSerialization::Format::XML); }
 }  // namespace
 
@@ -130,7 +128,7 @@ private:
 };
 
 FakeTelephonyService::FakeTelephonyService(Behaviour behaviour)
-    : name_("vantorel.test." + std::to_string(getpid()) + "." + std::to_string(++gCounter)), behaviour_(behaviour) {
+    : name_(uniquePortName("fake-service")), behaviour_(behaviour) {
     worker_ = new FakeServiceWorker(this);
     worker_->moveToThread(&thread_);
     thread_.start();
@@ -174,17 +172,6 @@ std::vector<Value> FakeTelephonyService::startCommands() const {
 std::vector<std::string> FakeTelephonyService::clientPortNames() const {
     std::lock_guard<std::mutex> lock(mutex_);
     return clientPorts_;
-}
-
-bool processEventsUntil(const std::function<bool()>& done, int timeoutMs) {
-    QElapsedTimer timer;
-    timer.start();
-    while (!done()) {
-        if (timer.elapsed() > timeoutMs) return false;
-        QCoreApplication::processEvents(QEventLoop::AllEvents, 10);
-        QThread::msleep(1);
-    }
-    return true;
 }
 
 }  // namespace vantorel::testing

@@ -3,6 +3,7 @@
 
 #include "Platform/TelephonyIdentifiers.h"
 #include "PropertyList/Value.h"
+#include "support/EventLoopWait.h"
 
 #include <QThread>
 
@@ -64,7 +65,5 @@ private:
     std::atomic<int> queries_{0};
 };
 
-// Runs the Qt event loop until `done` is true or `timeoutMs` passes; true when done.
-bool processEventsUntil(const std::function<bool()>& done, int timeoutMs);
 
 }  // namespace vantorel::testing

@@ -57,9 +57,14 @@ Capture CaptureReader::readBytes(ByteView data) {
         const std::optional<uint64_t> time = r.u64(offset);
         const std::optional<uint32_t> id = r.u32(offset + 8);
         const std::optional<uint32_t> length = r.u32(offset + 12);
-        const std::optional<ByteView> body =
-            length ? r.slice(offset + CaptureWriter::kMessageHeaderLength, *length) : std::nullopt;
-        if (!time || !id || !length || !body) {
+        ByteView body;
+        bool whole = time && id && length;
+        if (whole) {
+            const std::optional<ByteView> slice = r.slice(offset + CaptureWriter::kMessageHeaderLength, *length);
+            whole = slice.has_value();
+            if (whole) body = *slice;
+        }
+        if (!whole) {
             ++report.truncated;
             report.addProblem(offset, "truncated message",
                               length ? StringFormat::format("%u bytes of data announced, %zu bytes left in the file",
@@ -68,7 +73,7 @@ Capture CaptureReader::readBytes(ByteView data) {
                                                             r.size() - offset));
             break;
         }
-        TimedMessage message{static_cast<int64_t>(*time), static_cast<int32_t>(*id), Bytes(body->begin(), body->end())};
+        TimedMessage message{static_cast<int64_t>(*time), static_cast<int32_t>(*id), Bytes(body.begin(), body.end())};
         const auto c = LogMask::classify(message.data);
         if (c && c->type == LogMask::kOrdinaryType) {
             ++report.logPackets;
