@@ -28,9 +28,10 @@ test: deps
 	@cd $(ASAN_DIR) && ctest --output-on-failure -j $(JOBS)
 
 # The main job on the embedded default: the monitor on the built-in modem emulator
-# (an in-process telephony service on its own thread), live, in the terminal view.
+# (an in-process telephony service on its own thread), live: the window, or the
+# terminal view on a machine without a display.
 run: build
-	@$(RELEASE_DIR)/src/vantorel-cli watch
+	@$(RELEASE_DIR)/src/vantorel
 
 # Google Benchmark figures (docs/performance.md): QMDL deframing, routing, tree building.
 bench: deps

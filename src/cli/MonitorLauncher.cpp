@@ -51,7 +51,8 @@ MonitorLauncher::~MonitorLauncher() {
     if (service_) service_->stop();
 }
 
-bool MonitorLauncher::start(const Source& source, ApplicationObject* application, std::string* error) {
+bool MonitorLauncher::start(const Source& source, ApplicationObject* application, std::string* error,
+                            double timeScale) {
     std::string serviceName = source.service;
     if (source.service.empty()) {
         TelephonyServiceOptions options;
@@ -68,7 +69,7 @@ bool MonitorLauncher::start(const Source& source, ApplicationObject* application
     } else {
         description_ = "service " + source.service;
     }
-    model_ = std::make_unique<VantorelModel>(application, serviceName);
+    model_ = std::make_unique<VantorelModel>(application, serviceName, timeScale);
     VantorelModel* model = model_.get();
     QMetaObject::invokeMethod(model, [model] { model->restartMonitor(); }, Qt::QueuedConnection);
     return true;

@@ -36,7 +36,8 @@ public:
     // Starts the in-process service when the source needs one (on its own thread),
     // creates the model for `application` and queues restartMonitor on the event
     // loop. False with *error when the service cannot start.
-    bool start(const Source& source, ApplicationObject* application, std::string* error);
+    // `timeScale` scales the model's 5 s retry and 2.0 s display interval (tests only).
+    bool start(const Source& source, ApplicationObject* application, std::string* error, double timeScale = 1.0);
     VantorelModel* model() const { return model_.get(); }
     // "emulator (utran)", "replay of FILE", "service NAME".
     std::string description() const { return description_; }

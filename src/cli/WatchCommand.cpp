@@ -30,14 +30,19 @@ int WatchCommand::run(const QStringList& args) {
         std::fprintf(stderr, "vantorel-cli watch: %s\n", error.c_str());
         return 2;
     }
+    return runTerminal(*source, "vantorel-cli watch");
+}
+
+int WatchCommand::runTerminal(const MonitorLauncher::Source& source, const char* program) {
+    std::string error;
     TerminalView view;
     MonitorLauncher launcher;
-    if (!launcher.start(*source, &view, &error)) {
-        std::fprintf(stderr, "vantorel-cli watch: %s\n", error.c_str());
+    if (!launcher.start(source, &view, &error)) {
+        std::fprintf(stderr, "%s: %s\n", program, error.c_str());
         return 1;
     }
     view.setModel(launcher.model());
-    std::fprintf(stderr, "vantorel-cli watch: %s; Ctrl-C ends\n", launcher.description().c_str());
+    std::fprintf(stderr, "%s: %s; Ctrl-C ends\n", program, launcher.description().c_str());
     QuitOnSignal quit;
     return QCoreApplication::exec();
 }

@@ -1,6 +1,7 @@
 // vantorel-cli: headless decoding and inspection of recorded streams, and the monitor in the terminal (issue "monitor spine").
 #include "cli/DecodeCommand.h"
 #include "cli/InfoCommand.h"
+#include "cli/SnapshotCommand.h"
 #include "cli/WatchCommand.h"
 
 #include <QCoreApplication>
@@ -20,6 +21,8 @@ const char* const kUsage =
     "                                    log code and bad frames of recorded streams\n"
     "  watch [--emulate TECH | --replay FILE | --service NAME]\n"
     "                                    the live display in the terminal\n"
+    "  snapshot FILE [--dlf OUT]         list a saved snapshot's entries; --dlf writes\n"
+    "                                    its DLF binary log to OUT\n"
     "\n"
     "Recorded streams: QXDM DLF, QMDL / mi2log, and Vantorel captures (.vcap).\n"
     "TECH: ifx, gsm, cdma, lte, utran (or the full identifier).\n"
@@ -39,6 +42,7 @@ int main(int argc, char** argv) {
     if (command == "decode") return vantorel::DecodeCommand::run(args);
     if (command == "info") return vantorel::InfoCommand::run(args);
     if (command == "watch") return vantorel::WatchCommand::run(args);
+    if (command == "snapshot") return vantorel::SnapshotCommand::run(args);
     std::fprintf(stderr, "vantorel-cli: unknown command '%s'\n\n%s", qPrintable(command), kUsage);
     return 2;
 }

@@ -1,0 +1,18 @@
+// NavigationControllerDelegate: told by the navigation controller before it shows a pane (Part 1.1's navigationController:willShowViewController:animated:, Part 1.2's stack).
+#pragma once
+
+namespace vantorel {
+
+class NavigationController;
+class VantorelPaneController;
+
+class NavigationControllerDelegate {
+public:
+    virtual ~NavigationControllerDelegate() = default;
+    // Called before `pane` is shown: when it is pushed, when a pop makes it the top
+    // pane, and for the root when the controller is first shown.
+    virtual void navigationControllerWillShow(NavigationController& navigationController,
+                                              VantorelPaneController& pane) = 0;
+};
+
+}  // namespace vantorel

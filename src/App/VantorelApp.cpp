@@ -1,0 +1,130 @@
+// VantorelApp: Part 1.1's application object.
+#include "App/VantorelApp.h"
+
+#include "App/NavigationController.h"
+#include "App/VantorelPaneController.h"
+#include "App/VantorelSaveViewController.h"
+#include "Model/VantorelModel.h"
+#include "Platform/Preferences.h"
+
+#include <QDateTime>
+#include <QGuiApplication>
+#include <QMainWindow>
+#include <QScreen>
+
+namespace vantorel {
+
+VantorelApp::VantorelApp(Options options) : options_(std::move(options)) {}
+
+VantorelApp::~VantorelApp() {
+    if (launcher_) applicationWillTerminate();
+}
+
+bool VantorelApp::applicationDidFinishLaunching(std::string* error) {
+    getRSSIPref();
+    getSaveButtonPref();
+
+    // The window takes the main screen's bounds (a zero rectangle without a screen).
+    _window = std::make_unique<QMainWindow>();
+    _window->setWindowTitle("Vantorel");
+    QScreen* screen = QGuiApplication::primaryScreen();
+    const QRect bounds = screen ? screen->availableGeometry() : QRect();
+    // A desktop window: the screen's height, a phone-like width.
+    _window->resize(bounds.isEmpty() ? QSize(480, 800) : QSize(std::min(bounds.width(), 560), bounds.height() * 9 / 10));
+
+    launcher_ = std::make_unique<MonitorLauncher>();
+    _updateMessage = "Connecting...";
+    _dateFormat = QStringLiteral("'Updated' yyyy-MM-dd 'at' HH:mm:ss");
+
+    auto root = std::make_unique<VantorelPaneController>(nullptr, "/", this);
+    root->setStatus(std::string("Connecting"), true);
+    auto* navigation = new NavigationController(std::move(root));
+    _navController = navigation;
+    _window->setCentralWidget(navigation);
+    _window->show();
+    _window->raise();
+    _window->activateWindow();
+    // The delegate is set once the root is on screen: the first pane keeps reading
+    // "Connecting" until the first update (Part 1.1's edge case), as on the handset.
+    navigation->setDelegate(this);
+
+    // Creates the model and queues restartMonitor on the main queue: connecting
+    // starts after launch returns.
+    return launcher_->start(options_.source, this, error, options_.timeScale);
+}
+
+void VantorelApp::applicationWillTerminate() {
+    if (_unsetRSSI) _setGSMRSSI(false);
+    _unsetRSSI = false;
+    _updateMessage.clear();
+    if (_saveViewController) {
+        _saveViewController->deleteLater();
+        _saveViewController = nullptr;
+    }
+    if (_window) _window->hide();
+    _window.reset();
+    _navController = nullptr;
+    launcher_.reset();  // the model closes its ports, then the in-process service stops
+}
+
+void VantorelApp::getRSSIPref() {
+    const std::optional<bool> shown = Preferences::ownBool(Preferences::kShowGSMRSSI);
+    if (!shown.value_or(false)) {
+        _unsetRSSI = true;
+        _setGSMRSSI(true);
+    }
+}
+
+void VantorelApp::getSaveButtonPref() {
+    // The internal-install marker, as on the handset; our own setting and
+    // --allow-save also enable it (Part 1.1 "Left to the implementer").
+    _allowSaveButton = Preferences::internalInstallMarkerExists() ||
+                       Preferences::ownBool(Preferences::kAllowSaveButton).value_or(false) || options_.allowSave;
+}
+
+void VantorelApp::_setGSMRSSI(bool value) { Preferences::writeShellBool(Preferences::kShowGSMRSSI, value); }
+
+void VantorelApp::updateViewControllerFromModel() {
+    VantorelModel* m = model();
+    if (!_navController || !m) return;
+    const std::vector<VantorelPaneController*> panes = _navController->panes();
+    for (size_t i = 0; i < panes.size(); ++i) {
+        NodeRef node = i == 0 ? m->topLevelNodes() : m->nodeAtPath(panes[i]->path());
+        if (i > 0 && !node) {
+            // Its branch vanished: back to the pane below it; the ones above are not reloaded.
+            _navController->popToViewController(panes[i - 1], true);
+            break;
+        }
+        panes[i]->reloadWithNode(node);
+    }
+    if (m->isConnected()) _updateMessage = QDateTime::currentDateTime().toString(_dateFormat).toStdString();
+    updateStatusForViewController(_navController->topPane());
+}
+
+void VantorelApp::updateStatusForViewController(VantorelPaneController* pane) {
+    if (!pane) return;
+    VantorelModel* m = model();
+    if (m && m->isConnected())
+        pane->setStatus(_updateMessage, false);
+    else
+        pane->setStatus(std::string("Connecting..."), true);
+}
+
+void VantorelApp::navigationControllerWillShow(NavigationController&, VantorelPaneController& pane) {
+    updateStatusForViewController(&pane);
+}
+
+void VantorelApp::showSaveView() {
+    if (_saveViewController || !model()) return;
+    _saveViewController = new VantorelSaveViewController(model()->getSaveContents(), this, _window.get());
+    _saveViewController->open();  // modal over the window
+}
+
+void VantorelApp::closeSaveView() {
+    if (!_saveViewController) return;
+    _saveViewController->hide();
+    _saveViewController->deleteLater();
+    _saveViewController = nullptr;
+}
+
+}  // namespace vantorel

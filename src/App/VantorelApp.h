@@ -1,0 +1,75 @@
+// VantorelApp: the application object and its own delegate: launch and exit, the preferences, the status line, refreshing the panes, and the save screen (Part 1.1).
+#pragma once
+
+#include "App/NavigationControllerDelegate.h"
+#include "App/PaneApplication.h"
+#include "Model/ApplicationObject.h"
+#include "cli/MonitorLauncher.h"
+
+#include <QObject>
+
+#include <memory>
+#include <string>
+
+class QMainWindow;
+
+namespace vantorel {
+
+class NavigationController;
+class VantorelModel;
+class VantorelPaneController;
+class VantorelSaveViewController;
+
+class VantorelApp : public QObject,
+                    public ApplicationObject,
+                    public PaneApplication,
+                    public NavigationControllerDelegate {
+    Q_OBJECT
+public:
+    struct Options {
+        MonitorLauncher::Source source;  // where the monitor's data comes from
+        bool allowSave = false;          // --allow-save
+        double timeScale = 1.0;          // tests only: scales the model's 5 s and 2 s
+    };
+
+    explicit VantorelApp(Options options);
+    ~VantorelApp() override;
+
+    // Part 1.1's launch sequence; false (with *error) when the in-process service
+    // cannot start.
+    bool applicationDidFinishLaunching(std::string* error);
+    void applicationWillTerminate();
+
+    void getRSSIPref();
+    void getSaveButtonPref();
+    void _setGSMRSSI(bool value);
+
+    void updateViewControllerFromModel() override;
+    void updateStatusForViewController(VantorelPaneController* pane);
+    void navigationControllerWillShow(NavigationController& navigationController,
+                                      VantorelPaneController& pane) override;
+    void showSaveView() override;
+    void closeSaveView() override;
+    bool allowSaveButton() const override { return _allowSaveButton; }
+
+    // Properties and observers.
+    QMainWindow* window() const { return _window.get(); }
+    NavigationController* navigationController() const { return _navController; }
+    VantorelSaveViewController* saveViewController() const { return _saveViewController; }
+    VantorelModel* model() const { return launcher_ ? launcher_->model() : nullptr; }
+    const std::string& updateMessage() const { return _updateMessage; }
+    bool unsetRSSI() const { return _unsetRSSI; }
+
+private:
+    std::unique_ptr<QMainWindow> _window;
+    NavigationController* _navController = nullptr;  // owned by the window
+    VantorelSaveViewController* _saveViewController = nullptr;
+    std::unique_ptr<MonitorLauncher> launcher_;      // `_model`, with the service it talks to
+    bool _unsetRSSI = false;
+    bool _allowSaveButton = false;
+    QString _dateFormat;                             // `_dateFormatter`'s pattern
+    std::string _updateMessage;
+    Options options_;
+};
+
+}  // namespace vantorel

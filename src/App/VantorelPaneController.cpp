@@ -1,0 +1,255 @@
+// VantorelPaneController: one level of the display tree as a table pane with its toolbar (Part 1.2).
+#include "App/VantorelPaneController.h"
+
+#include "App/ActivityIndicator.h"
+#include "App/NavigationController.h"
+#include "App/PaneApplication.h"
+#include "App/VantorelCell.h"
+
+#include <QAction>
+#include <QApplication>
+#include <QHeaderView>
+#include <QKeyEvent>
+#include <QLabel>
+#include <QStyle>
+#include <QTableWidget>
+#include <QToolBar>
+#include <QVBoxLayout>
+
+namespace vantorel {
+
+namespace {
+
+constexpr const char* kUntitled = "Vantorel";
+constexpr int kStatusFontSize = 14;
+
+// Part 2.3's path rule: "/" + name below the root, parent + "/" + name deeper.
+std::string childPath(const std::string& parent, const std::string& name) {
+    return parent == "/" ? "/" + name : parent + "/" + name;
+}
+
+}  // namespace
+
+VantorelPaneController::VantorelPaneController(NodeRef node, std::string atPath, PaneApplication* application,
+                                               QWidget* parent)
+    : QWidget(parent),
+      _nodes(std::move(node)),
+      _keyPath(std::move(atPath)),
+      application_(application),
+      table_(new QTableWidget(this)),
+      toolbar_(new QToolBar(this)) {
+    table_->setColumnCount(1);
+    table_->horizontalHeader()->hide();
+    table_->horizontalHeader()->setStretchLastSection(true);
+    table_->verticalHeader()->hide();
+    table_->verticalHeader()->setSectionResizeMode(QHeaderView::Fixed);
+    table_->verticalHeader()->setMinimumSectionSize(VantorelCell::kRowHeight);
+    table_->verticalHeader()->setDefaultSectionSize(VantorelCell::kRowHeight);
+    table_->setHorizontalScrollBarPolicy(Qt::ScrollBarAlwaysOff);
+    table_->setVerticalScrollMode(QAbstractItemView::ScrollPerPixel);
+    table_->setSelectionBehavior(QAbstractItemView::SelectRows);
+    table_->setSelectionMode(QAbstractItemView::SingleSelection);
+    table_->setEditTriggers(QAbstractItemView::NoEditTriggers);
+    table_->setTabKeyNavigation(false);
+    // The cells fill their rows (W × 50) and draw their own separators.
+    table_->setShowGrid(false);
+    table_->installEventFilter(this);  // Enter and Return select the current row
+    connect(table_, &QTableWidget::clicked, this, [this](const QModelIndex& index) {
+        didSelectRowAtIndexPath(index.isValid() ? std::optional<int>(index.row()) : std::nullopt);
+    });
+
+    toolbar_->setMovable(false);
+    toolbar_->setFloatable(false);
+    toolbar_->setToolButtonStyle(Qt::ToolButtonTextBesideIcon);
+
+    auto* layout = new QVBoxLayout(this);
+    layout->setContentsMargins(0, 0, 0, 0);
+    layout->setSpacing(0);
+    layout->addWidget(table_, 1);
+    layout->addWidget(toolbar_);
+    setFocusProxy(table_);
+
+    updateTitle();
+    reloadData();
+    createToolbarItems();
+}
+
+VantorelPaneController::~VantorelPaneController() = default;
+
+void VantorelPaneController::updateTitle() {
+    std::string title = _nodes ? _nodes->displayName() : kUntitled;
+    if (title == title_) return;
+    title_ = std::move(title);
+    setWindowTitle(QString::fromStdString(title_));
+    emit titleChanged();
+}
+
+void VantorelPaneController::viewWillAppear() {
+    // Base behaviour of the platform's table pane: no row stays selected.
+    table_->clearSelection();
+    updateTitle();
+    toolbar_->setVisible(true);
+    createToolbarItems();
+}
+
+void VantorelPaneController::viewWillDisappear() {
+    QWidget* focus = QApplication::focusWidget();
+    if (focus && (focus == this || isAncestorOf(focus))) focus->clearFocus();
+}
+
+void VantorelPaneController::setStatus(const std::string* status, bool isLoading) {
+    _status = status ? *status : std::string();
+    _isLoading = isLoading;
+    createToolbarItems();
+}
+
+void VantorelPaneController::reloadWithNode(NodeRef node) {
+    _nodes = std::move(node);
+    updateTitle();
+    reloadData();
+    createToolbarItems();
+}
+
+void VantorelPaneController::createToolbarItems() {
+    // The old items go from the event loop: a save button may be inside its own
+    // trigger when a status change rebuilds the toolbar.
+    for (QAction* action : toolbar_->actions()) {
+        toolbar_->removeAction(action);
+        action->deleteLater();
+    }
+
+    // 1. The activity indicator. The toolbar shows or hides its widgets by their
+    // actions, so "hidden when stopped" hides the item's action.
+    activityIndicator_ = new ActivityIndicator;
+    activityIndicatorItem_ = toolbar_->addWidget(activityIndicator_);
+    if (_isLoading) activityIndicator_->startAnimating();
+    activityIndicatorItem_->setVisible(_isLoading);
+
+    // 2. The status line: system font 14 pt, dark text on a clear background.
+    statusLabel_ = new QLabel(QString::fromStdString(_status));
+    QFont font = QApplication::font();
+    font.setPixelSize(kStatusFontSize);
+    statusLabel_->setFont(font);
+    statusLabel_->setTextFormat(Qt::PlainText);
+    QPalette palette = statusLabel_->palette();
+    palette.setColor(QPalette::WindowText, Qt::black);
+    statusLabel_->setPalette(palette);
+    statusLabel_->setAutoFillBackground(false);
+    statusLabel_->adjustSize();
+    toolbar_->addWidget(statusLabel_);
+
+    // 3. The flexible space.
+    auto* space = new QWidget;
+    space->setSizePolicy(QSizePolicy::Expanding, QSizePolicy::Preferred);
+    toolbar_->addWidget(space);
+
+    // 4. The save button, on internal installs only.
+    saveItem_ = nullptr;
+    if (application_ && application_->allowSaveButton()) {
+        saveItem_ = toolbar_->addAction(style()->standardIcon(QStyle::SP_DialogSaveButton), tr("Save"));
+        PaneApplication* application = application_;
+        connect(saveItem_, &QAction::triggered, this, [application] { application->showSaveView(); });
+    }
+}
+
+int VantorelPaneController::toolbarItemCount() const { return int(toolbar_->actions().size()); }
+
+int VantorelPaneController::numberOfRowsInSection() const {
+    const std::vector<NodeRef>* children = _nodes ? _nodes->childNodes() : nullptr;
+    return children ? int(children->size()) : 0;
+}
+
+VantorelCell* VantorelPaneController::dequeueReusableCell(const std::string& identifier) {
+    for (auto it = reusePool_.begin(); it != reusePool_.end(); ++it) {
+        if ((*it)->reuseIdentifier() == identifier) {
+            VantorelCell* cell = *it;
+            reusePool_.erase(it);
+            return cell;
+        }
+    }
+    return nullptr;
+}
+
+VantorelCell* VantorelPaneController::cellForRowAtIndexPath(int row) {
+    const NodeRef& child = _nodes->childNodes()->at(std::size_t(row));
+    VantorelCell* cell = dequeueReusableCell(VantorelCell::kReuseIdentifier);
+    const QString name = QString::fromStdString(child->displayName());
+    if (child->childNodes()) {
+        if (!cell)
+            cell = new VantorelCell(VantorelCell::withStyleKey, VantorelCell::CellStyle::Value1,
+                                    VantorelCell::kReuseIdentifier);
+        cell->key()->setText(name);
+        cell->setAccessoryType(VantorelCell::AccessoryType::DisclosureIndicator);
+        if (cell->value()) cell->value()->setText(QString());
+        cell->setLayoutKey();
+    } else {
+        if (!cell) cell = new VantorelCell(VantorelCell::CellStyle::Value1, VantorelCell::kReuseIdentifier);
+        cell->key()->setText(name);
+        cell->setAccessoryType(VantorelCell::AccessoryType::None);
+        // A drill-down row reused for a leaf has no value label: the value is not
+        // shown until the table makes a new cell (kept, Part 1.2).
+        const std::string* value = child->value();
+        if (cell->value()) cell->value()->setText(value ? QString::fromStdString(*value) : QString());
+        cell->setLayout();
+    }
+    return cell;
+}
+
+void VantorelPaneController::reloadData() {
+    // The rows' cells go back to the pool in row order; the table then deletes the
+    // emptied holders.
+    for (VantorelCell* cell : rowCells_) {
+        cell->hide();
+        cell->setParent(this);
+        reusePool_.push_back(cell);
+    }
+    rowCells_.clear();
+    table_->setRowCount(0);
+
+    const int rows = numberOfRowsInSection();
+    table_->setRowCount(rows);
+    for (int row = 0; row < rows; ++row) {
+        VantorelCell* cell = cellForRowAtIndexPath(row);
+        // The table owns (and deletes) its index widgets; the cell sits in a holder
+        // so that it can leave the table and wait in the pool.
+        auto* holder = new QWidget;
+        auto* layout = new QVBoxLayout(holder);
+        layout->setContentsMargins(0, 0, 0, 0);
+        layout->addWidget(cell);
+        cell->show();
+        table_->setCellWidget(row, 0, holder);
+        rowCells_.push_back(cell);
+    }
+}
+
+VantorelCell* VantorelPaneController::cellAtRow(int row) const {
+    return row >= 0 && std::size_t(row) < rowCells_.size() ? rowCells_[std::size_t(row)] : nullptr;
+}
+
+void VantorelPaneController::didSelectRowAtIndexPath(std::optional<int> row) {
+    if (!row || *row < 0 || *row >= numberOfRowsInSection()) return;
+    const NodeRef child = _nodes->childNodes()->at(std::size_t(*row));  // held across the push
+    if (!child->childNodes()) {
+        table_->selectionModel()->select(table_->model()->index(*row, 0),
+                                         QItemSelectionModel::Deselect | QItemSelectionModel::Rows);
+        return;
+    }
+    auto pane = std::make_unique<VantorelPaneController>(child, childPath(_keyPath, child->displayName()),
+                                                         application_);
+    pane->setStatus(&_status, _isLoading);
+    if (navigationController_) navigationController_->push(std::move(pane), true);
+}
+
+bool VantorelPaneController::eventFilter(QObject* watched, QEvent* event) {
+    if (watched == table_ && event->type() == QEvent::KeyPress) {
+        const int key = static_cast<QKeyEvent*>(event)->key();
+        if (key == Qt::Key_Return || key == Qt::Key_Enter) {
+            const QModelIndex current = table_->currentIndex();
+            didSelectRowAtIndexPath(current.isValid() ? std::optional<int>(current.row()) : std::nullopt);
+            return true;
+        }
+    }
+    return QWidget::eventFilter(watched, event);
+}
+
+}  // namespace vantorel

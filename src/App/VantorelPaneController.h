@@ -1,0 +1,116 @@
+// VantorelPaneController: one level of the display tree as a table pane with its toolbar (Part 1.2).
+#pragma once
+
+#include "Model/VantorelModelNode.h"
+
+#include <QWidget>
+
+#include <deque>
+#include <optional>
+#include <string>
+#include <vector>
+
+class QAction;
+class QLabel;
+class QTableWidget;
+class QToolBar;
+
+namespace vantorel {
+
+class ActivityIndicator;
+class NavigationController;
+class PaneApplication;
+class VantorelCell;
+
+// The platform's table view controller stands behind this class: a one-column
+// table of 50-point rows above the pane's toolbar. Its rows are VantorelCells that
+// go through a reuse pool, as the platform's cells do, so that a reused cell keeps
+// the kind it was made as (Part 1.2).
+class VantorelPaneController : public QWidget {
+    Q_OBJECT
+public:
+    // `initWithNode:atPath:`: `_isLoading` true, `_status` empty. `application`
+    // decides the save button and receives showSaveView; it outlives the pane.
+    VantorelPaneController(NodeRef node, std::string atPath, PaneApplication* application,
+                           QWidget* parent = nullptr);
+    ~VantorelPaneController() override;
+
+    const std::string& path() const { return _keyPath; }
+    const NodeRef& node() const { return _nodes; }
+    // The pane's title: the node's displayName, or "Vantorel" without a node. Set at
+    // creation, by viewWillAppear and by reloadWithNode.
+    const std::string& title() const { return title_; }
+    const std::string& status() const { return _status; }
+    bool isLoading() const { return _isLoading; }
+    PaneApplication* application() const { return application_; }
+
+    // The platform's appearance calls, sent by the navigation controller.
+    void viewWillAppear();
+    void viewWillDisappear();
+
+    // `setStatus:isLoading:`: nil (nullptr) gives the empty string.
+    void setStatus(const std::string* status, bool isLoading);
+    void setStatus(const std::string& status, bool isLoading) { setStatus(&status, isLoading); }
+    // `reloadWithNode:`: replaces the node (nullptr allowed), the title, the rows and
+    // the toolbar.
+    void reloadWithNode(NodeRef node);
+    // Rebuilds the toolbar: activity indicator, status label, flexible space, and the
+    // save button only when the application allows it.
+    void createToolbarItems();
+
+    // The data source and delegate of Part 1.2, by row (the index path's last index).
+    int numberOfRowsInSection() const;
+    VantorelCell* cellForRowAtIndexPath(int row);
+    // Selection; std::nullopt stands for "no index path".
+    void didSelectRowAtIndexPath(std::optional<int> row);
+    // The platform's cell reuse: the first pooled cell with that identifier, or
+    // nullptr when the table has to make a new one.
+    VantorelCell* dequeueReusableCell(const std::string& identifier);
+    // Reloads every row: the rows' cells go back to the reuse pool, in row order,
+    // then each row is made again through cellForRowAtIndexPath.
+    void reloadData();
+
+    // The navigation controller that holds this pane (set by it; nullptr outside one).
+    NavigationController* navigationController() const { return navigationController_; }
+    void setNavigationController(NavigationController* controller) { navigationController_ = controller; }
+
+    // What tests and the navigation controller look at.
+    QTableWidget* tableView() const { return table_; }
+    VantorelCell* cellAtRow(int row) const;     // the cell shown in that row
+    std::size_t reusePoolSize() const { return reusePool_.size(); }
+    QToolBar* toolbar() const { return toolbar_; }
+    int toolbarItemCount() const;
+    ActivityIndicator* activityIndicator() const { return activityIndicator_; }
+    QAction* activityIndicatorItem() const { return activityIndicatorItem_; }
+    QLabel* statusLabel() const { return statusLabel_; }
+    QAction* saveItem() const { return saveItem_; }  // nullptr without the save button
+
+signals:
+    void titleChanged();
+
+protected:
+    bool eventFilter(QObject* watched, QEvent* event) override;
+
+private:
+    void updateTitle();
+
+    // The fields of Part 1.2, in its order.
+    NodeRef _nodes;
+    std::string _keyPath;
+    std::string _status;
+    bool _isLoading = true;
+
+    PaneApplication* application_;
+    NavigationController* navigationController_ = nullptr;
+    std::string title_;
+    QTableWidget* table_;
+    QToolBar* toolbar_;
+    std::vector<VantorelCell*> rowCells_;   // the cell of each row, in row order
+    std::deque<VantorelCell*> reusePool_;   // cells waiting to be reused, oldest first
+    ActivityIndicator* activityIndicator_ = nullptr;
+    QAction* activityIndicatorItem_ = nullptr;
+    QLabel* statusLabel_ = nullptr;
+    QAction* saveItem_ = nullptr;
+};
+
+}  // namespace vantorel

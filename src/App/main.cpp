@@ -1,0 +1,82 @@
+// vantorel: the program a user starts: the window with drill-down panes on the embedded emulator, a replay or a running service (Part 1.1); the terminal view when there is no display.
+#include "App/VantorelApp.h"
+#include "Platform/QuitOnSignal.h"
+#include "Platform/SystemLog.h"
+#include "cli/MonitorLauncher.h"
+#include "cli/WatchCommand.h"
+
+#include <QApplication>
+#include <QCommandLineParser>
+#include <QCoreApplication>
+
+#include <cstdio>
+#include <cstdlib>
+
+namespace {
+
+// A display to open a window on: X11, Wayland, or a Qt platform chosen explicitly.
+bool haveDisplay() {
+    for (const char* variable : {"DISPLAY", "WAYLAND_DISPLAY", "QT_QPA_PLATFORM"}) {
+        const char* value = std::getenv(variable);
+        if (value && *value) return true;
+    }
+    return false;
+}
+
+void addOptions(QCommandLineParser& parser) {
+    parser.setApplicationDescription(
+        "Vantorel: watch, live, what a cellular modem reports, as drill-down panes.\n"
+        "Without a source, the built-in modem emulator runs in-process (UTRAN).\n"
+        "Keys: arrows move, Enter drills down, Backspace or Alt+Left goes back.");
+    parser.addHelpOption();
+    vantorel::MonitorLauncher::addOptions(parser);
+    parser.addOption({"allow-save", "Offer the snapshot save button (also: AllowSaveButton in the settings)."});
+    parser.addOption({"verbose", "Mirror the system log to stderr."});
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+    using namespace vantorel;
+    if (!haveDisplay()) {
+        QCoreApplication app(argc, argv);
+        QCoreApplication::setApplicationName("vantorel");
+        QCommandLineParser parser;
+        addOptions(parser);
+        parser.process(app);
+        SystemLog::setMirrorToStderr(parser.isSet("verbose"));
+        std::string error;
+        auto source = MonitorLauncher::sourceFrom(parser, &error);
+        if (!source) {
+            std::fprintf(stderr, "vantorel: %s\n", error.c_str());
+            return 2;
+        }
+        std::fprintf(stderr, "vantorel: no display (DISPLAY and WAYLAND_DISPLAY are unset): showing the terminal view\n");
+        return WatchCommand::runTerminal(*source, "vantorel");
+    }
+
+    QApplication app(argc, argv);
+    QApplication::setApplicationName("vantorel");
+    QCommandLineParser parser;
+    addOptions(parser);
+    parser.process(app);
+    SystemLog::setMirrorToStderr(parser.isSet("verbose"));
+    std::string error;
+    auto source = MonitorLauncher::sourceFrom(parser, &error);
+    if (!source) {
+        std::fprintf(stderr, "vantorel: %s\n", error.c_str());
+        return 2;
+    }
+    VantorelApp::Options options;
+    options.source = *source;
+    options.allowSave = parser.isSet("allow-save");
+    VantorelApp vantorelApp(options);
+    if (!vantorelApp.applicationDidFinishLaunching(&error)) {
+        std::fprintf(stderr, "vantorel: %s\n", error.c_str());
+        return 1;
+    }
+    QuitOnSignal quit;
+    const int code = QApplication::exec();
+    vantorelApp.applicationWillTerminate();
+    return code;
+}

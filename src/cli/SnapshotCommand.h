@@ -1,0 +1,19 @@
+// SnapshotCommand: `vantorel-cli snapshot FILE [--dlf OUT]`: lists a saved snapshot (Part 1.3 file, Parts 3.1/3.4 entries) and extracts its DLF.
+#pragma once
+
+#include <QStringList>
+
+namespace vantorel {
+
+class SnapshotCommand {
+public:
+    // args: the words after "snapshot". Prints the snapshot's "Timestamp" and
+    // "Description", then one line per "Data" entry (index and "Description", with
+    // its "Date" and the size of a "DLF" below it); with --dlf OUT also writes the
+    // bytes of the first entry holding a "DLF" to OUT. Returns the exit code: 0 done,
+    // 1 a file that cannot be read or is not a snapshot, no DLF to extract or OUT not
+    // written, 2 a usage error.
+    static int run(const QStringList& args);
+};
+
+}  // namespace vantorel
