@@ -23,7 +23,10 @@ bool haveDisplay() {
     return false;
 }
 
-void addOptions(QCommandLineParser& parser) {
+// Reads the options with `app` (a QCoreApplication or QApplication); prints the
+// problem and gives nothing on bad use.
+std::optional<vantorel::MonitorLauncher::Source> parseOptions(QCoreApplication& app, QCommandLineParser& parser) {
+    QCoreApplication::setApplicationName("vantorel");
     parser.setApplicationDescription(
         "Vantorel: watch, live, what a cellular modem reports, as drill-down panes.\n"
         "Without a source, the built-in modem emulator runs in-process (UTRAN).\n"
@@ -32,45 +35,35 @@ void addOptions(QCommandLineParser& parser) {
     vantorel::MonitorLauncher::addOptions(parser);
     parser.addOption({"allow-save", "Offer the snapshot save button (also: AllowSaveButton in the settings)."});
     parser.addOption({"verbose", "Mirror the system log to stderr."});
+    parser.process(app);
+    vantorel::SystemLog::setMirrorToStderr(parser.isSet("verbose"));
+    std::string error;
+    auto source = vantorel::MonitorLauncher::sourceFrom(parser, &error);
+    if (!source) std::fprintf(stderr, "vantorel: %s\n", error.c_str());
+    return source;
 }
 
 }  // namespace
 
 int main(int argc, char** argv) {
     using namespace vantorel;
+    QCommandLineParser parser;
     if (!haveDisplay()) {
         QCoreApplication app(argc, argv);
-        QCoreApplication::setApplicationName("vantorel");
-        QCommandLineParser parser;
-        addOptions(parser);
-        parser.process(app);
-        SystemLog::setMirrorToStderr(parser.isSet("verbose"));
-        std::string error;
-        auto source = MonitorLauncher::sourceFrom(parser, &error);
-        if (!source) {
-            std::fprintf(stderr, "vantorel: %s\n", error.c_str());
-            return 2;
-        }
+        auto source = parseOptions(app, parser);
+        if (!source) return 2;
         std::fprintf(stderr, "vantorel: no display (DISPLAY and WAYLAND_DISPLAY are unset): showing the terminal view\n");
         return WatchCommand::runTerminal(*source, "vantorel");
     }
 
     QApplication app(argc, argv);
-    QApplication::setApplicationName("vantorel");
-    QCommandLineParser parser;
-    addOptions(parser);
-    parser.process(app);
-    SystemLog::setMirrorToStderr(parser.isSet("verbose"));
-    std::string error;
-    auto source = MonitorLauncher::sourceFrom(parser, &error);
-    if (!source) {
-        std::fprintf(stderr, "vantorel: %s\n", error.c_str());
-        return 2;
-    }
+    auto source = parseOptions(app, parser);
+    if (!source) return 2;
     VantorelApp::Options options;
     options.source = *source;
     options.allowSave = parser.isSet("allow-save");
     VantorelApp vantorelApp(options);
+    std::string error;
     if (!vantorelApp.applicationDidFinishLaunching(&error)) {
         std::fprintf(stderr, "vantorel: %s\n", error.c_str());
         return 1;
