@@ -187,10 +187,11 @@ TEST_F(MVKLogGenerator2Test, BuildingTheDisplayLogsTheClassIndexAndItsStatus) {
 TEST(MVKLogGenerator2, CreationAndDestructionLogTheirLines) {
     TestTemplates templates;
     SystemLogCapture capture;
-    void* self = nullptr;
+    char destructed[64];
     {
         TestLogGenerator generator;
-        self = &generator;
+        std::snprintf(destructed, sizeof destructed, "MVK_GSMLogGenerator is destructed %p",
+                      static_cast<void*>(&generator));
         EXPECT_TRUE(capture.contains(SystemLog::kError, "Class Index: 1"));
         char expected[96];
         std::snprintf(expected, sizeof expected, "Creating MVKLogGenerator2 object with %p",
@@ -199,8 +200,6 @@ TEST(MVKLogGenerator2, CreationAndDestructionLogTheirLines) {
         ::testing::internal::CaptureStdout();
     }
     EXPECT_EQ(::testing::internal::GetCapturedStdout(), "Deallocing ClassIndex\n");
-    char destructed[64];
-    std::snprintf(destructed, sizeof destructed, "MVK_GSMLogGenerator is destructed %p", self);
     EXPECT_TRUE(capture.contains(SystemLog::kWarning, destructed));
 }
 

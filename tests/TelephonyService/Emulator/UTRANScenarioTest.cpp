@@ -197,17 +197,17 @@ TEST(UTRANScenario, RRCModeFollowsTheConnectionLifecycle) {
         const Stream stream = run(seed, 300);
         auto rrc = recordsWithCode(stream, 0xD0E0);
         std::vector<int> firstModes;
-        std::optional<int> previous;
+        int previous = -1;  // -1: no valid mode before this record
         for (auto& [n, rec] : rrc) {
             ByteReader rd(rec);
             if (*rd.u8(13) != 1) {
-                previous.reset();
+                previous = -1;
                 continue;
             }
             int mode = *rd.u8(14);
             if (firstModes.empty() || firstModes.back() != mode) firstModes.push_back(mode);
-            if (previous && *previous != mode) {
-                EXPECT_TRUE(allowed.count({*previous, mode})) << "seed " << seed << " tick " << n << ": " << *previous << " -> " << mode;
+            if (previous >= 0 && previous != mode) {
+                EXPECT_TRUE(allowed.count({previous, mode})) << "seed " << seed << " tick " << n << ": " << previous << " -> " << mode;
             }
             previous = mode;
         }

@@ -1,6 +1,8 @@
 // DiagTestFrames: test-side builders of HDLC frames and DIAG bodies (log packets, dual-SIM wrapper) for the Replay reader tests.
 #pragma once
 
+#include <algorithm>
+
 #include "Platform/RecordBuilder.h"
 #include "PropertyList/Value.h"
 
@@ -50,8 +52,10 @@ inline Bytes hdlcFrame(std::initializer_list<uint8_t> body, uint16_t crcXor = 0)
 inline Bytes logPacketBody(uint16_t code, uint64_t timeStamp, ByteView payload) {
     Bytes morvek = RecordBuilder::ordinary(code).timestamp(timeStamp).bytes(13, payload).build();
     const size_t length = morvek.size() - 1;
-    Bytes body{0x10, 0x00, static_cast<uint8_t>(length), static_cast<uint8_t>(length >> 8)};
-    body.insert(body.end(), morvek.begin() + 1, morvek.end());
+    Bytes body(4 + length, 0);
+    body[0] = 0x10;
+    RecordBuilder::put(body, 2, length, 2);
+    std::copy(morvek.begin() + 1, morvek.end(), body.begin() + 4);
     return body;
 }
 
