@@ -7,6 +7,8 @@
 #include <QJsonDocument>
 #include <QJsonObject>
 #include <QTemporaryDir>
+#include "support/CommandOutput.h"
+
 #include <gtest/gtest.h>
 
 using namespace vantorel;
@@ -20,18 +22,9 @@ std::string writeUtranCapture(const QTemporaryDir& dir) {
     return path;
 }
 
-struct Output {
-    int code;
-    std::string out;
-    std::string err;
-};
+using Output = vantorel::testing::CommandOutput;
 
-Output runDecode(const QStringList& args) {
-    ::testing::internal::CaptureStdout();
-    ::testing::internal::CaptureStderr();
-    int code = DecodeCommand::run(args);
-    return {code, ::testing::internal::GetCapturedStdout(), ::testing::internal::GetCapturedStderr()};
-}
+Output runDecode(const QStringList& args) { return vantorel::testing::runCommand(&DecodeCommand::run, args); }
 
 }  // namespace
 
@@ -81,10 +74,10 @@ TEST(DecodeCommand, RealCaptureDecodesWithoutASanitizerReportAndCountsItsBadFram
 }
 
 TEST(InfoCommand, AccountsForEveryFrameOfTheRealCaptures) {
-    ::testing::internal::CaptureStdout();
-    int code = InfoCommand::run({VANTOREL_CAPTURES_DIR "/qmdl_example.qmdl", VANTOREL_CAPTURES_DIR "/sprint.mi2log"});
-    const std::string out = ::testing::internal::GetCapturedStdout();
-    EXPECT_EQ(code, 0);
+    Output r = vantorel::testing::runCommand(
+        &InfoCommand::run, {VANTOREL_CAPTURES_DIR "/qmdl_example.qmdl", VANTOREL_CAPTURES_DIR "/sprint.mi2log"});
+    const std::string& out = r.out;
+    EXPECT_EQ(r.code, 0) << r.err;
     EXPECT_NE(out.find("QMDL, technology unknown, 336 messages"), std::string::npos) << out;
     EXPECT_NE(out.find("frames 345, log packets 336, other packets 9, bad CRC 0, malformed 0, truncated 0"),
               std::string::npos);

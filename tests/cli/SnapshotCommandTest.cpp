@@ -11,24 +11,17 @@
 
 #include <QFile>
 #include <QTemporaryDir>
+#include "support/CommandOutput.h"
+
 #include <gtest/gtest.h>
 
 using namespace vantorel;
 
 namespace {
 
-struct Output {
-    int code;
-    std::string out;
-    std::string err;
-};
+using Output = vantorel::testing::CommandOutput;
 
-Output runSnapshot(const QStringList& args) {
-    ::testing::internal::CaptureStdout();
-    ::testing::internal::CaptureStderr();
-    int code = SnapshotCommand::run(args);
-    return {code, ::testing::internal::GetCapturedStdout(), ::testing::internal::GetCapturedStderr()};
-}
+Output runSnapshot(const QStringList& args) { return vantorel::testing::runCommand(&SnapshotCommand::run, args); }
 
 void writeFile(const QString& path, const Bytes& bytes) {
     QFile file(path);
