@@ -34,6 +34,12 @@ Value LogGenerator::getSaveContentsFromState(Dictionary&) {
     ProgrammingError::unrecognisedOperation("LogGenerator", "getSaveContentsFromState:", this);
 }
 
+void LogGenerator::forgetDisplay(Dictionary& state) {
+    state.remove("Display");
+    state.remove("Template");
+    state.remove("ExtraInfo");
+}
+
 void LogGenerator::updateHistoryInState(Dictionary& state) {
     ArrayRef history = state.get("History").asArray();
     if (history) {

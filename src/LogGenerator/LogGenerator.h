@@ -27,6 +27,13 @@ public:
     // What the save screen writes (Part 3.4 for the Morvek decoders).
     virtual Value getSaveContentsFromState(Dictionary& state);
 
+    // Drops the display this or any earlier decoder kept in the state ("Display",
+    // "Template", "ExtraInfo"), called when the model chooses a new decoder. A display
+    // dictionary is bound to the sections of the decoder that built it: left in place,
+    // the new decoder's sections would never be bound to it and the display would
+    // freeze. "History" and the rest of the state stay.
+    static void forgetDisplay(Dictionary& state);
+
     // Appends a snapshot entry to the state's "History", keeping at most 5.
     static void updateHistoryInState(Dictionary& state);
     // The decoder for a technology identifier (Part 2.2 table, first match wins), or

@@ -201,14 +201,7 @@ void VantorelModel::configureGenerator() {
 
     std::unique_ptr<LogGenerator> chosen =
         technology->asString() ? LogGenerator::generatorFromTechnology(*technology->asString()) : nullptr;
-    if (chosen) {
-        // The display and template in the state belong to the decoder whose sections
-        // are bound to them; a new decoder builds its own, or it would never show a
-        // record. "History" and everything else stay as they are.
-        _state->remove("Display");
-        _state->remove("Template");
-        _state->remove("ExtraInfo");
-    }
+    if (chosen) LogGenerator::forgetDisplay(*_state);
     _logGenerator = std::move(chosen);
     SystemLog::log(SystemLog::kError, "Got log generated: %p", static_cast<void*>(_logGenerator.get()));
 }
