@@ -70,7 +70,8 @@ Value makeDisplay() {
 }
 
 // The nested SIR arrays leave ArrayLock's mutex held one level per inner array by this
-// thread (Part 3.3, intended); harmless here, everything runs on one thread.
+// thread (ArrayLock keeps a nested walk's levels on purpose); harmless here, everything
+// runs on one thread.
 void BM_MakeTreeFromObject(benchmark::State& state) {
     const Value display = makeDisplay();
     size_t nodes = 0;
