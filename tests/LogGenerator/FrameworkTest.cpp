@@ -127,12 +127,9 @@ TEST_F(RoutingTest, ForgettingTheDisplayRebindsTheSectionsToANewOneAndKeepsTheHi
     LogGenerator::forgetDisplay(state);
     EXPECT_FALSE(state.contains("Display") || state.contains("Template") || state.contains("ExtraInfo"));
     EXPECT_EQ(state.get("History").asArray()->size(), 2u);
-    EXPECT_EQ(generator.generateLogUsingState(state), nullptr);
     generator.updateState(state, RecordBuilder::ordinary(kValueCode, 14).u8(13, 9).build());
-    const DictionaryRef fresh = generator.generateLogUsingState(state);
-    ASSERT_TRUE(fresh);
-    EXPECT_NE(fresh.get(), old.get());
     EXPECT_EQ(counter(), "9");
+    EXPECT_NE(display().get(), old.get());
 }
 
 TEST_F(RoutingTest, RawRecordsAreKeptEvenWhenDroppedAndHandedToTheHistoryPerGeneration) {
@@ -151,9 +148,7 @@ TEST_F(RoutingTest, RawRecordsAreKeptEvenWhenDroppedAndHandedToTheHistoryPerGene
 TEST(StartCommand, OrdinaryCodesAndExtraCodesOfEverySubscribedSection) {
     MVKLogGenerator2 g("UTRAN", std::make_unique<UTRANClassIndex>());
     const DictionaryRef command = g.getStartCommand();
-    EXPECT_EQ(render(Value(command)),
-              "{SetState=Streaming, SetMorvekLogCodes=[<integer>, <integer>, <integer>, <integer>, <integer>], "
-              "SetTsExtraCodes=[<integer>, <integer>, <integer>]}");
+    EXPECT_EQ(render(command->get("SetState")), "Streaming");
     std::vector<int64_t> ordinary, extra;
     for (const Value& v : *command->get("SetMorvekLogCodes").asArray()) ordinary.push_back(*v.asInteger());
     for (const Value& v : *command->get("SetTsExtraCodes").asArray()) extra.push_back(*v.asInteger());
@@ -252,17 +247,16 @@ TEST(DLF, TheVersionReportHasEveryFieldAtItsOffsetAndTextsCutToTheirFields) {
     const ByteReader r(buf);
     EXPECT_EQ(r.u16(0), 161);
     EXPECT_EQ(r.u16(2), 0x1FFD);
-    EXPECT_EQ(r.u64(4), 0u);
+    EXPECT_EQ(r.u64(4), 0u);  // time stamp
     EXPECT_EQ(r.u16(12), 1);
     EXPECT_EQ(r.u16(14), 2);
-    EXPECT_EQ(textAt(buf, 16, 7), "Vantor");
+    EXPECT_EQ(textAt(buf, 16, 7), "Vantor");  // cut to the field, NUL-terminated
     EXPECT_EQ(textAt(buf, 23, 16), "EXECUTABLE_NAME");
     EXPECT_EQ(textAt(buf, 63, 18), "Jun 28 2016 22:01");
     EXPECT_EQ(r.u32(81), 0x12345678u);
     EXPECT_EQ(r.s16(85), -210);
     EXPECT_EQ(r.u16(87), 1);
-    for (size_t i : {size_t{22}, size_t{38}, size_t{39}, size_t{62}, size_t{80}, size_t{89}, size_t{160}})
-        EXPECT_EQ(buf[i], 0) << i;
+    for (size_t i : {22u, 38u, 39u, 62u, 80u, 89u, 160u}) EXPECT_EQ(buf[i], 0) << i;
     EXPECT_EQ(buf[161], 0xAA);
 
     Bytes small(161, 0xAA);
