@@ -1,15 +1,18 @@
-// ArrayLock: Part 3.3's shared array lock.
+// ArrayLock: the shared lock between the sections' list rewrites and the display tree builder.
 #include "LogGenerator/ArrayLock.h"
+
+#include <mutex>
 
 namespace vantorel {
 
 namespace {
 // `initialize`: created on first use (function-local statics), counter 0.
-std::recursive_timed_mutex& theMutex() {
-    static std::recursive_timed_mutex m;
+std::recursive_mutex& theMutex() {
+    static std::recursive_mutex m;
     return m;
 }
-// One counter for the whole process, not per thread, not atomic (as stated).
+// One counter for the whole process, not per thread and not atomic: deliberate, the
+// sections and the tree builder that take the lock all run on one thread.
 uint8_t gCounter = 0;
 }  // namespace
 
@@ -25,7 +28,5 @@ void ArrayLock::unlockArray() {
 }
 
 uint8_t ArrayLock::counter() { return gCounter; }
-
-std::recursive_timed_mutex& ArrayLock::mutexForTesting() { return theMutex(); }
 
 }  // namespace vantorel

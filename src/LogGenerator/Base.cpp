@@ -1,7 +1,8 @@
-// Base: Part 3.3's section base class, the array rewrites under ArrayLock and lookUpECNO:.
+// Base: the section base class, the list rewrites under ArrayLock and the Ec/No lookup.
 #include "LogGenerator/Base.h"
 
 #include "LogGenerator/ArrayLock.h"
+#include "Platform/ByteReader.h"
 #include "Platform/ProgrammingError.h"
 #include "Platform/SystemLog.h"
 #include "PropertyList/Array.h"
@@ -60,7 +61,7 @@ void Base::replaceArray(Array& array, const Array& With) {
 int32_t Base::lookUpECNO(uint32_t value) {
     if (value >= 524288) return 0;  // any of bits 19 to 31 set
     if (value >= 417648) return -1;
-    // Lower bounds (inclusive), scanning downward; irregular spacing kept as listed.
+    // Lower bounds (inclusive), scanning downward; the irregular spacing is the modem's own.
     static const uint32_t kBounds[] = {331809, 263625, 209464, 166442, 132269, 105124, 83563, 66436,
                                        52831,  42024,  33441,  26622,  21206,  16904,  13487, 10772,
                                        8616,   6903,   5543,   4462,   3604,   2922,   2241,  1950,
@@ -93,8 +94,27 @@ const char* Base::tableText(const char* const* table, size_t count, unsigned val
     return table[value];
 }
 
+void Base::rebuildList(ByteView record, size_t minLength, bool clearFirst, const ListRows& buildRows) const {
+    const ByteReader reader(record);
+    if (reader.size() < minLength) return;
+    if (clearFirst) clearSectionArray();
+    if (const ArrayRef rows = buildRows(reader)) replaceSectionArray(*rows);
+}
+
+ArrayRef Base::readEntries(const ByteReader& record, size_t firstOffset, size_t stride, size_t entrySize,
+                           unsigned count, const std::function<Value(const ByteReader& entry)>& row) {
+    auto rows = Array::create();
+    for (unsigned i = 0; i < count; ++i) {
+        const auto entry = record.slice(firstOffset + stride * i, entrySize);
+        if (!entry) break;
+        rows->append(row(ByteReader(*entry)));
+    }
+    return rows;
+}
+
 PropertyListResult Base::parseExtraPayload(ByteView record) {
-    return PropertyListSerialization::read(record.size() > 13 ? record.subspan(13) : ByteView());
+    // Offset 13 is the end of the record header; from() gives nothing for a header-only record.
+    return PropertyListSerialization::read(ByteReader(record).from(13));
 }
 
 void Base::logUnknownCode(int32_t logCode) {

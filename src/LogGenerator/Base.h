@@ -1,4 +1,4 @@
-// Base: the section base class and protocol of Part 3.3 (initWithDict:codeDict:, getSectionName, getLogCodeArray, updateWithData:logCode:), with lookUpECNO:.
+// Base: the display section base class: registration by name and log codes, record decoding into the bound container, list rebuilding, Ec/No lookup.
 #pragma once
 
 #include "LogGenerator/CodeDictionary.h"
@@ -6,6 +6,7 @@
 #include "PropertyList/Value.h"
 
 #include <cstdint>
+#include <functional>
 #include <stdexcept>
 #include <string>
 #include <vector>
@@ -13,10 +14,12 @@
 namespace vantorel {
 
 class Array;
+class ByteReader;
 class Dictionary;
 
-// The error a section raises out of updateWithData:logCode: (Part 5.6's "raises an
-// error"); the routing loop of Part 3.2 catches it, logs it and goes on.
+// The error a section raises out of updateWithData when a record cannot be decoded at
+// all (a SIM-file payload that is not a property list); the routing loop catches it,
+// logs it and hands the record to the next section.
 class SectionError : public std::runtime_error {
 public:
     using std::runtime_error::runtime_error;
@@ -48,7 +51,10 @@ public:
     static void clearElementsInArray(Array& array);
     static void replaceArray(Array& array, const Array& With);
 
-    // Linear Ec/No to whole dB by Part 3.3's threshold table.
+    // The property list an extra record carries from offset 13 to its end.
+    static PropertyListResult parseExtraPayload(ByteView record);
+
+    // Linear Ec/No to whole dB by the modem's threshold table.
     static int32_t lookUpECNO(uint32_t value);
 
     // The bound container, or null when unbound, gone, or of the other kind.
@@ -71,8 +77,20 @@ protected:
         return tableText(table, N, value, fallback);
     }
 
-    // The property list an extra record carries from offset 13 to its end.
-    static PropertyListResult parseExtraPayload(ByteView record);
+    // The rows of one record, or null to leave the list as it stands.
+    using ListRows = std::function<ArrayRef(const ByteReader& record)>;
+    // The one skeleton of every list section. A record shorter than minLength leaves the
+    // list as it was. Otherwise, with clearFirst, the list is emptied under ArrayLock
+    // before the record is read; then buildRows reads it and the rows it returns replace
+    // the list under ArrayLock, so the display's reader never sees a half-built list.
+    void rebuildList(ByteView record, size_t minLength, bool clearFirst, const ListRows& buildRows) const;
+
+    // Up to count fixed-size entries of a record, the first at firstOffset and each next
+    // one stride bytes on, each read through a reader of the entry alone (offsets
+    // relative to the entry). Stops at the first entry that does not lie wholly inside
+    // the record, so a count larger than the record holds never reads past its end.
+    static ArrayRef readEntries(const ByteReader& record, size_t firstOffset, size_t stride, size_t entrySize,
+                                unsigned count, const std::function<Value(const ByteReader& entry)>& row);
 
     // "Received an unknown log message: %d" at error priority.
     static void logUnknownCode(int32_t logCode);

@@ -1,10 +1,42 @@
-// CellMonitor: cell-monitor dictionary matching shared by the serving-cell sections (Parts 5.2, 6.2, 7.2).
+// CellMonitor: the serving cell of the cell-monitor array, shown field by field.
 #include "LogGenerator/CellMonitor.h"
 
+#include "LogGenerator/Base.h"
+#include "Platform/StringFormat.h"
+#include "Platform/SystemLog.h"
 #include "Platform/TelephonyIdentifiers.h"
+#include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
 
 namespace vantorel {
+
+bool CellMonitor::showServingCell(ByteView record, std::initializer_list<const char*> technologies, Pick pick,
+                                  std::span<const Field> fields, const SetValue& setValue) {
+    const PropertyListResult parsed = Base::parseExtraPayload(record);
+    if (!parsed) {
+        SystemLog::log(SystemLog::kError, "%s", "Cell Info Array data could not be constructed");
+        return false;
+    }
+    const ArrayRef cells = parsed.value->asArray();
+    if (!cells) return true;
+
+    for (const Value& cell : *cells) {
+        if (!matches(cell, technologies, kTSCellMonitorCellTypeServing)) continue;
+        // Every field is read even when an earlier one is missing.
+        for (const Field& field : fields) {
+            if (const auto v = int32(cell, field.cellKey)) {
+                const std::string text = StringFormat::format("%d", *v);
+                setValue(field.displayKey, text);
+                if (field.secondDisplayKey) setValue(field.secondDisplayKey, text);
+            } else {
+                SystemLog::log(SystemLog::kError, "%s", field.failure);
+            }
+        }
+        // With LastCell every later serving cell overwrites the same keys.
+        if (pick == Pick::FirstCell) break;
+    }
+    return true;
+}
 
 bool CellMonitor::matches(const Value& cell, std::initializer_list<const char*> technologies, const char* cellType) {
     auto dict = cell.asDictionary();

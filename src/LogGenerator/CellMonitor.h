@@ -1,16 +1,42 @@
-// CellMonitor: reading the telephony service's cell-monitor dictionaries of the 0xFF0001 extra record (Overview "Cell-monitor dictionaries"; Parts 5.2, 6.2, 7.2).
+// CellMonitor: reads the serving cell from the telephony service's cell-monitor array (extra record 0xFF0001) for the serving-cell sections.
 #pragma once
 
 #include "PropertyList/Value.h"
 
 #include <cstdint>
+#include <functional>
 #include <initializer_list>
 #include <optional>
+#include <span>
+#include <string>
 
 namespace vantorel {
 
+// The 0xFF0001 payload (offset 13 to the end) is a property list whose root is an array
+// of cell dictionaries, each with its radio access technology, its cell type (serving,
+// neighbour, ...) and numbers such as MCC, LAC or UARFCN.
 class CellMonitor {
 public:
+    // One number of the cell shown under up to two display keys; a cell lacking it logs
+    // `failure` at error priority and leaves the display keys as they were.
+    struct Field {
+        const char* cellKey;
+        const char* displayKey;
+        const char* secondDisplayKey;  // or nullptr
+        const char* failure;
+    };
+    // Which of several matching serving cells the display shows.
+    enum class Pick { FirstCell, LastCell };
+    using SetValue = std::function<void(const std::string& key, const std::string& text)>;
+
+    // Parses the record and shows the fields of its serving cells of one of
+    // `technologies` through setValue, as decimal text. Returns false, after logging
+    // "Cell Info Array data could not be constructed", when the payload is not a
+    // property list; a root that is not an array holds no cells and changes nothing.
+    static bool showServingCell(ByteView record, std::initializer_list<const char*> technologies, Pick pick,
+                                std::span<const Field> fields, const SetValue& setValue);
+
+private:
     // True when the cell is a dictionary whose radio access technology is one of
     // `technologies` and whose cell type equals `cellType`; a cell lacking either key
     // (or not a dictionary) does not match.

@@ -1,4 +1,4 @@
-// ClassIndex: Part 3.3's class index.
+// ClassIndex: the section registry and log-code router of a decoder.
 #include "LogGenerator/ClassIndex.h"
 
 #include "Platform/SystemLog.h"

@@ -1,4 +1,4 @@
-// ClassIndex: Part 3.3's router from log codes to the sections that subscribe to them.
+// ClassIndex: a decoder's sections by name and its router from log codes to the sections that subscribe to them.
 #pragma once
 
 #include "LogGenerator/Base.h"

@@ -1,4 +1,4 @@
-// CodeDictionary: Part 3.3's `codeDictionary` (log code as a decimal string to its subscribing sections, in registration order).
+// CodeDictionary: log code (as a decimal string) to its subscribing sections, keys in registration order.
 #pragma once
 
 #include <string>

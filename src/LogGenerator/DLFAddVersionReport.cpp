@@ -1,6 +1,7 @@
-// DLFAddVersionReport: Part 3.4's version-report record.
+// DLFAddVersionReport: the DLF file's 161-byte version-report record.
 #include "LogGenerator/DLFAddVersionReport.h"
 
+#include "Platform/LogCodes.h"
 #include "Platform/RecordBuilder.h"
 
 #include <algorithm>
@@ -35,7 +36,7 @@ int DLFAddVersionReport(uint8_t* buffer, unsigned capacity, unsigned* written, u
     // The body is the 149 bytes from 12; its own offsets 0, 2, 4, 11, 51, 69, 73, 75.
     Bytes record(kDLFVersionReportLength, 0);
     RecordBuilder::put(record, 0, kDLFVersionReportLength, 2);
-    RecordBuilder::put(record, 2, 0x1FFD, 2);
+    RecordBuilder::put(record, 2, LogCode::kDlfVersionReport, 2);
     RecordBuilder::put(record, 12, firstVersion, 2);
     RecordBuilder::put(record, 14, secondVersion, 2);
     putText(&record[16], 7, versionText);

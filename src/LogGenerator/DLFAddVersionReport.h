@@ -1,4 +1,4 @@
-// DLFAddVersionReport: writes the DLF's 161-byte version-report record (code 0x1FFD) of Part 3.4.
+// DLFAddVersionReport: writes the DLF file's 161-byte version-report record (code 0x1FFD) that opens every saved log.
 #pragma once
 
 #include <cstdint>

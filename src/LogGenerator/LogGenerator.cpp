@@ -1,4 +1,4 @@
-// LogGenerator: Part 3.1's abstract decoder, history and decoder choice.
+// LogGenerator: the abstract decoder, its snapshot history and the choice of decoder by technology.
 #include "LogGenerator/LogGenerator.h"
 
 #include "LogGenerator/UTRAN/UTRANLogGenerator.h"
@@ -50,7 +50,8 @@ void LogGenerator::updateHistoryInState(Dictionary& state) {
     }
 
     // The entry is built from these pairs in order and stops at the first absent
-    // value (kept as the spec states it: no "DisplayState" gives an empty entry).
+    // value (deliberate, as the modem's own tool does: no "DisplayState" gives an
+    // empty entry).
     auto entry = Dictionary::create();
     const std::string date = DateDescription::now();
     const std::string description = StringFormat::format("Snapshot (%s)", DateDescription::now().c_str());
@@ -77,12 +78,13 @@ struct TechnologyRow {
     Factory generator;  // null until the technology's decoder is built
 };
 
-// Part 2.2's table, in its order; first match wins.
+// Channel technology to decoder, first match wins; the technologies without a decoder
+// of their own yet give none.
 const TechnologyRow kTechnologies[] = {
-    {kTSLogChannelTechnology_IFX, nullptr},           // GSMLogGenerator, Part 8.1
-    {kTSLogChannelTechnology_Morvek_GSM, nullptr},    // MVK_GSMLogGenerator, Part 5.1
-    {kTSLogChannelTechnology_Morvek_CDMA, nullptr},   // C2KLogGenerator, Part 4.1
-    {kTSLogChannelTechnology_Morvek_LTE, nullptr},    // LTELogGenerator, Part 6.1
+    {kTSLogChannelTechnology_IFX, nullptr},
+    {kTSLogChannelTechnology_Morvek_GSM, nullptr},
+    {kTSLogChannelTechnology_Morvek_CDMA, nullptr},
+    {kTSLogChannelTechnology_Morvek_LTE, nullptr},
     {kTSLogChannelTechnology_Morvek_UTRAN2, &UTRANLogGenerator::generator},
 };
 
@@ -92,7 +94,7 @@ std::unique_ptr<LogGenerator> LogGenerator::generatorFromTechnology(const std::s
     for (const auto& row : kTechnologies) {
         if (technology != row.identifier) continue;
         if (!row.generator) return nullptr;
-        // A decoder that could not set itself up (Part 7.1: no template resource) is
+        // A decoder that could not set itself up (no display template resource) is
         // unusable: the model gets none, as for an unknown identifier.
         std::unique_ptr<LogGenerator> generator = row.generator();
         if (!generator || !generator->isUsable()) return nullptr;

@@ -1,4 +1,4 @@
-// LogGenerator: the abstract decoder with its bounded snapshot history and the choice of decoder by technology (Part 3.1).
+// LogGenerator: the abstract decoder with its bounded snapshot history and the choice of decoder by technology.
 #pragma once
 
 #include "PropertyList/Value.h"
@@ -24,7 +24,7 @@ public:
     // The display dictionary, or null (DictionaryRef()).
     virtual DictionaryRef generateLogUsingState(Dictionary& state);
     virtual DictionaryRef getStartCommand();
-    // What the save screen writes (Part 3.4 for the Morvek decoders).
+    // What the save screen writes (history entries and, for the Morvek decoders, a DLF).
     virtual Value getSaveContentsFromState(Dictionary& state);
 
     // Drops the display this or any earlier decoder kept in the state ("Display",
@@ -36,11 +36,11 @@ public:
 
     // Appends a snapshot entry to the state's "History", keeping at most 5.
     static void updateHistoryInState(Dictionary& state);
-    // The decoder for a technology identifier (Part 2.2 table, first match wins), or
+    // The decoder for a technology identifier (first match wins), or
     // null for an identifier with no decoder.
     static std::unique_ptr<LogGenerator> generatorFromTechnology(const std::string& technology);
 
-    // False for a decoder that could not be set up (Part 7.1: no template resource);
+    // False for a decoder that could not be set up (no display template resource);
     // the model treats such a decoder as unusable.
     virtual bool isUsable() const { return true; }
 };

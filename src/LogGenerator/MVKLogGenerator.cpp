@@ -1,4 +1,4 @@
-// MVKLogGenerator: Part 3.4's snapshot contents and DLF log file.
+// MVKLogGenerator: the snapshot contents and the DLF log file of the Morvek-channel decoders.
 #include "LogGenerator/MVKLogGenerator.h"
 
 #include "BuildInfo.h"
@@ -51,7 +51,7 @@ std::optional<Bytes> MVKLogGenerator::generateDlfFromState(Dictionary& state) {
                 return std::nullopt;
             }
             // Only the first byte of each buffer is dropped, however many records it
-            // holds: required as stated.
+            // holds: deliberate, the DLF readers of the modem's tools expect it so.
             if (bytes->size() >= 2) dlf.insert(dlf.end(), bytes->begin() + 1, bytes->end());
         }
     }

@@ -1,4 +1,4 @@
-// MVKLogGenerator: base of the Morvek-channel decoders: the raw-record buffer, the DLF writer and the snapshot contents (Part 3.4).
+// MVKLogGenerator: base of the Morvek-channel decoders: the raw-record buffer, the DLF writer and the snapshot contents.
 #pragma once
 
 #include "LogGenerator/LogGenerator.h"
@@ -18,7 +18,7 @@ public:
     // The history's entries, then {"Description": "DLF binary (%d bytes)", "DLF": bytes}.
     Value getSaveContentsFromState(Dictionary& state) override;
 
-    // The texts the snapshot writer passes (fixed at build time; Part 3.4).
+    // The texts the snapshot writer passes (fixed at build time).
     static std::string versionText();  // "Vantorel %@" with the build version, or "(none)"
     static const char* buildDateText();
 

@@ -1,22 +1,18 @@
-// MVKLogGenerator2: Part 3.2's template-driven generator.
+// MVKLogGenerator2: the template-driven generator: record framing, routing to sections, display binding, start command.
 #include "LogGenerator/MVKLogGenerator2.h"
 
 #include "Platform/ByteReader.h"
+#include "Platform/LogCodes.h"
 #include "Platform/ResourceBundle.h"
 #include "Platform/SystemLog.h"
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
-
-#include <exception>
 
 namespace vantorel {
 
 namespace {
 constexpr size_t kHeaderLength = 13;
 constexpr uint8_t kPrefixByte = 0x81;
-constexpr uint8_t kOrdinaryType = 1;
-constexpr uint8_t kExtraType = 255;
-constexpr int32_t kExtraCodeBase = 0xFF0000;
 }  // namespace
 
 MVKLogGenerator2::MVKLogGenerator2() = default;
@@ -30,7 +26,7 @@ MVKLogGenerator2::MVKLogGenerator2(std::string pListName_, std::unique_ptr<Class
 }
 
 MVKLogGenerator2::~MVKLogGenerator2() {
-    // The one class name for every subclass, on purpose (Part 3.2).
+    // The one class name for every subclass, on purpose: the modem's own tool logs it so.
     SystemLog::log(SystemLog::kWarning, "MVK_GSMLogGenerator is destructed %p", static_cast<void*>(this));
 }
 
@@ -49,13 +45,13 @@ void MVKLogGenerator2::updateWithData(ByteView data) {
     ByteView record = buffer.u8(0) == kPrefixByte ? buffer.from(2) : data;
     ByteReader reader(record);
     const uint8_t type = reader.u8(0).value_or(0);
-    if (type != kOrdinaryType && type != kExtraType) {
+    if (type != LogCode::kOrdinaryType && type != LogCode::kExtraType) {
         SystemLog::log(SystemLog::kError, "Invalid log type: %x. Dropping.", type);
         return;
     }
     // An 11-byte record (13 bytes with the prefix) still has its code at 3..4.
     int32_t code = reader.u16(3).value_or(0);
-    if (type == kExtraType) code |= kExtraCodeBase;
+    if (type == LogCode::kExtraType) code |= LogCode::kExtraBase;
 
     const SectionList* subscribers = cIndex ? cIndex->getSubscribers(code) : nullptr;
     if (!subscribers) return;
@@ -64,7 +60,7 @@ void MVKLogGenerator2::updateWithData(ByteView data) {
         // the others still get it, and the stream goes on.
         try {
             section->updateWithData(record, code);
-        } catch (const std::exception& e) {
+        } catch (const SectionError& e) {
             SystemLog::log(SystemLog::kError, " ***** Section \"%s\" dropped record 0x%X: %s",
                            section->getSectionName().c_str(), static_cast<unsigned>(code), e.what());
         }
@@ -151,8 +147,8 @@ DictionaryRef MVKLogGenerator2::getStartCommand() {
     if (cIndex) {
         for (const std::string& code : cIndex->getAllLogCodes()) {
             const long long value = std::stoll(code);  // keys are decimal strings we wrote
-            if (value >= kExtraCodeBase)
-                extra->append(Value::integer(value - kExtraCodeBase));
+            if (value >= LogCode::kExtraBase)
+                extra->append(Value::integer(value - LogCode::kExtraBase));
             else
                 ordinary->append(Value::integer(value));
         }

@@ -1,4 +1,4 @@
-// MVKLogGenerator2: the template-driven decoder of the Morvek channel: framing, routing, display binding and start command (Part 3.2).
+// MVKLogGenerator2: the template-driven decoder of the Morvek channel: framing, routing, display binding and start command.
 #pragma once
 
 #include "LogGenerator/ClassIndex.h"
@@ -35,7 +35,7 @@ public:
     const std::string& templateName() const { return pListName; }
 
 protected:
-    // An object that was never initialised as a generator (Part 7.1: no template);
+    // An object that was never initialised as a generator (no display template);
     // it decodes nothing and isUsable() is false.
     MVKLogGenerator2();
 

@@ -1,4 +1,4 @@
-// Array: a property-list array of values; the value model of DESIGN.md.
+// Array: a property-list array of values, shared by reference so sections can fill the display's lists.
 #include "PropertyList/Array.h"
 
 #include <algorithm>

@@ -1,4 +1,4 @@
-// Dictionary: an insertion-ordered property-list dictionary; the value model of DESIGN.md.
+// Dictionary: an insertion-ordered property-list dictionary with string keys.
 #include "PropertyList/Dictionary.h"
 
 namespace vantorel {

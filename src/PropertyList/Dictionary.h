@@ -1,4 +1,4 @@
-// Dictionary: an insertion-ordered property-list dictionary with string keys; the value model of DESIGN.md.
+// Dictionary: an insertion-ordered property-list dictionary with string keys.
 #pragma once
 
 #include "PropertyList/Value.h"

@@ -1,4 +1,4 @@
-// PropertyListSerialization: the libplist bridge of the value model (DESIGN.md); every plist read or written goes through it.
+// PropertyListSerialization: the libplist bridge of the value model; every plist read or written goes through it.
 #include "PropertyList/PropertyListSerialization.h"
 
 #include "PropertyList/Array.h"

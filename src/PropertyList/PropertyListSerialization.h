@@ -1,4 +1,4 @@
-// PropertyListSerialization: reads and writes XML and binary property lists through libplist; the value model of DESIGN.md.
+// PropertyListSerialization: reads and writes XML and binary property lists through libplist.
 #pragma once
 
 #include "PropertyList/Value.h"

@@ -1,4 +1,4 @@
-// Value: one property-list value; the value model of DESIGN.md.
+// Value: one property-list value (scalars by value, containers by shared reference).
 #include "PropertyList/Value.h"
 
 #include "PropertyList/Array.h"

@@ -1,4 +1,4 @@
-// Value: one property-list value (string, integer, real, boolean, data, date, dictionary, array); the value model of DESIGN.md.
+// Value: one property-list value (string, integer, real, boolean, data, date, dictionary, array).
 #pragma once
 
 #include <cstdint>
@@ -25,13 +25,13 @@ struct Date {
 };
 
 // A property-list value. Scalars are held by value; dictionaries and arrays are held
-// by shared reference, like the spec's reference-counted containers, so that a
-// section can write into a container that the display dictionary owns.
+// by shared reference, so that a section can write into a container that the display
+// dictionary owns.
 class Value {
 public:
     enum class Type { Null, String, Integer, Real, Boolean, Data, Date, Dictionary, Array };
 
-    Value() = default;  // the null value (the spec's nil)
+    Value() = default;  // the null value
     Value(const char* s);
     Value(std::string s);
     Value(DictionaryRef d);
@@ -60,12 +60,13 @@ public:
     DictionaryRef asDictionary() const;
     ArrayRef asArray() const;
 
-    // The spec's "signed 32-bit integer" reading of a number: integers, and reals
-    // with a whole value; empty for anything else.
+    // A number read as a signed 32-bit integer: an integer's low 32 bits, or a real
+    // truncated toward zero (2.9 gives 2, -2.9 gives -2) when it lies within the
+    // 32-bit range; empty for anything else (strings, non-finite or out-of-range reals).
     std::optional<int32_t> asInt32() const;
 
-    // A copy that shares no container with this one (the spec's "immutable copy"
-    // and "deep mutable copy").
+    // A copy that shares no container with this one, so later writes to either
+    // never show in the other.
     Value deepCopy() const;
 
     // Structural equality (containers compared by content).

@@ -1,4 +1,4 @@
-// CellChangeCounters: Part 5.2's "Cell Change Counters" section: no log codes; it only gives the template key a section owner.
+// CellChangeCounters: the "Cell Change Counters" section: no log codes; it only gives the template key a section owner.
 #include "LogGenerator/MVK_GSM/CellChangeCounters.h"
 
 #include "Platform/SystemLog.h"

@@ -1,4 +1,4 @@
-// CellChangeCounters: the "Cell Change Counters" section of Part 5.2 (no log codes; owns its template key).
+// CellChangeCounters: the "Cell Change Counters" section (no log codes; owns its template key).
 #pragma once
 
 #include "LogGenerator/Base.h"

@@ -1,4 +1,4 @@
-// CodingScheme: Part 5.2's "Coding Scheme" section: no log codes; it only gives the template key a section owner.
+// CodingScheme: the "Coding Scheme" section: no log codes; it only gives the template key a section owner.
 #include "LogGenerator/MVK_GSM/CodingScheme.h"
 
 #include "Platform/SystemLog.h"
@@ -9,8 +9,8 @@ std::string CodingScheme::getSectionName() const { return "Coding Scheme"; }
 
 std::vector<int32_t> CodingScheme::getLogCodeArray() const { return {}; }
 
-// Nothing is routed here; a direct call only logs the entry line, which is the same
-// text as Cell Change Counters' (Part 5.2, by design).
+// Nothing is routed here; a direct call only logs the entry line, which is
+// deliberately the same text as Cell Change Counters' (the modem's own tool logs it so).
 void CodingScheme::updateWithData(ByteView /*data*/, int32_t /*logCode*/) {
     SystemLog::log(SystemLog::kWarning, "%s", "CellChangeCounters");
 }

@@ -1,4 +1,4 @@
-// CodingScheme: the "Coding Scheme" section of Part 5.2 (no log codes; owns its template key).
+// CodingScheme: the "Coding Scheme" section (no log codes; owns its template key).
 #pragma once
 
 #include "LogGenerator/Base.h"

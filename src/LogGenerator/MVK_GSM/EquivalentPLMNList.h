@@ -1,4 +1,4 @@
-// EquivalentPLMNList: the "Equivalent PLMN List" list section of Part 5.2 (0x7150).
+// EquivalentPLMNList: the "Equivalent PLMN List" list section (0x7150).
 #pragma once
 
 #include "LogGenerator/Base.h"

@@ -1,4 +1,4 @@
-// PDPContextList: the "PDP Context Info" list section of Part 5.2 (0xFF0002 packet-data contexts).
+// PDPContextList: the "PDP Context Info" list section (0xFF0002 packet-data contexts).
 #pragma once
 
 #include "LogGenerator/Base.h"

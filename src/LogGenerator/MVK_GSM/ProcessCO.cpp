@@ -1,35 +1,32 @@
-// ProcessCO: Part 5.2's "Process CO" section: MM state only (0x7131) and MM service state (0x7132), with Process CS's tables.
+// ProcessCO: the "Process CO" section: MM state only (0x7131) and MM service state (0x7132), with Process CS's tables.
 #include "LogGenerator/MVK_GSM/ProcessCO.h"
 
 #include "LogGenerator/MVK_GSM/ProcessCS.h"
 #include "Platform/ByteReader.h"
+#include "Platform/LogCodes.h"
 #include "Platform/SystemLog.h"
 
 namespace vantorel {
 
-namespace {
-constexpr int32_t kMMState = 0x7131;
-constexpr int32_t kRegistrationState = 0x7132;
-}  // namespace
-
 std::string ProcessCO::getSectionName() const { return "Process CO"; }
 
-std::vector<int32_t> ProcessCO::getLogCodeArray() const { return {kMMState, kRegistrationState}; }
+std::vector<int32_t> ProcessCO::getLogCodeArray() const { return {LogCode::kMMState, LogCode::kRegistrationState}; }
 
 void ProcessCO::updateWithData(ByteView data, int32_t logCode) {
-    // Part 5.2: Process CO logs the same entry text as Process CS, by design.
+    // Deliberate: Process CO logs the same entry text as Process CS, as the modem's
+    // own tool does.
     SystemLog::log(SystemLog::kWarning, "%s", "ProcessCS");
     const ByteReader r(data);
     switch (logCode) {
-        case kMMState:
+        case LogCode::kMMState:
             // 13 MM state; the sub-state and update status bytes are not shown here.
             if (r.size() < 16) return;
-            setValue("MM State", ProcessCS::mmStateText(*r.u8(13)));
+            setValue("MM State", ProcessCS::mmStateText(r.u8(13).value_or(0)));
             break;
-        case kRegistrationState:
+        case LogCode::kRegistrationState:
             // 13 MM service state.
             if (r.size() < 16) return;
-            setValue("MM Service State", ProcessCS::serviceStateText(*r.u8(13)));
+            setValue("MM Service State", ProcessCS::serviceStateText(r.u8(13).value_or(0)));
             break;
         default:
             logUnknownCode(logCode);

@@ -1,4 +1,4 @@
-// ProcessCO: the "Process CO" section of Part 5.2 (MM state and service state only).
+// ProcessCO: the "Process CO" section (MM state and service state only).
 #pragma once
 
 #include "LogGenerator/Base.h"

@@ -1,15 +1,13 @@
-// ProcessCS: Part 5.2's "Process CS" section: MM state, sub-state and update status (0x7131), MM service state (0x7132); owns the MM tables.
+// ProcessCS: the "Process CS" section: MM state, sub-state and update status (0x7131), MM service state (0x7132); owns the MM tables.
 #include "LogGenerator/MVK_GSM/ProcessCS.h"
 
 #include "Platform/ByteReader.h"
+#include "Platform/LogCodes.h"
 #include "Platform/SystemLog.h"
 
 namespace vantorel {
 
 namespace {
-
-constexpr int32_t kMMState = 0x7131;
-constexpr int32_t kRegistrationState = 0x7132;
 
 // Range 0 to 25; the gaps (1, 2, 4, 11, 12, 16, 24) show "Unknown". The blanks inside
 // rows 20 and 21 are part of the texts.
@@ -66,23 +64,23 @@ const char* ProcessCS::serviceStateText(unsigned value) { return tableText(kServ
 
 std::string ProcessCS::getSectionName() const { return "Process CS"; }
 
-std::vector<int32_t> ProcessCS::getLogCodeArray() const { return {kMMState, kRegistrationState}; }
+std::vector<int32_t> ProcessCS::getLogCodeArray() const { return {LogCode::kMMState, LogCode::kRegistrationState}; }
 
 void ProcessCS::updateWithData(ByteView data, int32_t logCode) {
     SystemLog::log(SystemLog::kWarning, "%s", "ProcessCS");
     const ByteReader r(data);
     switch (logCode) {
-        case kMMState:
+        case LogCode::kMMState:
             // 13 MM state, 14 MM sub-state, 15 update status; keys in this order.
             if (r.size() < 16) return;
-            setValue("MM State", mmStateText(*r.u8(13)));
-            setValue("MM Sub State", tableText(kMMSubStateTable, *r.u8(14)));
-            setValue("LU Reject Cause", tableText(kUpdateStatusTable, *r.u8(15)));
+            setValue("MM State", mmStateText(r.u8(13).value_or(0)));
+            setValue("MM Sub State", tableText(kMMSubStateTable, r.u8(14).value_or(0)));
+            setValue("LU Reject Cause", tableText(kUpdateStatusTable, r.u8(15).value_or(0)));
             break;
-        case kRegistrationState:
+        case LogCode::kRegistrationState:
             // 13 MM service state.
             if (r.size() < 16) return;
-            setValue("MM Service State", serviceStateText(*r.u8(13)));
+            setValue("MM Service State", serviceStateText(r.u8(13).value_or(0)));
             break;
         default:
             logUnknownCode(logCode);

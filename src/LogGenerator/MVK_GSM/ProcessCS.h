@@ -1,4 +1,4 @@
-// ProcessCS: the "Process CS" section of Part 5.2 (circuit-switched MM state, sub-state, update status and service state).
+// ProcessCS: the "Process CS" section (circuit-switched MM state, sub-state, update status and service state).
 #pragma once
 
 #include "LogGenerator/Base.h"

@@ -1,16 +1,14 @@
-// ProcessPS: Part 5.2's "Process PS" section: GMM state, sub-state and update status (0x7130), MM service state (0x7132).
+// ProcessPS: the "Process PS" section: GMM state, sub-state and update status (0x7130), MM service state (0x7132).
 #include "LogGenerator/MVK_GSM/ProcessPS.h"
 
 #include "LogGenerator/MVK_GSM/ProcessCS.h"
 #include "Platform/ByteReader.h"
+#include "Platform/LogCodes.h"
 #include "Platform/SystemLog.h"
 
 namespace vantorel {
 
 namespace {
-
-constexpr int32_t kGMMState = 0x7130;
-constexpr int32_t kRegistrationState = 0x7132;
 
 const char* const kGMMStateTable[] = {
     "GMM_NULL",
@@ -22,7 +20,7 @@ const char* const kGMMStateTable[] = {
     "GMM_SERVICE_REQUEST_INITIATED",
 };
 
-// Row 9 is spelled "ATTEMPING" in the spec, and so here.
+// Row 9 is spelled "ATTEMPING" on purpose: the modem's own tool shows it so.
 const char* const kGMMSubStateTable[] = {
     "GMM_NORMAL_SERVICE",        // 0
     "GMM_LIMITED_SERVICE",       // 1
@@ -51,23 +49,23 @@ const char* const kGMMUpdateStatusTable[] = {
 
 std::string ProcessPS::getSectionName() const { return "Process PS"; }
 
-std::vector<int32_t> ProcessPS::getLogCodeArray() const { return {kGMMState, kRegistrationState}; }
+std::vector<int32_t> ProcessPS::getLogCodeArray() const { return {LogCode::kGMMState, LogCode::kRegistrationState}; }
 
 void ProcessPS::updateWithData(ByteView data, int32_t logCode) {
     SystemLog::log(SystemLog::kWarning, "%s", "ProcessPS");
     const ByteReader r(data);
     switch (logCode) {
-        case kGMMState:
+        case LogCode::kGMMState:
             // 13 GMM state, 14 GMM sub-state, 15 GMM update status; keys in this order.
             if (r.size() < 16) return;
-            setValue("MM State", tableText(kGMMStateTable, *r.u8(13)));
-            setValue("MM Sub State", tableText(kGMMSubStateTable, *r.u8(14)));
-            setValue("Attach Reject Cause", tableText(kGMMUpdateStatusTable, *r.u8(15)));
+            setValue("MM State", tableText(kGMMStateTable, r.u8(13).value_or(0)));
+            setValue("MM Sub State", tableText(kGMMSubStateTable, r.u8(14).value_or(0)));
+            setValue("Attach Reject Cause", tableText(kGMMUpdateStatusTable, r.u8(15).value_or(0)));
             break;
-        case kRegistrationState:
+        case LogCode::kRegistrationState:
             // 13 MM service state.
             if (r.size() < 16) return;
-            setValue("MM Service State", ProcessCS::serviceStateText(*r.u8(13)));
+            setValue("MM Service State", ProcessCS::serviceStateText(r.u8(13).value_or(0)));
             break;
         default:
             logUnknownCode(logCode);

@@ -1,4 +1,4 @@
-// ProcessPS: the "Process PS" section of Part 5.2 (packet-switched GMM state, sub-state, update status and service state).
+// ProcessPS: the "Process PS" section (packet-switched GMM state, sub-state, update status and service state).
 #pragma once
 
 #include "LogGenerator/Base.h"

@@ -1,4 +1,4 @@
-// ServingPLMN: the "Serving PLMN" section of Part 5.2 (0x7132 selection mode, 0x7135 BCD PLMN and area, 0xFF0001 serving cell).
+// ServingPLMN: the "Serving PLMN" section (0x7132 selection mode, 0x7135 BCD PLMN and area, 0xFF0001 serving cell).
 #pragma once
 
 #include "LogGenerator/Base.h"

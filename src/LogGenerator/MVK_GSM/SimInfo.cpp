@@ -1,14 +1,13 @@
-// SimInfo: Part 5.6's "SIM Info" section: selected SIM elementary files from the 0xFF0000 extra record, stored as delivered.
+// SimInfo: the "SIM Info" section: selected SIM elementary files from the 0xFF0000 extra record, stored as delivered.
 #include "LogGenerator/MVK_GSM/SimInfo.h"
 
+#include "Platform/LogCodes.h"
 #include "Platform/SystemLog.h"
 #include "PropertyList/Dictionary.h"
 
 namespace vantorel {
 
 namespace {
-
-constexpr int32_t kSimFileRecord = 0xFF0000;
 
 struct SimFile {
     const char* simFileKey;
@@ -37,11 +36,11 @@ const SimFile kSimFileTable[] = {
 
 std::string SimInfo::getSectionName() const { return "SIM Info"; }
 
-std::vector<int32_t> SimInfo::getLogCodeArray() const { return {kSimFileRecord}; }
+std::vector<int32_t> SimInfo::getLogCodeArray() const { return {LogCode::kSimFiles}; }
 
 void SimInfo::updateWithData(ByteView data, int32_t logCode) {
     SystemLog::log(SystemLog::kWarning, "%s", "SimInfo");
-    if (logCode != kSimFileRecord) {
+    if (logCode != LogCode::kSimFiles) {
         logUnknownCode(logCode);
         return;
     }
@@ -52,7 +51,7 @@ void SimInfo::updateWithData(ByteView data, int32_t logCode) {
         SystemLog::log(SystemLog::kError, "%s", "SIM File dictionary data could not be constructed");
         throw SectionError("SIM File dictionary data could not be constructed");
     }
-    // The spec assumes a dictionary root; any other root has no SIM files to show.
+    // Any root other than a dictionary has no SIM files to show.
     const DictionaryRef files = parsed.value->asDictionary();
     const DictionaryRef section = sectionDictionary();
     if (!files || !section) return;

@@ -1,4 +1,4 @@
-// SimInfo: the "SIM Info" section of Part 5.6 (SIM elementary files of the 0xFF0000 extra record).
+// SimInfo: the "SIM Info" section (SIM elementary files of the 0xFF0000 extra record).
 #pragma once
 
 #include "LogGenerator/Base.h"

@@ -1,7 +1,8 @@
-// CCTRCHSIRMeasurement: Part 7.2's "CCTRCH SIR" section: one dictionary per CCTRCH entry of record 0xD00C, with its six SIR values.
+// CCTRCHSIRMeasurement: the "CCTRCH SIR" section: one dictionary per CCTRCH entry of record 0xD00C, with its six SIR values.
 #include "LogGenerator/UTRAN/CCTRCHSIRMeasurement.h"
 
 #include "Platform/ByteReader.h"
+#include "Platform/LogCodes.h"
 #include "Platform/StringFormat.h"
 #include "Platform/SystemLog.h"
 #include "PropertyList/Array.h"
@@ -18,7 +19,8 @@ namespace {
 //     0                 "CCTRCH ID"
 //     1                 "TSNUM"
 //     2..7              six SIR values, "SIR" in this order
-// The factor 34 per TRCH (not the 2 bytes a TRCH entry takes) is required as stated.
+// The 34 bytes per TRCH (where a TRCH entry takes 2) are deliberate: that is where
+// the modem's own tool looks for the CCTRCH entries.
 constexpr size_t kMinLength = 17;
 constexpr size_t kTRCHCountOffset = 14;
 constexpr size_t kCCTRCHCountOffset = 15;
@@ -31,35 +33,27 @@ constexpr size_t kSIRCount = 6;
 
 std::string CCTRCHSIRMeasurement::getSectionName() const { return "CCTRCH SIR"; }
 
-std::vector<int32_t> CCTRCHSIRMeasurement::getLogCodeArray() const { return {kLogCode}; }
+std::vector<int32_t> CCTRCHSIRMeasurement::getLogCodeArray() const { return {LogCode::kUTRANBLERAndSIR}; }
 
 void CCTRCHSIRMeasurement::updateWithData(ByteView data, int32_t logCode) {
     SystemLog::log(SystemLog::kWarning, "%s", "CCTRCH SIR Measurement");
-    if (logCode != kLogCode) return;
+    if (logCode != LogCode::kUTRANBLERAndSIR) return;
 
-    const ByteReader reader(data);
-    if (reader.size() < kMinLength) return;
-
-    clearSectionArray();
-
-    const unsigned trchCount = (reader.u16(kTRCHCountOffset).value_or(0) >> 6) & 0x3F;
-    const unsigned cctrchCount = reader.u8(kCCTRCHCountOffset).value_or(0) >> 4;
-    auto list = Array::create();
-    for (unsigned j = 0; j < cctrchCount; ++j) {
-        const size_t offset = kCCTRCHBase + kPerTRCH * trchCount + kEntrySize * j;
-        if (!reader.has(offset, kEntrySize)) break;  // stop at the record's end
-        auto sir = Array::create();
-        for (size_t k = 0; k < kSIRCount; ++k)
-            sir->append(Value(StringFormat::format("%d", reader.u8(offset + 2 + k).value_or(0))));
-
-        auto entry = Dictionary::create();
-        entry->set("CCTRCH ID", Value(StringFormat::format("%d", reader.u8(offset).value_or(0))));
-        entry->set("TSNUM", Value(StringFormat::format("%d", reader.u8(offset + 1).value_or(0))));
-        entry->set("SIR", Value(sir));
-        list->append(Value(entry));
-    }
-
-    replaceSectionArray(*list);
+    rebuildList(data, kMinLength, true, [](const ByteReader& r) {
+        const unsigned trchCount = (r.u16(kTRCHCountOffset).value_or(0) >> 6) & 0x3F;
+        const unsigned cctrchCount = r.u8(kCCTRCHCountOffset).value_or(0) >> 4;
+        const size_t first = kCCTRCHBase + kPerTRCH * trchCount;
+        return readEntries(r, first, kEntrySize, kEntrySize, cctrchCount, [](const ByteReader& e) {
+            auto sir = Array::create();
+            for (size_t k = 0; k < kSIRCount; ++k)
+                sir->append(Value(StringFormat::format("%d", e.u8(2 + k).value_or(0))));
+            auto entry = Dictionary::create();
+            entry->set("CCTRCH ID", Value(StringFormat::format("%d", e.u8(0).value_or(0))));
+            entry->set("TSNUM", Value(StringFormat::format("%d", e.u8(1).value_or(0))));
+            entry->set("SIR", Value(sir));
+            return Value(entry);
+        });
+    });
 }
 
 }  // namespace vantorel

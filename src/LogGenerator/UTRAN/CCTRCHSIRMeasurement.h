@@ -1,4 +1,4 @@
-// CCTRCHSIRMeasurement: the "CCTRCH SIR" list section of Part 7.2 (record 0xD00C, CCTRCH entries with six SIR values).
+// CCTRCHSIRMeasurement: the "CCTRCH SIR" list section (record 0xD00C, CCTRCH entries with six SIR values).
 #pragma once
 
 #include "LogGenerator/Base.h"
@@ -7,8 +7,6 @@ namespace vantorel {
 
 class CCTRCHSIRMeasurement : public Base {
 public:
-    static constexpr int32_t kLogCode = 0xD00C;
-
     std::string getSectionName() const override;
     std::vector<int32_t> getLogCodeArray() const override;
     void updateWithData(ByteView data, int32_t logCode) override;

@@ -1,10 +1,10 @@
-// GSMNeighbhorMeasurements: Part 7.2's "GSM Neighbor Cell List" section: decodes record 0xD00E but, as required, only clears its list.
+// GSMNeighbhorMeasurements: the "GSM Neighbor Cell List" section: decodes record 0xD00E but, on purpose, only clears its list.
 #include "LogGenerator/UTRAN/GSMNeighbhorMeasurements.h"
 
 #include "Platform/ByteReader.h"
+#include "Platform/LogCodes.h"
 #include "Platform/StringFormat.h"
 #include "Platform/SystemLog.h"
-#include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
 
 namespace vantorel {
@@ -31,37 +31,31 @@ std::string decimal(int v) { return StringFormat::format("%d", v); }
 
 std::string GSMNeighbhorMeasurements::getSectionName() const { return "GSM Neighbor Cell List"; }
 
-std::vector<int32_t> GSMNeighbhorMeasurements::getLogCodeArray() const { return {kLogCode}; }
+std::vector<int32_t> GSMNeighbhorMeasurements::getLogCodeArray() const { return {LogCode::kUTRANGSMNeighbourList}; }
 
 void GSMNeighbhorMeasurements::updateWithData(ByteView data, int32_t logCode) {
     SystemLog::log(SystemLog::kWarning, "%s", "GSM Neighbor Cell List");
-    if (logCode != kLogCode) return;
+    if (logCode != LogCode::kUTRANGSMNeighbourList) return;
 
-    const ByteReader reader(data);
-    if (reader.size() < kMinLength) return;
-
-    clearSectionArray();
-
-    const unsigned count = reader.u8(kCountOffset).value_or(0);
-    auto list = Array::create();
-    for (unsigned i = 0; i < count; ++i) {
-        const size_t offset = kFirstEntry + kEntrySize * i;
-        if (!reader.has(offset, kEntrySize)) break;  // stop at the record's end
-        const uint8_t b0 = reader.u8(offset).value_or(0);
-        const uint8_t b1 = reader.u8(offset + 1).value_or(0);
-
-        auto entry = Dictionary::create();
-        entry->set("Cell ID", Value(decimal(b0 | ((b1 & 0x3F) << 8))));
-        entry->set("Band Indicator", Value(decimal((b1 >> 6) & 0x01)));
-        entry->set("BSIC Valid", Value(decimal((b1 >> 7) & 0x01)));
-        entry->set("NCC", Value(decimal(reader.u8(offset + 2).value_or(0))));
-        entry->set("BCC", Value(decimal(reader.u8(offset + 3).value_or(0))));
-        entry->set("ARFCN", Value(decimal(reader.u16(offset + 4).value_or(0))));
-        entry->set("RSSI", Value(decimal(reader.s16(offset + 6).value_or(0))));
-        list->append(Value(entry));
-    }
-    // Required as stated (Part 7.2): the list is built but never put into the
-    // section's array, so the display shows an empty list after the first record.
+    rebuildList(data, kMinLength, true, [](const ByteReader& r) {
+        const unsigned count = r.u8(kCountOffset).value_or(0);
+        readEntries(r, kFirstEntry, kEntrySize, kEntrySize, count, [](const ByteReader& e) {
+            const uint8_t b0 = e.u8(0).value_or(0);
+            const uint8_t b1 = e.u8(1).value_or(0);
+            auto entry = Dictionary::create();
+            entry->set("Cell ID", Value(decimal(b0 | ((b1 & 0x3F) << 8))));
+            entry->set("Band Indicator", Value(decimal((b1 >> 6) & 0x01)));
+            entry->set("BSIC Valid", Value(decimal((b1 >> 7) & 0x01)));
+            entry->set("NCC", Value(decimal(e.u8(2).value_or(0))));
+            entry->set("BCC", Value(decimal(e.u8(3).value_or(0))));
+            entry->set("ARFCN", Value(decimal(e.u16(4).value_or(0))));
+            entry->set("RSSI", Value(decimal(e.s16(6).value_or(0))));
+            return Value(entry);
+        });
+        // Deliberate: the rows are decoded but never shown, so after the first record
+        // the list stays empty, as in the modem's own tool.
+        return ArrayRef();
+    });
 }
 
 }  // namespace vantorel

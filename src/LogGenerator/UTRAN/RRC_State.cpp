@@ -1,7 +1,8 @@
-// RRC_State: Part 7.2's "RRC Info" section: the RRC mode of record 0xD0E0 as a text under "State".
+// RRC_State: the "RRC Info" section: the RRC mode of record 0xD0E0 as a text under "State".
 #include "LogGenerator/UTRAN/RRC_State.h"
 
 #include "Platform/ByteReader.h"
+#include "Platform/LogCodes.h"
 #include "Platform/StringFormat.h"
 #include "Platform/SystemLog.h"
 #include "PropertyList/Dictionary.h"
@@ -27,7 +28,7 @@ static const char* const kRRCModes[] = {
     "Cell URA PCH",  // 5
 };
 
-// A short stand-in for the spec's "%@" of the section dictionary: its keys and
+// A short description of the section dictionary for the console line: its keys and
 // values in braces ("{State = Cell Fach}"), "(null)" when the section is unbound.
 std::string describe(const DictionaryRef& dict) {
     if (!dict) return "(null)";
@@ -49,14 +50,14 @@ std::string describe(const DictionaryRef& dict) {
 
 std::string RRC_State::getSectionName() const { return "RRC Info"; }
 
-std::vector<int32_t> RRC_State::getLogCodeArray() const { return {kLogCode}; }
+std::vector<int32_t> RRC_State::getLogCodeArray() const { return {LogCode::kUTRANRRCState}; }
 
 void RRC_State::updateWithData(ByteView data, int32_t logCode) {
     SystemLog::log(SystemLog::kWarning, "%s", "RRC Info");
-    if (logCode != kLogCode) return;
+    if (logCode != LogCode::kUTRANRRCState) return;
 
     const ByteReader reader(data);
-    // A short record is reported, then decoded all the same (Part 7.2).
+    // A short record is reported, then decoded all the same, as the modem's tool does.
     if (reader.size() < kExpectedLength)
         SystemLog::log(SystemLog::kWarning, "LogCode_0xD0E0 is length is %ld expected size %ld",
                        static_cast<long>(reader.size()), static_cast<long>(kExpectedLength));

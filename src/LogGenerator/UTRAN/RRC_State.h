@@ -1,4 +1,4 @@
-// RRC_State: the "RRC Info" section of Part 7.2 (record 0xD0E0: RRC mode).
+// RRC_State: the "RRC Info" section (record 0xD0E0: RRC mode).
 #pragma once
 
 #include "LogGenerator/Base.h"
@@ -7,8 +7,6 @@ namespace vantorel {
 
 class RRC_State : public Base {
 public:
-    static constexpr int32_t kLogCode = 0xD0E0;
-
     std::string getSectionName() const override;
     std::vector<int32_t> getLogCodeArray() const override;
     void updateWithData(ByteView data, int32_t logCode) override;

@@ -1,10 +1,10 @@
-// TRCHBLERMeasurement: Part 7.2's "TRCH BLER" section: one dictionary per transport-channel entry of record 0xD00C.
+// TRCHBLERMeasurement: the "TRCH BLER" section: one dictionary per transport-channel entry of record 0xD00C.
 #include "LogGenerator/UTRAN/TRCHBLERMeasurement.h"
 
 #include "Platform/ByteReader.h"
+#include "Platform/LogCodes.h"
 #include "Platform/StringFormat.h"
 #include "Platform/SystemLog.h"
-#include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
 
 namespace vantorel {
@@ -24,29 +24,21 @@ constexpr size_t kEntrySize = 2;
 
 std::string TRCHBLERMeasurement::getSectionName() const { return "TRCH BLER"; }
 
-std::vector<int32_t> TRCHBLERMeasurement::getLogCodeArray() const { return {kLogCode}; }
+std::vector<int32_t> TRCHBLERMeasurement::getLogCodeArray() const { return {LogCode::kUTRANBLERAndSIR}; }
 
 void TRCHBLERMeasurement::updateWithData(ByteView data, int32_t logCode) {
     SystemLog::log(SystemLog::kNotice, "%s", "TRCH BLER Measurement");
-    if (logCode != kLogCode) return;
+    if (logCode != LogCode::kUTRANBLERAndSIR) return;
 
-    const ByteReader reader(data);
-    if (reader.size() < kMinLength) return;
-
-    clearSectionArray();
-
-    const unsigned trchCount = (reader.u16(kCountOffset).value_or(0) >> 6) & 0x3F;
-    auto list = Array::create();
-    for (unsigned i = 0; i < trchCount; ++i) {
-        const size_t offset = kFirstEntry + kEntrySize * i;
-        if (!reader.has(offset, kEntrySize)) break;  // stop at the record's end
-        auto entry = Dictionary::create();
-        entry->set("TRCH ID", Value(StringFormat::format("%d", reader.u8(offset).value_or(0))));
-        entry->set("TRCH BLER Measurement", Value(StringFormat::format("%d", reader.u8(offset + 1).value_or(0))));
-        list->append(Value(entry));
-    }
-
-    replaceSectionArray(*list);
+    rebuildList(data, kMinLength, true, [](const ByteReader& r) {
+        const unsigned trchCount = (r.u16(kCountOffset).value_or(0) >> 6) & 0x3F;
+        return readEntries(r, kFirstEntry, kEntrySize, kEntrySize, trchCount, [](const ByteReader& e) {
+            auto entry = Dictionary::create();
+            entry->set("TRCH ID", Value(StringFormat::format("%d", e.u8(0).value_or(0))));
+            entry->set("TRCH BLER Measurement", Value(StringFormat::format("%d", e.u8(1).value_or(0))));
+            return Value(entry);
+        });
+    });
 }
 
 }  // namespace vantorel

@@ -1,4 +1,4 @@
-// UTRANClassIndex: Part 7.1's class index (six UTRAN sections of Part 7.2, PDP of Part 5.2, SIM of Part 5.6).
+// UTRANClassIndex: the UTRAN decoder's sections: six UTRAN ones, the PDP contexts and the SIM files.
 #include "LogGenerator/UTRAN/UTRANClassIndex.h"
 
 #include "LogGenerator/MVK_GSM/PDPContextList.h"
@@ -24,7 +24,7 @@ UTRANClassIndex::UTRANClassIndex() {
 }
 
 UTRANClassIndex::~UTRANClassIndex() {
-    // Released in field order, then the base's teardown (Part 7.1).
+    // Released in field order, then the base's teardown.
     rrc_state.reset();
     servingCellInfo.reset();
     tdMeasurements.reset();

@@ -1,4 +1,4 @@
-// UTRANClassIndex: the UTRAN decoder's class index with its eight sections in Part 7.1's order.
+// UTRANClassIndex: the UTRAN decoder's class index with its eight sections.
 #pragma once
 
 #include "LogGenerator/ClassIndex.h"

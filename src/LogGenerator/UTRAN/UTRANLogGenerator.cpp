@@ -1,4 +1,4 @@
-// UTRANLogGenerator: Part 7.1's template choice and class index.
+// UTRANLogGenerator: the UTRAN decoder's template choice and class index.
 #include "LogGenerator/UTRAN/UTRANLogGenerator.h"
 
 #include "LogGenerator/UTRAN/UTRANClassIndex.h"

@@ -1,4 +1,4 @@
-// UTRANLogGenerator: the UTRAN decoder: the template-driven generator on the first "UTRAN" template with UTRANClassIndex (Part 7.1).
+// UTRANLogGenerator: the UTRAN decoder: the template-driven generator on the first "UTRAN" template with UTRANClassIndex.
 #pragma once
 
 #include "LogGenerator/MVKLogGenerator2.h"

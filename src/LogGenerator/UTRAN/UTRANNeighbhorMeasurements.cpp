@@ -1,10 +1,10 @@
-// UTRANNeighbhorMeasurements: Part 7.2's "Neighbor Cell List" section: one dictionary per UARFCN / cell-parameter entry of record 0xD00A.
+// UTRANNeighbhorMeasurements: the "Neighbor Cell List" section: one dictionary per UARFCN / cell-parameter entry of record 0xD00A.
 #include "LogGenerator/UTRAN/UTRANNeighbhorMeasurements.h"
 
 #include "Platform/ByteReader.h"
+#include "Platform/LogCodes.h"
 #include "Platform/StringFormat.h"
 #include "Platform/SystemLog.h"
-#include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
 
 namespace vantorel {
@@ -15,7 +15,7 @@ namespace {
 //   16                 bits 1-7: entry count n (byte 16 >> 1)
 //   168 + 16*i         entry i, 16 bytes, i = 0 .. n-1
 // Entry, its first four bytes read as one little-endian 32-bit word w (the fields
-// run on from byte to byte, so the word's bits line up with the spec's table):
+// run on from byte to byte, so each field is one run of the word's bits):
 //   w bits  0-13  byte 0, byte 1 bits 0-5 (high)   "UARFCN", unsigned
 //   w bits 14-20  byte 1 bits 6-7 (low), byte 2 bits 0-4 (high)  "Cell ID", 7 bits
 //   w bits 21-28  byte 2 bits 5-7 (low), byte 3 bits 0-4 (high)  "Filter RSCP", 8 bits
@@ -37,42 +37,32 @@ static const char* const kStatus[] = {
 
 std::string UTRANNeighbhorMeasurements::getSectionName() const { return "Neighbor Cell List"; }
 
-std::vector<int32_t> UTRANNeighbhorMeasurements::getLogCodeArray() const { return {kLogCode}; }
+std::vector<int32_t> UTRANNeighbhorMeasurements::getLogCodeArray() const { return {LogCode::kUTRANNeighbourList}; }
 
 void UTRANNeighbhorMeasurements::updateWithData(ByteView data, int32_t logCode) {
     SystemLog::log(SystemLog::kWarning, "%s", "NeighbhorMeasurements List");
-    if (logCode != kLogCode) return;
+    if (logCode != LogCode::kUTRANNeighbourList) return;
 
-    const ByteReader reader(data);
-    if (reader.size() < kMinLength) return;  // the list keeps its old entries
+    rebuildList(data, kMinLength, true, [](const ByteReader& r) {
+        const unsigned count = r.u8(kCountOffset).value_or(0) >> 1;
+        return readEntries(r, kFirstEntry, kEntrySize, kEntrySize, count, [](const ByteReader& e) {
+            const uint32_t w = e.u32(0).value_or(0);
+            const unsigned uarfcn = w & 0x3FFF;
+            const unsigned cellId = (w >> 14) & 0x7F;
+            const unsigned rscp = (w >> 21) & 0xFF;
+            const unsigned status = (w >> 29) & 0x03;
+            const bool inJDCS = (w >> 31) & 0x01;
 
-    clearSectionArray();
-
-    const unsigned count = reader.u8(kCountOffset).value_or(0) >> 1;
-    auto list = Array::create();
-    for (unsigned i = 0; i < count; ++i) {
-        const size_t offset = kFirstEntry + kEntrySize * i;
-        // The spec reads entries without checking; we stop at the first entry that
-        // does not lie wholly inside the record.
-        if (!reader.has(offset, kEntrySize)) break;
-        const uint32_t w = reader.u32(offset).value_or(0);
-
-        const unsigned uarfcn = w & 0x3FFF;
-        const unsigned cellId = (w >> 14) & 0x7F;
-        const unsigned rscp = (w >> 21) & 0xFF;
-        const unsigned status = (w >> 29) & 0x03;
-        const bool inJDCS = (w >> 31) & 0x01;
-
-        auto entry = Dictionary::create();
-        entry->set("UARFCN", Value(StringFormat::format("%d", static_cast<int>(uarfcn))));
-        entry->set("Cell ID", Value(StringFormat::format("%d", static_cast<int>(cellId))));
-        entry->set("Filter RSCP", Value(StringFormat::format("%f", rscp * kRSCPStep)));
-        if (const char* text = tableText(kStatus, status, nullptr)) entry->set("Status", Value(text));
-        entry->set("inJDCS", Value(inJDCS ? "TRUE" : "FALSE"));
-        list->append(Value(entry));
-    }
-
-    replaceSectionArray(*list);
+            auto entry = Dictionary::create();
+            entry->set("UARFCN", Value(StringFormat::format("%d", static_cast<int>(uarfcn))));
+            entry->set("Cell ID", Value(StringFormat::format("%d", static_cast<int>(cellId))));
+            entry->set("Filter RSCP", Value(StringFormat::format("%f", rscp * kRSCPStep)));
+            // Status 3 has no name: the entry then has no "Status" key at all.
+            if (const char* text = tableText(kStatus, status, nullptr)) entry->set("Status", Value(text));
+            entry->set("inJDCS", Value(inJDCS ? "TRUE" : "FALSE"));
+            return Value(entry);
+        });
+    });
 }
 
 }  // namespace vantorel

@@ -1,4 +1,4 @@
-// UTRANNeighbhorMeasurements: the "Neighbor Cell List" list section of Part 7.2 (record 0xD00A).
+// UTRANNeighbhorMeasurements: the "Neighbor Cell List" list section (record 0xD00A).
 #pragma once
 
 #include "LogGenerator/Base.h"
@@ -7,8 +7,6 @@ namespace vantorel {
 
 class UTRANNeighbhorMeasurements : public Base {
 public:
-    static constexpr int32_t kLogCode = 0xD00A;
-
     std::string getSectionName() const override;
     std::vector<int32_t> getLogCodeArray() const override;
     void updateWithData(ByteView data, int32_t logCode) override;

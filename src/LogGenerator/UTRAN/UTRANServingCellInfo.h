@@ -1,4 +1,4 @@
-// UTRANServingCellInfo: the "Serving Cell Info" section of Part 7.2 (record 0xD0E2 and the cell-monitor extra record 0xFF0001).
+// UTRANServingCellInfo: the "Serving Cell Info" section (record 0xD0E2 and the cell-monitor extra record 0xFF0001).
 #pragma once
 
 #include "LogGenerator/Base.h"
@@ -7,9 +7,6 @@ namespace vantorel {
 
 class UTRANServingCellInfo : public Base {
 public:
-    static constexpr int32_t kLogCode = 0xD0E2;
-    static constexpr int32_t kCellMonitorCode = 0xFF0001;  // extra code 1
-
     std::string getSectionName() const override;
     std::vector<int32_t> getLogCodeArray() const override;
     void updateWithData(ByteView data, int32_t logCode) override;

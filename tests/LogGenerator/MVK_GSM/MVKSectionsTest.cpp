@@ -1,0 +1,269 @@
+// MVKSectionsTest: the GSM/UMTS registration sections, each fed built records and checked by what it shows.
+#include "LogGenerator/ArrayLock.h"
+#include "LogGenerator/MVK_GSM/EquivalentPLMNList.h"
+#include "LogGenerator/MVK_GSM/PDPContextList.h"
+#include "LogGenerator/MVK_GSM/ProcessCO.h"
+#include "LogGenerator/MVK_GSM/ProcessCS.h"
+#include "LogGenerator/MVK_GSM/ProcessPS.h"
+#include "LogGenerator/MVK_GSM/ServingPLMN.h"
+#include "LogGenerator/MVK_GSM/SimInfo.h"
+#include "LogGenerator/SectionTesting.h"
+
+#include <gtest/gtest.h>
+
+namespace vantorel {
+namespace {
+
+using namespace sectiontest;
+
+// A 16-byte ordinary record with bytes 13, 14 and 15 set (the state records' layout).
+Bytes stateRecord(uint16_t code, uint8_t b13, uint8_t b14, uint8_t b15, size_t length = 16) {
+    return RecordBuilder::ordinary(code, 16).u8(13, b13).u8(14, b14).u8(15, b15).resize(length).build();
+}
+
+template <class Section>
+std::string showState(const Bytes& record, int32_t code) {
+    return Bound<Section>().feed(record, code).shown();
+}
+
+TEST(MMStateSections, StateRecordsShowTheTableTextsOfTheirBytes) {
+    enum Section { CS, CO, PS };
+    struct Row {
+        Section section;
+        uint16_t code;
+        uint8_t b13, b14, b15;
+        size_t length;
+        const char* expected;
+    };
+    const Row rows[] = {
+        {CS, 0x7131, 19, 8, 0, 16, "{MM State=MM_IDLE, MM Sub State=MM_NORMAL_SERVICE, LU Reject Cause=UPDATED}"},
+        {CS, 0x7131, 25, 0, 3, 16, "{MM State=MM_RR_CONNECTION_RELEASE_NOT_ALLOWED, MM Sub State=MM_NULL_SUBSTATE, "
+                                   "LU Reject Cause=LOCATION_AREA_NOT_ALLOWED}"},
+        // 4 is a gap in the MM state table; 9 and 4 lie past the other two.
+        {CS, 0x7131, 4, 9, 4, 16, "{MM State=Unknown, MM Sub State=Unknown, LU Reject Cause=Unknown}"},
+        {CS, 0x7131, 26, 1, 1, 16, "{MM State=Unknown, MM Sub State=MM_NO_IMSI, LU Reject Cause=NOT_UPDATED}"},
+        {CS, 0x7131, 20, 2, 2, 16, "{MM State=MM_WAIT_FOR_ADDITIONAL_OUTGOING_MM_ CONNECTION, "
+                                   "MM Sub State=MM_PLMN_SEARCH, LU Reject Cause=ROAMING_NOT_ALLOWED}"},
+        {CS, 0x7131, 19, 8, 0, 15, "{}"},
+        {CS, 0x7131, 3, 8, 1, 40, "{MM State=MM_LOCATION_UPDATE_INITIATED, MM Sub State=MM_NORMAL_SERVICE, "
+                                  "LU Reject Cause=NOT_UPDATED}"},
+        {CS, 0x7132, 6, 0, 0, 16, "{MM Service State=REG_STATE_OFFLINE}"},
+        {CS, 0x7132, 7, 0, 0, 16, "{MM Service State=Unknown}"},
+        {CO, 0x7131, 19, 8, 0, 16, "{MM State=MM_IDLE}"},
+        {CO, 0x7132, 0, 0, 0, 16, "{MM Service State=REG_STATE_INACTIVE}"},
+        {CO, 0x7132, 0, 0, 0, 15, "{}"},
+        {PS, 0x7130, 3, 9, 3, 16, "{MM State=GMM_REGISTERED, MM Sub State=GMM_ATTEMPING_TO_UPDATE, "
+                                  "Attach Reject Cause=GMM_GU3_ROUTING_AREA_NOT_ALLOWED}"},
+        {PS, 0x7130, 7, 13, 4, 16, "{MM State=Unknown, MM Sub State=Unknown, Attach Reject Cause=Unknown}"},
+        {PS, 0x7132, 1, 0, 0, 16, "{MM Service State=REG_STATE_IDLE}"},
+        {PS, 0x7130, 3, 9, 3, 15, "{}"},
+    };
+    for (const Row& row : rows) {
+        const Bytes record = stateRecord(row.code, row.b13, row.b14, row.b15, row.length);
+        const std::string shown = row.section == CS   ? showState<ProcessCS>(record, row.code)
+                                  : row.section == CO ? showState<ProcessCO>(record, row.code)
+                                                      : showState<ProcessPS>(record, row.code);
+        EXPECT_EQ(shown, row.expected) << row.section << " " << row.code << " " << int{row.b13};
+    }
+}
+
+TEST(MMStateSections, AForeignCodeIsLoggedAndChangesNothing) {
+    SystemLogCapture capture;
+    EXPECT_EQ(showState<ProcessPS>(stateRecord(0x7131, 1, 1, 1), 0x7131), "{}");
+    EXPECT_EQ(errorLines(capture), std::vector<std::string>{"Received an unknown log message: 28977"});
+}
+
+// 0x7135: 14 service type, 15..17 BCD PLMN, 18..19 LAC big-endian, 20 RAC; 28 bytes.
+Bytes plmnRecord(std::initializer_list<uint8_t> bytes14to20, size_t length = 28) {
+    return RecordBuilder::ordinary(0x7135, 28).bytes(14, bytes14to20).resize(length).build();
+}
+
+TEST(ServingPLMNSection, RecordsShowBCDDigitsAreaCodesAndTableTexts) {
+    struct Row {
+        Bytes record;
+        int32_t code;
+        const char* expected;
+    };
+    const Row rows[] = {
+        {plmnRecord({3, 0x13, 0xF0, 0x01, 0x12, 0x34, 5}), 0x7135,
+         "{Mobile Country Code=310, Mobile Network Code=10 , Location Area Code=4660, Routing Area Code=5, "
+         "Service Type=CS_PS_SERVICE}"},
+        // Three-digit MNC: MNC3 is the high nibble of byte 16.
+        {plmnRecord({1, 0x32, 0x54, 0x10, 0x00, 0x01, 0}), 0x7135,
+         "{Mobile Country Code=234, Mobile Network Code=015, Location Area Code=1, Routing Area Code=0, "
+         "Service Type=CS_ONLY}"},
+        // Filler nibbles show as blanks; 0x9F's high nibble 9 is a digit, 0xAF's A is not.
+        {plmnRecord({5, 0xAF, 0xF2, 0x9F, 0xFF, 0xFF, 255}), 0x7135,
+         "{Mobile Country Code=  2, Mobile Network Code= 9 , Location Area Code=65535, Routing Area Code=255, "
+         "Service Type=Unknown}"},
+        {plmnRecord({3, 0x13, 0xF0, 0x01, 0x12, 0x34, 5}, 27), 0x7135, "{}"},
+        {RecordBuilder::ordinary(0x7132, 16).u8(14, 1).build(), 0x7132, "{PLMN Sel Mod=Manual}"},
+        {RecordBuilder::ordinary(0x7132, 16).u8(14, 5).build(), 0x7132, "{PLMN Sel Mod=Unknown}"},
+        {RecordBuilder::ordinary(0x7132, 15).u8(14, 1).build(), 0x7132, "{}"},
+    };
+    for (const Row& row : rows) EXPECT_EQ(showState<ServingPLMN>(row.record, row.code), row.expected) << row.expected;
+}
+
+TEST(ServingPLMNSection, TheFirstServingGSMOrUMTSCellOfTheCellMonitorGivesPlainNumbers) {
+    const char* const umts = kTSCellMonitorRadioAccessTechnologyUMTS;
+    const char* const gsm = kTSCellMonitorRadioAccessTechnologyGSM;
+    const char* const serving = kTSCellMonitorCellTypeServing;
+    const char* const neighbour = kTSCellMonitorCellTypeNeighbor;
+    struct Row {
+        const char* what;
+        Bytes record;
+        const char* expected;
+        std::vector<std::string> errors;
+    };
+    const Row rows[] = {
+        {"first serving cell wins",
+         cellMonitor({cell(umts, neighbour, {{kTSCellMonitorMCC, 1}, {kTSCellMonitorMNC, 1}, {kTSCellMonitorLAC, 1}}),
+                      cell(gsm, serving, {{kTSCellMonitorMCC, 460}, {kTSCellMonitorMNC, 0}, {kTSCellMonitorLAC, 4566}}),
+                      cell(umts, serving, {{kTSCellMonitorMCC, 310}, {kTSCellMonitorMNC, 10}, {kTSCellMonitorLAC, 9}})}),
+         "{Mobile Country Code=460, Mobile Network Code=0, Location Area Code=4566}",
+         {}},
+        {"binary property list",
+         cellMonitor({cell(umts, serving, {{kTSCellMonitorMCC, 310}, {kTSCellMonitorMNC, 10}, {kTSCellMonitorLAC, 9}})},
+                     true),
+         "{Mobile Country Code=310, Mobile Network Code=10, Location Area Code=9}",
+         {}},
+        {"a missing number is logged, the others still shown",
+         cellMonitor({cell(umts, serving, {{kTSCellMonitorMCC, 310}, {kTSCellMonitorLAC, 9}})}),
+         "{Mobile Country Code=310, Location Area Code=9}",
+         {"ServingPLMN: Failed to retrieve MNC\n"}},
+        {"no number at all",
+         cellMonitor({cell(gsm, serving, {})}),
+         "{}",
+         {"ServingPLMN: Failed to retrieve MCC\n", "ServingPLMN: Failed to retrieve MNC\n",
+          "ServingPLMN: Failed to retrieve LAC\n"}},
+        {"a serving cell of another technology",
+         cellMonitor({cell(kTSCellMonitorRadioAccessTechnologyUTRAN2, serving, {{kTSCellMonitorMCC, 1}})}),
+         "{}",
+         {}},
+        {"a cell without technology or type", cellMonitor({cell(nullptr, serving, {}), cell(gsm, nullptr, {})}), "{}", {}},
+        {"a root that is not an array", RecordBuilder::extraPropertyList(1, Value(Dictionary::create())), "{}", {}},
+        {"a payload that is not a property list",
+         RecordBuilder::extra(1, 20).bytes(13, {'n', 'o', 't', ' ', 'a', 'n', 'y'}).build(),
+         "{}",
+         {"Cell Info Array data could not be constructed", "Failed to get Cell Array\n"}},
+        {"no payload", RecordBuilder::extra(1).build(), "{}",
+         {"Cell Info Array data could not be constructed", "Failed to get Cell Array\n"}},
+    };
+    for (const Row& row : rows) {
+        SystemLogCapture capture;
+        EXPECT_EQ(showState<ServingPLMN>(row.record, 0xFF0001), row.expected) << row.what;
+        EXPECT_EQ(errorLines(capture), row.errors) << row.what;
+    }
+}
+
+TEST(ServingPLMNSection, WhicheverSourceCameLastIsShown) {
+    Bound<ServingPLMN> plmn;
+    plmn.feed(plmnRecord({3, 0x13, 0xF0, 0x01, 0x12, 0x34, 5}), 0x7135);
+    plmn.feed(cellMonitor({cell(kTSCellMonitorRadioAccessTechnologyGSM, kTSCellMonitorCellTypeServing,
+                                {{kTSCellMonitorMCC, 262}, {kTSCellMonitorMNC, 1}, {kTSCellMonitorLAC, 77}})}),
+              0xFF0001);
+    EXPECT_EQ(plmn.shown(),
+              "{Mobile Country Code=262, Mobile Network Code=1, Location Area Code=77, Routing Area Code=5, "
+              "Service Type=CS_PS_SERVICE}");
+}
+
+// 0x7150: 16 count, entry i at 17 + 3i, six single-digit bytes (entries overlap by three).
+Bytes plmnListRecord(uint8_t count, std::initializer_list<uint8_t> from17, size_t length) {
+    return RecordBuilder::ordinary(0x7150, length).u8(16, count).bytes(17, from17).resize(length).build();
+}
+
+TEST(EquivalentPLMNListSection, EntriesOverlapStopAtTheRecordsEndAndEachRecordRebuildsTheList) {
+    const Bytes two = plmnListRecord(2, {3, 1, 1, 0, 0, 0, 0, 0, 1}, 26);
+    struct Row {
+        const char* what;
+        std::vector<Bytes> records;
+        const char* expected;
+    };
+    const Row rows[] = {
+        {"two overlapping entries", {two},
+         "[{Mobile Country Code=310, Mobile Network Code=100}, {Mobile Country Code=0, Mobile Network Code=1}]"},
+        {"a count past the record's end stops at the last whole entry",
+         {plmnListRecord(3, {3, 1, 1, 0, 0, 0, 0, 0, 1}, 26)},
+         "[{Mobile Country Code=310, Mobile Network Code=100}, {Mobile Country Code=0, Mobile Network Code=1}]"},
+        {"digits past 9 still weigh as hundreds, tens, units", {plmnListRecord(1, {0x64, 0xF0, 0x70, 0xFF, 0xFF, 0xFF}, 23)},
+         "[{Mobile Country Code=11375, Mobile Network Code=26805}]"},
+        {"count 0 empties the list", {two, plmnListRecord(0, {}, 17)}, "[]"},
+        {"no entry fits", {two, plmnListRecord(1, {1, 2, 3, 4, 5}, 22)}, "[]"},
+        {"a 16-byte record leaves the list as it was", {two, plmnListRecord(0, {}, 16)},
+         "[{Mobile Country Code=310, Mobile Network Code=100}, {Mobile Country Code=0, Mobile Network Code=1}]"},
+    };
+    for (const Row& row : rows) EXPECT_EQ(Bound<EquivalentPLMNList>(true).feed(row.records, 0x7150).shown(), row.expected) << row.what;
+}
+
+TEST(EquivalentPLMNListSection, ACountOf255ReadsEveryEntry) {
+    Bytes record = RecordBuilder::ordinary(0x7150, 17 + 3 * 254 + 6).u8(16, 255).build();
+    record[17 + 3 * 254 + 5] = 7;  // the last entry's MNC units
+    Bound<EquivalentPLMNList> list(true);
+    list.feed(record, 0x7150);
+    ASSERT_EQ(list.list->size(), 255u);
+    EXPECT_EQ(render(list.list->at(254)), "{Mobile Country Code=0, Mobile Network Code=7}");
+    EXPECT_EQ(ArrayLock::counter(), 0);
+}
+
+Bytes pdpRecord(Value root, bool binary = false) { return RecordBuilder::extraPropertyList(2, root, binary); }
+
+Value context(const char* apn) {
+    auto d = Dictionary::create();
+    d->set("APN", apn);
+    d->set("Context ID", Value::integer(1));
+    return Value(d);
+}
+
+TEST(PDPContextListSection, AnArrayReplacesTheListAnythingElseLeavesIt) {
+    const Bytes internet = pdpRecord(Value(Array::of({context("internet")})));
+    struct Row {
+        const char* what;
+        std::vector<Bytes> records;
+        const char* expected;
+    };
+    const Row rows[] = {
+        {"contexts as sent", {internet}, "[{APN=internet, Context ID=<integer>}]"},
+        {"binary", {pdpRecord(Value(Array::of({context("ims"), context("mms")})), true)},
+         "[{APN=ims, Context ID=<integer>}, {APN=mms, Context ID=<integer>}]"},
+        {"an empty array empties the list", {internet, pdpRecord(Value(Array::create()))}, "[]"},
+        {"a dictionary root", {internet, pdpRecord(context("x"))}, "[{APN=internet, Context ID=<integer>}]"},
+        {"not a property list", {internet, RecordBuilder::extra(2, 16).bytes(13, {'x', 'y', 'z'}).build()},
+         "[{APN=internet, Context ID=<integer>}]"},
+    };
+    for (const Row& row : rows) EXPECT_EQ(Bound<PDPContextList>(true).feed(row.records, 0xFF0002).shown(), row.expected) << row.what;
+    // The code is not checked.
+    EXPECT_EQ(Bound<PDPContextList>(true).feed(internet, 0x7130).shown(), "[{APN=internet, Context ID=<integer>}]");
+}
+
+Bytes simRecord(std::initializer_list<std::pair<const char*, Value>> files) {
+    auto d = Dictionary::create();
+    for (const auto& [key, value] : files) d->set(key, value);
+    return RecordBuilder::extraPropertyList(0, Value(d), true);
+}
+
+TEST(SimInfoSection, KnownFilesAreShownAsDeliveredInTableOrderAndAbsentOnesKeepTheirValues) {
+    Bound<SimInfo> sim;
+    sim.feed(simRecord({{"kSimFile_MSISDN", "+8613800"}, {"kSimFile_ICCID", "898600"}, {"kSimFile_Unknown", "x"}}),
+             0xFF0000);
+    EXPECT_EQ(sim.shown(), "{EF-ICCID=898600, EF-MSISDN=+8613800}");
+    sim.feed(simRecord({{"kSimFile_OPLMNAcT", Value::data({0x64, 0xF0})}, {"kSimFile_ICCID", Value::integer(7)}}),
+             0xFF0000);
+    EXPECT_EQ(sim.shown(), "{EF-ICCID=<integer>, EF-MSISDN=+8613800, EF-OPLMNAcT=<data>}");
+    // A root that is not a dictionary holds no files.
+    sim.feed(RecordBuilder::extraPropertyList(0, Value(Array::of({"a"}))), 0xFF0000);
+    EXPECT_EQ(sim.shown(), "{EF-ICCID=<integer>, EF-MSISDN=+8613800, EF-OPLMNAcT=<data>}");
+}
+
+TEST(SimInfoSection, APayloadThatIsNotAPropertyListRaisesTheSectionsErrorAfterLoggingIt) {
+    Bound<SimInfo> sim;
+    SystemLogCapture capture;
+    EXPECT_THROW(sim.feed(RecordBuilder::extra(0, 18).bytes(13, {'n', 'o', 'p', 'e'}).build(), 0xFF0000),
+                 SectionError);
+    EXPECT_THROW(sim.feed(RecordBuilder::extra(0).build(), 0xFF0000), SectionError);
+    EXPECT_EQ(errorLines(capture), (std::vector<std::string>{"SIM File dictionary data could not be constructed",
+                                                             "SIM File dictionary data could not be constructed"}));
+    EXPECT_EQ(sim.shown(), "{}");
+}
+
+}  // namespace
+}  // namespace vantorel
