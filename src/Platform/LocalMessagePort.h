@@ -1,4 +1,4 @@
-// LocalMessagePort: a named local message port (QLocalServer) with a receive callback and an invalidation callback (Part 2.1 "Platform operations used"; DESIGN.md "Message ports").
+// LocalMessagePort: a named local message port (QLocalServer) with a receive callback and an invalidation callback (docs/protocol.md).
 #pragma once
 
 #include "PropertyList/Value.h"

@@ -1,4 +1,4 @@
-// FakeTelephonyService: a scriptable telephony service on its own thread for the Part 2.1/2.2 tests.
+// FakeTelephonyService: a scriptable telephony service on its own thread, built from the real message ports.
 #include "support/FakeTelephonyService.h"
 
 #include "Platform/LocalMessagePort.h"

@@ -1,4 +1,4 @@
-// FakeTelephonyService: a telephony service for the model's tests (Parts 2.1, 2.2), built from the real message ports on its own thread, whose answers a test can change.
+// FakeTelephonyService: a telephony service for the model's tests, built from the real message ports on its own thread, whose answers a test can change.
 #pragma once
 
 #include "Platform/TelephonyIdentifiers.h"

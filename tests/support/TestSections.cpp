@@ -1,4 +1,4 @@
-// TestSections: the test-only class index, sections and generator of the Part 3.2 and 3.3 tests.
+// TestSections: the test-only class index, sections and template-driven generator that the decoder framework's tests route built records to.
 #include "support/TestSections.h"
 
 #include "Platform/ByteReader.h"

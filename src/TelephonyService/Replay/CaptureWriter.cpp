@@ -1,4 +1,4 @@
-// CaptureWriter: the capture file writer behind the service's --record option (docs/capture-format.md; DESIGN.md "The telephony service").
+// CaptureWriter: the capture file writer behind the service's --record option (docs/capture-format.md).
 #include "TelephonyService/Replay/CaptureWriter.h"
 
 #include "Platform/RecordBuilder.h"

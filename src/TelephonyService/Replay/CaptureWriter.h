@@ -1,4 +1,4 @@
-// CaptureWriter: writes Vantorel capture files, every message as the service sent it (docs/capture-format.md; DESIGN.md "The telephony service", Replay/).
+// CaptureWriter: writes Vantorel capture files, every message as the service sent it (docs/capture-format.md).
 #pragma once
 
 #include "PropertyList/Value.h"

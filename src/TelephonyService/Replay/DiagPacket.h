@@ -1,4 +1,4 @@
-// DiagPacket: one deframed DIAG body, classified and, for a log packet, split into code, time stamp and payload (DESIGN.md "The telephony service", Replay/; Part 3.2 record header).
+// DiagPacket: one deframed DIAG body, classified and, for a log packet, split into code, time stamp and payload.
 #pragma once
 
 #include "PropertyList/Value.h"
@@ -26,12 +26,11 @@ public:
     };
 
     static constexpr uint8_t kLogCommand = 0x10;
-    static constexpr uint8_t kMultiSimCommand = 0x98;
+    // The wrapper's first four bytes 98 01 00 00, read as a little-endian u32.
+    static constexpr uint32_t kMultiSimPrefix = 0x00000198;
     static constexpr size_t kMultiSimWrapperLength = 8;
     static constexpr size_t kCommandHeaderLength = 4;  // 10 <more> <len>
     static constexpr size_t kLogHeaderLength = 12;     // <len> <code> <time stamp>
-    // Morvek-channel record type of an ordinary log record (Part 3.2).
-    static constexpr uint8_t kMorvekOrdinaryType = 1;
 
     explicit DiagPacket(ByteView body);
     // The packet keeps views into its body: a temporary buffer would dangle.
