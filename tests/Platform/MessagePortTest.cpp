@@ -1,4 +1,4 @@
-// Tests the message ports: the 12-byte frame header and stream decoding with bad headers, and a local port served on its own thread answering a remote port (replies, timeouts, garbage peers, a server that goes away, a stale socket file).
+// Tests the message ports: the 12-byte frame header and stream decoding with bad headers, and a local port served on its own thread answering a remote port (replies, timeouts, garbage peers, a stale socket file).
 #include "Platform/LocalMessagePort.h"
 #include "Platform/MessagePortFrame.h"
 #include "Platform/RemoteMessagePort.h"
@@ -162,27 +162,6 @@ TEST(MessagePort, AReplyThatComesAfterTheTimeoutIsNotTakenForTheNextRequest) {
     server.run([] {});  // the late reply is written by now
     EXPECT_EQ(remote->sendRequest(0, bytesOf("2"), 1.0, 1.0, &reply), RemoteMessagePort::Success);
     EXPECT_EQ(reply, bytesOf("2"));
-}
-
-TEST(MessagePort, ARemotePortWhoseServerGoesAwayBecomesInvalidOnce) {
-    std::atomic<int> invalidations{0};
-    auto server = std::make_unique<ServerThread>();
-    const std::string name = uniquePortName("gone");
-    ASSERT_NE(server->create(name, [](int32_t, const Bytes&) { return std::optional<Bytes>(); }), nullptr);
-    auto remote = RemoteMessagePort::lookup(name);
-    ASSERT_NE(remote, nullptr);
-    remote->setInvalidationCallback([&](RemoteMessagePort*) { ++invalidations; });
-    server.reset();
-    std::optional<Bytes> reply;
-    EXPECT_NE(remote->sendRequest(0, bytesOf("x"), 1.0, 1.0, &reply), RemoteMessagePort::Success);
-    ASSERT_TRUE(waitUntil([&] { return invalidations.load() == 1; }));
-    EXPECT_FALSE(remote->isValid());
-    EXPECT_EQ(remote->sendRequest(0, bytesOf("x"), 1.0, 0, nullptr), RemoteMessagePort::IsInvalid);
-    EXPECT_FALSE(remote->post(0, bytesOf("x")));
-    remote->invalidate();
-    QCoreApplication::processEvents();
-    EXPECT_EQ(invalidations.load(), 1);
-    EXPECT_EQ(RemoteMessagePort::lookup(name, 200), nullptr);
 }
 
 TEST(MessagePort, CreateTakesOverAStaleSocketFileButNotALivePort) {

@@ -38,12 +38,6 @@ std::vector<Bytes> numberedRecords(size_t n) {
     return out;
 }
 
-RecordedStream timedStream(const std::vector<Bytes>& records, const std::vector<int64_t>& times) {
-    Bytes file = CaptureWriter::headerBytes(kTSLogChannelTechnology_Morvek_UTRAN2);
-    for (size_t i = 0; i < times.size(); ++i) servicetest::append(file, CaptureWriter::messageBytes(times[i], 0, records[i]));
-    return RecordedStream::fromBytes(file);
-}
-
 TEST(ReplayBackend, ThePaceFollowsTheRecordedGapsDividedByTheSpeed) {
     struct Row {
         const char* name;
@@ -63,7 +57,7 @@ TEST(ReplayBackend, ThePaceFollowsTheRecordedGapsDividedByTheSpeed) {
     for (const Row& row : rows) {
         SCOPED_TRACE(row.name);
         const std::vector<Bytes> records = numberedRecords(row.times.size());
-        ReplayBackend backend(timedStream(records, row.times), row.speed, false);
+        ReplayBackend backend(streamOf(records, row.times), row.speed, false);
         Collector c(backend);
         QElapsedTimer clock;
         clock.start();
@@ -78,7 +72,7 @@ TEST(ReplayBackend, ThePaceFollowsTheRecordedGapsDividedByTheSpeed) {
 
 TEST(ReplayBackend, ALoopingReplayWaitsWhilePausedAndStartsOverAtItsEnd) {
     const std::vector<Bytes> records = numberedRecords(3);
-    ReplayBackend backend(streamOf(records, kTSLogChannelTechnology_Morvek_UTRAN2), 0, true);
+    ReplayBackend backend(streamOf(records), 0, true);
     Collector c(backend);
     backend.setPaused(true);
     backend.start();
@@ -90,7 +84,7 @@ TEST(ReplayBackend, ALoopingReplayWaitsWhilePausedAndStartsOverAtItsEnd) {
     backend.stop();
     EXPECT_EQ(backend.state(), State::Idle);
 
-    ReplayBackend once(streamOf(records, kTSLogChannelTechnology_Morvek_UTRAN2), 0, false);
+    ReplayBackend once(streamOf(records), 0, false);
     Collector d(once);
     for (int pass = 0; pass < 2; ++pass) {  // a start after the end plays from the beginning
         once.start();
@@ -99,7 +93,7 @@ TEST(ReplayBackend, ALoopingReplayWaitsWhilePausedAndStartsOverAtItsEnd) {
     EXPECT_EQ(d.messages.size(), 6u);
     EXPECT_EQ(d.messages[3], records[0]);
 
-    ReplayBackend empty(streamOf({}, kTSLogChannelTechnology_Morvek_UTRAN2), 0, true);
+    ReplayBackend empty(streamOf({}), 0, true);
     empty.start();
     ASSERT_TRUE(waitUntil([&] { return empty.state() == State::Finished; }));
 }
@@ -138,19 +132,6 @@ TEST(EmulatorBackend, TicksComeAtOnceThenEveryIntervalAndGoOnCountingAfterAStop)
     ASSERT_TRUE(waitUntil([&] { return c.messages.size() >= ticks[n].size(); }));
     c.messages.resize(ticks[n].size());
     EXPECT_EQ(c.messages, ticks[n]);
-}
-
-TEST(EmulatorBackend, ScenariosAreFoundByShortNameOrIdentifier) {
-    std::string error;
-    for (const char* name : {"utran", "UTRAN", kTSLogChannelTechnology_Morvek_UTRAN2}) {
-        auto scenario = EmulatorBackend::scenarioFor(name, &error);
-        ASSERT_TRUE(scenario) << name;
-        EXPECT_EQ(scenario->technology(), kTSLogChannelTechnology_Morvek_UTRAN2);
-    }
-    EXPECT_FALSE(EmulatorBackend::scenarioFor("lte", &error));
-    EXPECT_EQ(error, "no emulator scenario for lte yet (available: utran)");
-    EXPECT_FALSE(EmulatorBackend::scenarioFor("wimax", &error));
-    EXPECT_EQ(error.rfind("unknown technology \"wimax\"", 0), 0u) << error;
 }
 
 TEST(LogMask, AStartCommandForwardsItsCodesAndAlwaysTheJunk) {

@@ -303,8 +303,6 @@ TEST(CaptureReader, FilesThatAreNoCaptureAreErrors) {
         EXPECT_EQ(capture.report.error, error);
         EXPECT_TRUE(capture.messages.empty());
     }
-    EXPECT_EQ(RecordedStream::open("/nonexistent-vantorel.vcap").error(),
-              "/nonexistent-vantorel.vcap: No such file or directory");
     EXPECT_EQ(RecordedStream::open(VANTOREL_CAPTURES_DIR).error(), std::string(VANTOREL_CAPTURES_DIR) + ": is a directory");
 }
 

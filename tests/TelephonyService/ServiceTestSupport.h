@@ -4,6 +4,7 @@
 #include "Platform/LocalMessagePort.h"
 #include "Platform/RecordBuilder.h"
 #include "Platform/RemoteMessagePort.h"
+#include "Platform/TelephonyIdentifiers.h"
 #include "Platform/TelephonyServiceConnection.h"
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
@@ -63,15 +64,13 @@ inline Bytes logPacketBody(uint16_t code, uint64_t timeStamp, std::initializer_l
     return body;
 }
 
-// An in-memory capture of the messages (times stepMicros apart), as a RecordedStream.
-inline RecordedStream streamOf(const std::vector<Bytes>& messages, const std::string& technology,
-                               int64_t stepMicros = 1000) {
-    Bytes file = CaptureWriter::headerBytes(technology);
-    int64_t time = 1700000000000000;
-    for (const Bytes& m : messages) {
-        append(file, CaptureWriter::messageBytes(time, 0, m));
-        time += stepMicros;
-    }
+// An in-memory UTRAN capture of the messages at the given times in microseconds (1 ms
+// apart when none are given), as a RecordedStream.
+inline RecordedStream streamOf(const std::vector<Bytes>& messages, const std::vector<int64_t>& times = {}) {
+    Bytes file = CaptureWriter::headerBytes(kTSLogChannelTechnology_Morvek_UTRAN2);
+    for (size_t i = 0; i < messages.size(); ++i)
+        append(file, CaptureWriter::messageBytes(times.empty() ? 1700000000000000 + int64_t(i) * 1000 : times[i], 0,
+                                                 messages[i]));
     return RecordedStream::fromBytes(file);
 }
 

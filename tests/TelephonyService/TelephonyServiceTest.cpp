@@ -47,7 +47,7 @@ TelephonyServiceOptions replayOptions(std::vector<Bytes> records, bool loop = fa
     TelephonyServiceOptions options;
     options.portName = uniquePortName("service");
     options.backendFactory = [records = std::move(records), loop] {
-        return std::make_unique<ReplayBackend>(streamOf(records, kTSLogChannelTechnology_Morvek_UTRAN2), 0, loop, "test");
+        return std::make_unique<ReplayBackend>(streamOf(records), 0, loop, "test");
     };
     return options;
 }
@@ -89,33 +89,6 @@ TEST(TelephonyService, AChannelAnswersGetTechnologyAndSendsNothingBeforeTheStart
     EXPECT_TRUE(client.received.empty());
     EXPECT_EQ(service.counters().openChannels, 1u);
     EXPECT_EQ(service.counters().messagesSent, 0u);
-}
-
-TEST(TelephonyService, TheStartCommandsMaskChoosesWhatTheClientGets) {
-    struct Row {
-        const char* name;
-        DictionaryRef command;
-        std::vector<Bytes> expected;
-    };
-    const std::vector<Row> rows = {
-        {"ordinary and extra codes; junk always passes", startCommand({0xD00A}, {1}), {kCodeA, kExtra1, kPrefixedA, kJunk}},
-        {"extra code 2 only", startCommand({}, {2}), {kExtra2, kJunk}},
-        {"no code lists: everything", startCommand({}, {}, false), kMixed},
-    };
-    for (const Row& row : rows) {
-        SCOPED_TRACE(row.name);
-        TelephonyServiceThread service(replayOptions(kMixed));
-        ASSERT_TRUE(service.start());
-        TestClient client;
-        ASSERT_TRUE(client.connect(service.portName()));
-        ASSERT_TRUE(client.send(row.command));
-        ASSERT_TRUE(waitUntil([&] {
-            return backendState(service) == ModemBackend::State::Finished && client.received.size() >= row.expected.size();
-        }));
-        servicetest::spin(30);  // nothing more comes
-        EXPECT_EQ(client.received, row.expected);
-        EXPECT_EQ(service.counters().messagesSent, row.expected.size());
-    }
 }
 
 TEST(TelephonyService, TwoClientsGetTheirOwnMasks) {
