@@ -88,7 +88,6 @@ bool LocalMessagePort::listen() {
 
 void LocalMessagePort::setInvalidationCallback(InvalidationCallback callback) { invalidation_ = std::move(callback); }
 
-int LocalMessagePort::peerCount() const { return static_cast<int>(peers_.size()); }
 
 void LocalMessagePort::acceptPeers() {
     while (server_ && server_->hasPendingConnections()) {

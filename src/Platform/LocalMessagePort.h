@@ -50,7 +50,6 @@ public:
 
     // Frames from peers that were not valid frames (each closes its connection).
     uint64_t malformedFrames() const { return malformed_; }
-    int peerCount() const;
 
 private:
     struct Peer;

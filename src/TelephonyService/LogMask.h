@@ -46,10 +46,7 @@ public:
     // given) then says which.
     static LogMask fromStartCommand(const Dictionary& command, std::string* problem = nullptr);
 
-    void addOrdinaryCode(uint16_t code) { ordinary_.insert(code); }
-    void addExtraCode(uint16_t code) { extra_.insert(code); }
 
-    bool forwardsAll() const { return all_; }
     bool forwards(ByteView message) const;
     // "all codes" or "<n> log codes, <m> extra codes", for status lines.
     std::string description() const;

@@ -153,10 +153,6 @@ void TelephonyService::stop() {
     }
 }
 
-bool TelephonyService::isListening() const {
-    return port_ && port_->isValid();
-}
-
 TelephonyService::Counters TelephonyService::counters() const {
     Counters c = counters_;
     c.openChannels = channels_.size();

@@ -91,7 +91,6 @@ public:
     bool start(std::string* error);
     // Closes every channel and the port, stops the backend, flushes the recording.
     void stop();
-    bool isListening() const;
 
     const std::string& portName() const { return portName_; }
     ModemBackend* backend() const { return backend_.get(); }

@@ -13,10 +13,12 @@
 namespace vantorel {
 namespace {
 
+using Env = std::optional<std::string>;
+
 // Sets (or, with nullopt, unsets) one environment variable for a scope and restores it.
 class ScopedEnvironment {
 public:
-    ScopedEnvironment(const char* name, std::optional<std::string> value) : name_(name) {
+    ScopedEnvironment(const char* name, Env value) : name_(name) {
         if (const char* old = std::getenv(name)) old_ = old;
         value ? setenv(name, value->c_str(), 1) : unsetenv(name);
     }
@@ -24,11 +26,10 @@ public:
 
 private:
     const char* name_;
-    std::optional<std::string> old_;
+    Env old_;
 };
 
 TEST(DiagnosticLogDirectory, TheFirstUsableSourceWins) {
-    using Env = std::optional<std::string>;
     struct Row {
         Env variable, override_, stateHome, home;
         std::string path;
@@ -56,20 +57,19 @@ TEST(DiagnosticLogDirectory, TheFirstUsableSourceWins) {
 TEST(DiagnosticLogDirectory, EnsureExistsMakesTheParentsAndFailsUnderAFile) {
     ScopedEnvironment variable(DiagnosticLogDirectory::kEnvironmentVariable, std::nullopt);
     QTemporaryDir tmp;
-    DiagnosticLogDirectory::setOverride(tmp.filePath("a/b/logs").toStdString());
-    std::string error;
-    EXPECT_TRUE(DiagnosticLogDirectory::ensureExists(&error)) << error;
-    EXPECT_TRUE(DiagnosticLogDirectory::ensureExists(&error)) << "an existing directory is fine";
-
-    QFile plain(tmp.filePath("plain"));
-    ASSERT_TRUE(plain.open(QIODevice::WriteOnly));
-    plain.close();
-    DiagnosticLogDirectory::setOverride(tmp.filePath("plain/logs").toStdString());
-    EXPECT_FALSE(DiagnosticLogDirectory::ensureExists(&error));
-    EXPECT_EQ(error, "cannot create directory " + tmp.filePath("plain/logs").toStdString());
-    DiagnosticLogDirectory::setOverride(tmp.filePath("plain").toStdString());
-    EXPECT_FALSE(DiagnosticLogDirectory::ensureExists(&error));
-    EXPECT_EQ(error, "not a directory: " + tmp.filePath("plain").toStdString());
+    QFile(tmp.filePath("plain")).open(QIODevice::WriteOnly);
+    const std::vector<std::pair<QString, std::string>> rows = {  // directory, error ("" for success)
+        {"a/b/logs", ""},
+        {"a/b/logs", ""},  // it exists now
+        {"plain/logs", "cannot create directory " + tmp.filePath("plain/logs").toStdString()},
+        {"plain", "not a directory: " + tmp.filePath("plain").toStdString()},
+    };
+    for (const auto& [dir, why] : rows) {
+        DiagnosticLogDirectory::setOverride(tmp.filePath(dir).toStdString());
+        std::string error;
+        EXPECT_EQ(DiagnosticLogDirectory::ensureExists(&error), why.empty());
+        EXPECT_EQ(error, why);
+    }
     DiagnosticLogDirectory::setOverride("");
 }
 

@@ -84,15 +84,6 @@ TEST(ReplayBackend, ALoopingReplayWaitsWhilePausedAndStartsOverAtItsEnd) {
     backend.stop();
     EXPECT_EQ(backend.state(), State::Idle);
 
-    ReplayBackend once(streamOf(records), 0, false);
-    Collector d(once);
-    for (int pass = 0; pass < 2; ++pass) {  // a start after the end plays from the beginning
-        once.start();
-        ASSERT_TRUE(waitUntil([&] { return once.state() == State::Finished; }));
-    }
-    EXPECT_EQ(d.messages.size(), 6u);
-    EXPECT_EQ(d.messages[3], records[0]);
-
     ReplayBackend empty(streamOf({}), 0, true);
     empty.start();
     ASSERT_TRUE(waitUntil([&] { return empty.state() == State::Finished; }));

@@ -11,7 +11,6 @@
 #include "TelephonyService/Replay/QmdlReader.h"
 #include "TelephonyService/ServiceTestSupport.h"
 
-#include <QFile>
 #include <gtest/gtest.h>
 
 #include <map>
@@ -26,13 +25,6 @@ using servicetest::capturePath;
 using servicetest::hdlcFrame;
 using servicetest::logPacketBody;
 using servicetest::morvekRecord;
-
-Bytes readAll(const std::string& path) {
-    QFile file(QString::fromStdString(path));
-    EXPECT_TRUE(file.open(QIODevice::ReadOnly)) << path;
-    const QByteArray data = file.readAll();
-    return Bytes(data.begin(), data.end());
-}
 
 // Frame and code counts from the captures' README; otherPackets and badCrc measured
 // (cmcc and sprint start with 7 stray bytes that spoil the first frame's CRC).
@@ -80,22 +72,6 @@ TEST(RecordedStream, RealCapturesReadAsTheirReadmeCounts) {
         EXPECT_GE(stream.messages().front().timeMicros, 1420070400ll * 1000000);
         EXPECT_LT(stream.messages().front().timeMicros, 1483228800ll * 1000000);
     }
-}
-
-TEST(RecordedStream, AFlippedByteInARealCaptureLosesOneFrameOnly) {
-    const Bytes original = readAll(capturePath("offline_log_example.mi2log"));
-    Bytes data = original;
-    // A byte that is no flag or escape, does not follow an escape and stays ordinary when flipped.
-    size_t at = data.size() / 2;
-    auto special = [](uint8_t c) { return c == 0x7E || c == 0x7D; };
-    while (special(data[at]) || special(data[at] ^ 0x01) || special(data[at - 1])) ++at;
-    data[at] ^= 0x01;
-    const RecordedLog base = QmdlReader::readBytes(original);
-    const RecordedLog flipped = QmdlReader::readBytes(data);
-    EXPECT_EQ(flipped.frames, base.frames - 1);
-    EXPECT_EQ(flipped.badCrc, base.badCrc + 1);
-    EXPECT_EQ(flipped.malformed + flipped.truncated, 0u);
-    EXPECT_LE(base.entries.size() - flipped.entries.size(), 1u);
 }
 
 TEST(DiagPacket, BodiesAreClassifiedAndLogPacketsSplit) {

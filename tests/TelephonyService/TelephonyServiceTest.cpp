@@ -253,26 +253,31 @@ TEST(TelephonyService, RecordingWritesEveryMessageSentAsACapture) {
     EXPECT_EQ(recorded, expected);
 }
 
-TEST(TelephonyService, StartUpFailuresSayWhyAndLeaveThePortFree) {
-    const std::string inUse = uniquePortName("service");
+TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
+    const std::string qmdl = servicetest::capturePath("qmdl_example.qmdl");
     TelephonyServiceOptions running;
-    running.portName = inUse;
-    running.emulate = "utran";
+    running.portName = uniquePortName("service");
+    running.replay = qmdl;
+    running.technology = "gsm";
     TelephonyServiceThread first(running);
-    ASSERT_TRUE(first.start());
+    std::atomic<QThread*> statusThread{nullptr};
+    first.setStatusCallback([&](const std::string& line) {
+        if (line.rfind("client connected: channel ", 0) == 0) statusThread = QThread::currentThread();
+    });
+    std::string error;
+    ASSERT_TRUE(first.start(&error)) << error;
+    EXPECT_EQ(first.startupLine(), "listening on " + running.portName +
+                                       ", backend replay of qmdl_example.qmdl (QMDL, 336 messages, speed 1), technology " +
+                                       kTSLogChannelTechnology_Morvek_GSM);
+
     auto options = [](auto change) {
         TelephonyServiceOptions o;
         o.portName = uniquePortName("service");
         change(o);
         return o;
     };
-    const std::string qmdl = servicetest::capturePath("qmdl_example.qmdl");
-    struct Row {
-        TelephonyServiceOptions options;
-        std::string error;  // the start of the message
-    };
-    const std::vector<Row> rows = {
-        {running, "cannot listen on port " + inUse + ": the name is in use (is another service running?)"},
+    const std::vector<std::pair<TelephonyServiceOptions, std::string>> failures = {  // options, start of the error
+        {running, "cannot listen on port " + running.portName + ": the name is in use (is another service running?)"},
         {options([](auto& o) { o.emulate = "wimax"; }), "unknown technology \"wimax\" (names: ifx, gsm, cdma, lte, utran"},
         {options([](auto& o) { o.emulate = "gsm"; }), "no emulator scenario for gsm yet (available: utran)"},
         {options([](auto&) {}), "give exactly one of --emulate TECH and --replay FILE"},
@@ -285,47 +290,27 @@ TEST(TelephonyService, StartUpFailuresSayWhyAndLeaveThePortFree) {
         {options([](auto& o) { o.emulate = "utran"; o.record = "/nonexistent-dir-of-vantorel/x.vcap"; }),
          "/nonexistent-dir-of-vantorel/x.vcap: "},
     };
-    for (const Row& row : rows) {
-        TelephonyServiceThread service(row.options);
-        std::string error;
+    for (const auto& [failing, why] : failures) {
+        TelephonyServiceThread service(failing);
         EXPECT_FALSE(service.start(&error));
-        EXPECT_EQ(error.rfind(row.error, 0), 0u) << error;
+        EXPECT_EQ(error.rfind(why, 0), 0u) << error;
         EXPECT_FALSE(service.isRunning());
-        // Nothing is left listening on the port after a failed start.
-        if (row.options.portName != inUse) {
-            EXPECT_EQ(RemoteMessagePort::lookup(row.options.portName, 100), nullptr);
+        if (failing.portName != running.portName) {  // nothing is left listening after a failed start
+            EXPECT_EQ(RemoteMessagePort::lookup(failing.portName, 100), nullptr);
         }
     }
-    EXPECT_TRUE(first.isRunning());
-}
 
-TEST(TelephonyService, RunsOnItsOwnThreadUntilStopJoinsIt) {
-    const std::string port = uniquePortName("service");
-    TelephonyServiceOptions options;
-    options.portName = port;
-    options.replay = servicetest::capturePath("qmdl_example.qmdl");
-    options.technology = "gsm";
-    TelephonyServiceThread service(options);
-    std::atomic<QThread*> statusThread{nullptr};
-    service.setStatusCallback([&](const std::string& line) {
-        if (line.rfind("client connected: channel ", 0) == 0) statusThread = QThread::currentThread();
-    });
-    std::string error;
-    ASSERT_TRUE(service.start(&error)) << error;
-    EXPECT_EQ(service.startupLine(), "listening on " + port +
-                                         ", backend replay of qmdl_example.qmdl (QMDL, 336 messages, speed 1), "
-                                         "technology " + kTSLogChannelTechnology_Morvek_GSM);
     TestClient client;
-    ASSERT_TRUE(client.connect(port));
+    ASSERT_TRUE(client.connect(running.portName));
     QThread* serviceThread = nullptr;
-    ASSERT_TRUE(service.invoke([&](TelephonyService&) { serviceThread = QThread::currentThread(); }));
+    ASSERT_TRUE(first.invoke([&](TelephonyService&) { serviceThread = QThread::currentThread(); }));
     EXPECT_NE(serviceThread, QThread::currentThread());
     EXPECT_EQ(statusThread.load(), serviceThread);
-    service.stop();
-    EXPECT_FALSE(service.isRunning());
-    EXPECT_EQ(service.counters().channelsServed, 1u);  // the final counts
-    TelephonyServiceThread again(options);
-    EXPECT_TRUE(again.start());  // the port is free again
+    first.stop();
+    EXPECT_FALSE(first.isRunning());
+    EXPECT_EQ(first.counters().channelsServed, 1u);  // the final counts
+    TelephonyServiceThread again(running);
+    EXPECT_TRUE(again.start());  // stop() freed the port
 }
 
 }  // namespace

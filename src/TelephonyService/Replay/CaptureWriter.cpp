@@ -35,9 +35,7 @@ CaptureWriter::~CaptureWriter() {
 }
 
 bool CaptureWriter::write(int64_t timeMicros, int32_t messageId, ByteView data) {
-    if (!writeAll(messageBytes(timeMicros, messageId, data))) return false;
-    ++messages_;
-    return true;
+    return writeAll(messageBytes(timeMicros, messageId, data));
 }
 
 bool CaptureWriter::flush() {

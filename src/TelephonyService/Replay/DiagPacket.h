@@ -43,8 +43,6 @@ public:
 
     // The subscription id of a dual-SIM wrapper, when the body had one.
     std::optional<uint32_t> subscriptionId() const { return subscriptionId_; }
-    // The body without the dual-SIM wrapper.
-    ByteView innerBody() const { return inner_; }
     // First byte of the inner body (the DIAG command code), empty for an empty body.
     std::optional<uint8_t> command() const;
 
@@ -52,12 +50,10 @@ public:
     uint16_t logCode() const { return logCode_; }
     uint64_t timeStamp() const { return timeStamp_; }
     ByteView payload() const { return payload_; }
-    // <len> <code> <time stamp> <payload>: the inner body after its first 4 bytes.
-    ByteView dlfRecord() const { return dlfRecord_; }
     // The Morvek-channel record the decoders read: type byte 1 + the DLF record;
     // empty unless isLogPacket().
     Bytes morvekRecord() const;
-    // Type byte 1 + dlfRecord: the Morvek record of any DLF record (DlfReader uses it too).
+    // Type byte 1 + a DLF record <len> <code> <time stamp> <payload>: the Morvek record of any DLF record (DlfReader uses it too).
     static Bytes morvekRecordFromDlf(ByteView dlfRecord);
 
     // A DIAG time stamp as microseconds since 1970-01-01 00:00:00 UTC: the upper 48 bits
@@ -77,7 +73,7 @@ private:
     uint16_t logCode_ = 0;
     uint64_t timeStamp_ = 0;
     ByteView payload_;
-    ByteView dlfRecord_;
+    ByteView dlfRecord_;  // <len> <code> <time stamp> <payload>: the inner body after its first 4 bytes
 };
 
 }  // namespace vantorel
