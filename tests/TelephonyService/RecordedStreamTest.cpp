@@ -78,14 +78,15 @@ TEST(DiagPacket, BodiesAreClassifiedAndLogPacketsSplit) {
     const Bytes good = logPacketBody(0x7130, 0x1122, {0xA1, 0xA2});
     Bytes wrapped{0x98, 0x01, 0x00, 0x00, 0x07, 0x00, 0x00, 0x00};
     append(wrapped, good);
-    Bytes unequal = good;
-    unequal[2] = 0x20;
-    Bytes pastBody = good;
-    pastBody[2] = pastBody[4] = 15;
+    // The good packet with its outer (byte 2) and inner (byte 4) lengths set.
+    auto lengths = [&](uint8_t outer, uint8_t inner) {
+        Bytes b = good;
+        b[2] = outer;
+        b[4] = inner;
+        return b;
+    };
     Bytes over = good;
     over.push_back(0xEE);
-    Bytes belowHeader = good;
-    belowHeader[2] = belowHeader[4] = 11;
     using K = DiagPacket::Kind;
     struct Row {
         const char* name;
@@ -99,10 +100,10 @@ TEST(DiagPacket, BodiesAreClassifiedAndLogPacketsSplit) {
         {"dual-SIM wrapped log packet", wrapped, K::LogPacket, "", 7},
         {"cut dual-SIM wrapper", {0x98, 0x01, 0x00, 0x00, 0x07}, K::Malformed, "dual-SIM wrapper cut short: 5 of 8 bytes", {}},
         {"other 0x98 body", {0x98, 0x02, 0x00, 0x00, 0x07, 0, 0, 0, 0x10}, K::NotLogPacket, "", {}},
-        {"lengths differ", unequal, K::Malformed, "log packet lengths differ: outer 32, inner 14", {}},
-        {"length past the body", pastBody, K::Malformed, "log packet length 15 runs past the body (14 bytes after the command header)", {}},
+        {"lengths differ", lengths(32, 14), K::Malformed, "log packet lengths differ: outer 32, inner 14", {}},
+        {"length past the body", lengths(15, 15), K::Malformed, "log packet length 15 runs past the body (14 bytes after the command header)", {}},
         {"bytes over", over, K::Malformed, "log packet length 14 leaves 1 bytes over at the end of the body", {}},
-        {"length below the header", belowHeader, K::Malformed, "log packet length 11 is below the 12-byte log header", {}},
+        {"length below the header", lengths(11, 11), K::Malformed, "log packet length 11 is below the 12-byte log header", {}},
         {"cut header", Bytes(good.begin(), good.begin() + 15), K::Malformed, "log packet of 15 bytes, shorter than its 16-byte header", {}},
         {"text message", {0x79, 0x00, 0x01, 0x02}, K::NotLogPacket, "", {}},
         {"recording tool's record", {0xEE, 0xEE, 0x01}, K::NotLogPacket, "", {}},

@@ -38,12 +38,8 @@ inline Bytes hdlcFrame(ByteView body, uint16_t crcXor = 0) {
     raw.push_back(static_cast<uint8_t>(crc >> 8));
     Bytes out;
     for (uint8_t b : raw) {
-        if (b == 0x7E || b == 0x7D) {
-            out.push_back(0x7D);
-            out.push_back(static_cast<uint8_t>(b ^ 0x20));
-        } else {
-            out.push_back(b);
-        }
+        if (b == 0x7E || b == 0x7D) out.push_back(0x7D);
+        out.push_back(b == 0x7E || b == 0x7D ? static_cast<uint8_t>(b ^ 0x20) : b);
     }
     out.push_back(0x7E);
     return out;
