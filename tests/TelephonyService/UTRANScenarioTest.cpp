@@ -49,6 +49,7 @@ TEST(UTRANScenario, TheDecodersAcceptEveryRecordButTheDeliberatelyMalformedOnes)
     generator->generateLogUsingState(state);  // builds the display
 
     std::map<int32_t, Bytes> latest;  // the last record of each code, prefix removed
+    uint8_t mode = 0;                 // the RRC mode of the last valid 0xD0E0
     for (uint64_t tick = 0; tick < 100; ++tick) {
         SystemLogCapture capture;
         const std::vector<Bytes> records = scenario.recordsForTick(tick);
@@ -60,7 +61,21 @@ TEST(UTRANScenario, TheDecodersAcceptEveryRecordButTheDeliberatelyMalformedOnes)
         for (const Bytes& record : records) {
             generator->updateState(state, record);
             const auto c = LogMask::classify(record);
-            if (c) latest[c->effectiveCode()] = Bytes(withoutPrefix(record).bytes().begin(), withoutPrefix(record).bytes().end());
+            if (!c) continue;
+            const ByteReader r = withoutPrefix(record);
+            latest[c->effectiveCode()] = Bytes(r.bytes().begin(), r.bytes().end());
+            if (c->effectiveCode() == LogCode::kUTRANRRCState && r.u8(13).value_or(0) == 1) mode = r.u8(14).value_or(0);
+            if (c->effectiveCode() != LogCode::kUTRANBLERAndSIR) continue;
+            // Transport channels exist in Cell FACH (one FACH on the S-CCPCH in timeslot 0) and
+            // Cell DCH (2 or 4 TRCHs, CCTRCHs in the downlink timeslots 4-6).
+            const size_t trchs = (r.u16(14).value_or(0) >> 6) & 0x3F, cctrchs = r.u16(14).value_or(0) >> 12;
+            ASSERT_TRUE(mode == UTRANScenario::kCellFach || mode == UTRANScenario::kCellDCH) << "tick " << tick;
+            EXPECT_EQ(trchs, mode == UTRANScenario::kCellFach ? 1u : trchs == 4 ? 4u : 2u);
+            ASSERT_TRUE(cctrchs >= 1 && r.has(0, 289 + 34 * trchs + 8 * cctrchs));
+            for (size_t j = 0; j < cctrchs; ++j) {
+                const uint8_t tsnum = r.u8(289 + 34 * trchs + 8 * j + 1).value_or(0xFF);
+                EXPECT_TRUE(mode == UTRANScenario::kCellFach ? tsnum == 0 : tsnum >= 4 && tsnum <= 6) << int(tsnum);
+            }
         }
         size_t complaints = 0;
         for (const SystemLogCapture::Line& line : capture.lines())
@@ -94,6 +109,10 @@ TEST(UTRANScenario, TheDecodersAcceptEveryRecordButTheDeliberatelyMalformedOnes)
     EXPECT_EQ(at("/Neighbours/Neighbor Cell List/0/UARFCN"), std::to_string(neighbours.u32(168).value_or(0) & 0x3FFF));
     EXPECT_EQ(at("/Neighbours/Neighbor Cell List/" + std::to_string(count - 1) + "/Cell ID"),
               std::to_string((neighbours.u32(168 + 16 * (count - 1)).value_or(0) >> 14) & 0x7F));
+    const ByteReader sir(latest[LogCode::kUTRANBLERAndSIR]);
+    const size_t trchs = (sir.u16(14).value_or(0) >> 6) & 0x3F;
+    EXPECT_EQ(at("/Link Quality/TRCH BLER/0/TRCH BLER Measurement"), std::to_string(sir.u8(18).value_or(0)));
+    EXPECT_EQ(at("/Link Quality/CCTRCH SIR/0/TSNUM"), std::to_string(sir.u8(289 + 34 * trchs + 1).value_or(0)));
     EXPECT_EQ(at("/Technology"), "UTRAN (TD-SCDMA)");
     EXPECT_NE(at("/SIM/SIM Info/EF-ICCID").find("898600"), std::string::npos) << at("/SIM/SIM Info/EF-ICCID");
     EXPECT_EQ(at("/Packet Data/PDP Context Info/0/PDP Type"), "IP");
