@@ -1,4 +1,4 @@
-// ByteReader: bounds-checked little-endian reads (DESIGN.md "Decoding records safely").
+// ByteReader: bounds-checked little-endian reads that return nothing past the end of the buffer.
 #include "Platform/ByteReader.h"
 
 namespace vantorel {

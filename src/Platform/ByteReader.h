@@ -1,4 +1,4 @@
-// ByteReader: the one bounds-checked little-endian reader through which every record, frame and file is read (DESIGN.md "Decoding records safely").
+// ByteReader: the one bounds-checked little-endian reader through which every record, frame and file is read.
 #pragma once
 
 #include "PropertyList/Value.h"

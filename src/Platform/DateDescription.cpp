@@ -1,4 +1,4 @@
-// DateDescription: default date text and local zone facts (DESIGN.md "Date description"; Parts 3.1, 3.4).
+// DateDescription: the default date text and the local zone's offset and abbreviation.
 #include "Platform/DateDescription.h"
 
 #include <ctime>

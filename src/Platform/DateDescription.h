@@ -1,4 +1,4 @@
-// DateDescription: the platform's default date description "YYYY-MM-DD HH:MM:SS +ZZZZ" (DESIGN.md; Part 3.1 "Date") and the local zone facts of Part 3.4.
+// DateDescription: the platform's default date description "YYYY-MM-DD HH:MM:SS +ZZZZ" and the local zone's offset and abbreviation.
 #pragma once
 
 #include <chrono>

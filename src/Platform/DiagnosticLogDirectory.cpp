@@ -1,16 +1,15 @@
-// DiagnosticLogDirectory: the diagnostic-log directory of DESIGN.md, XDG state home or overrides, made with QDir::mkpath (Part 1.3).
+// DiagnosticLogDirectory: the snapshot directory under the XDG state home or an override, made with QDir::mkpath.
 #include "Platform/DiagnosticLogDirectory.h"
 
 #include <QDir>
 #include <QFileInfo>
 
 #include <cstdlib>
-#include <mutex>
 
 namespace vantorel {
 
 namespace {
-std::mutex gMutex;
+// Set and read on the main thread only (the save screen, the snapshot command and their tests).
 std::string gOverride;
 
 const char* const kSubdirectory = "/vantorel/DiagnosticLogs";
@@ -37,15 +36,11 @@ std::string DiagnosticLogDirectory::defaultPath() {
 std::string DiagnosticLogDirectory::path() {
     const std::string fromEnvironment = environment(kEnvironmentVariable);
     if (!fromEnvironment.empty()) return withoutTrailingSlashes(fromEnvironment);
-    {
-        std::lock_guard<std::mutex> lock(gMutex);
-        if (!gOverride.empty()) return gOverride;
-    }
+    if (!gOverride.empty()) return gOverride;
     return defaultPath();
 }
 
 void DiagnosticLogDirectory::setOverride(const std::string& dir) {
-    std::lock_guard<std::mutex> lock(gMutex);
     gOverride = dir.empty() ? std::string() : withoutTrailingSlashes(dir);
 }
 

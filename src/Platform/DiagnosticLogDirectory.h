@@ -1,11 +1,11 @@
-// DiagnosticLogDirectory: where snapshots go, $XDG_STATE_HOME/vantorel/DiagnosticLogs, created on demand (DESIGN.md "Diagnostic-log directory"; Parts 1.3, Overview "Platform interfaces").
+// DiagnosticLogDirectory: where snapshots go, $XDG_STATE_HOME/vantorel/DiagnosticLogs unless overridden, created on demand.
 #pragma once
 
 #include <string>
 
 namespace vantorel {
 
-// The platform's directory for diagnostic logs (Part 1.3 "Left to the implementer").
+// The directory snapshots are saved to; Linux has no fixed place for it, so the XDG state home is used.
 // Which path wins, first match:
 //   1. the environment variable VANTOREL_DIAGNOSTIC_LOGS, when set and not empty;
 //   2. the directory given to setOverride (tests);

@@ -1,4 +1,4 @@
-// LocalMessagePort: a named local message port on a QLocalServer: frames in, replies and notifications out, invalidation (Part 2.1; DESIGN.md "Message ports"; docs/protocol.md).
+// LocalMessagePort: a named local message port on a QLocalServer: frames in, replies and notifications out, invalidation (docs/protocol.md).
 #include "Platform/LocalMessagePort.h"
 
 #include "Platform/MessagePortFrame.h"
@@ -88,7 +88,6 @@ bool LocalMessagePort::listen() {
 
 void LocalMessagePort::setInvalidationCallback(InvalidationCallback callback) { invalidation_ = std::move(callback); }
 
-int LocalMessagePort::peerCount() const { return static_cast<int>(peers_.size()); }
 
 void LocalMessagePort::acceptPeers() {
     while (server_ && server_->hasPendingConnections()) {

@@ -1,4 +1,4 @@
-// LocalMessagePort: a named local message port (QLocalServer) with a receive callback and an invalidation callback (Part 2.1 "Platform operations used"; DESIGN.md "Message ports").
+// LocalMessagePort: a named local message port (QLocalServer) with a receive callback and an invalidation callback (docs/protocol.md).
 #pragma once
 
 #include "PropertyList/Value.h"
@@ -50,7 +50,6 @@ public:
 
     // Frames from peers that were not valid frames (each closes its connection).
     uint64_t malformedFrames() const { return malformed_; }
-    int peerCount() const;
 
 private:
     struct Peer;

@@ -1,4 +1,4 @@
-// MessagePortFrame: encoding and stream decoding of message-port frames (docs/protocol.md; spec Overview "Platform interfaces", Part 2.1).
+// MessagePortFrame: encoding and stream decoding of message-port frames (docs/protocol.md).
 #include "Platform/MessagePortFrame.h"
 
 #include <algorithm>
@@ -32,15 +32,17 @@ std::vector<MessagePortFrame> MessagePortFrameDecoder::feed(ByteView bytes) {
     if (failed()) return frames;
     buffer_.insert(buffer_.end(), bytes.begin(), bytes.end());
 
-    // Frames are cut from the front; the consumed prefix is erased once at the end.
+    // Frames are cut from the front, each read at offsets from its own start; the
+    // consumed prefix is erased once at the end.
+    const ByteReader stream(buffer_);
     size_t consumed = 0;
     while (true) {
-        ByteReader reader(ByteView(buffer_).subspan(consumed));
+        const ByteReader reader(stream.from(consumed));
         if (!reader.has(0, MessagePortFrame::kHeaderLength)) break;
-        const uint8_t kind = *reader.u8(0);
-        const uint8_t version = *reader.u8(1);
-        const int32_t messageId = *reader.s32(4);
-        const uint32_t length = *reader.u32(8);
+        const uint8_t kind = reader.u8(0).value_or(0);
+        const uint8_t version = reader.u8(1).value_or(0);
+        const int32_t messageId = reader.s32(4).value_or(0);
+        const uint32_t length = reader.u32(8).value_or(0);
         if (kind > static_cast<uint8_t>(MessagePortFrame::Kind::Notification)) {
             error_ = StringFormat::format("unknown frame kind %u", static_cast<unsigned>(kind));
         } else if (version != MessagePortFrame::kVersion) {
@@ -55,12 +57,12 @@ std::vector<MessagePortFrame> MessagePortFrameDecoder::feed(ByteView bytes) {
             buffer_.shrink_to_fit();
             return frames;
         }
-        auto payload = reader.slice(MessagePortFrame::kHeaderLength, length);
-        if (!payload) break;  // wait for the rest of the data
+        if (!reader.has(MessagePortFrame::kHeaderLength, length)) break;  // wait for the rest of the data
+        const ByteView payload = reader.slice(MessagePortFrame::kHeaderLength, length).value_or(ByteView{});
         MessagePortFrame frame;
         frame.kind = static_cast<MessagePortFrame::Kind>(kind);
         frame.messageId = messageId;
-        frame.data.assign(payload->begin(), payload->end());
+        frame.data.assign(payload.begin(), payload.end());
         frames.push_back(std::move(frame));
         consumed += MessagePortFrame::kHeaderLength + length;
     }

@@ -1,4 +1,4 @@
-// MessagePortFrame: the wire format of Vantorel's message ports over local sockets (docs/protocol.md; spec Overview "Platform interfaces", Part 2.1).
+// MessagePortFrame: the wire format of Vantorel's message ports over local sockets (docs/protocol.md).
 #pragma once
 
 #include "PropertyList/Value.h"

@@ -1,4 +1,4 @@
-// Preferences: QSettings for the two preference domains of Part 1.1.
+// Preferences: QSettings files for the program's own domain and the home-screen shell's domain.
 #include "Platform/Preferences.h"
 
 #include <QDir>
@@ -6,12 +6,11 @@
 #include <QSettings>
 #include <QStandardPaths>
 
-#include <mutex>
 
 namespace vantorel {
 
 namespace {
-std::mutex gMutex;
+// Set and read on the main thread only (the window and its tests).
 std::string gDirectory;
 std::string gMarker = Preferences::kInternalInstallMarker;
 
@@ -32,7 +31,6 @@ Preferences& Preferences::instance() {
 }
 
 std::string Preferences::directory() {
-    std::lock_guard<std::mutex> lock(gMutex);
     if (!gDirectory.empty()) return gDirectory;
     return QDir(QStandardPaths::writableLocation(QStandardPaths::GenericConfigLocation))
         .filePath("vantorel")
@@ -40,12 +38,10 @@ std::string Preferences::directory() {
 }
 
 void Preferences::setDirectory(const std::string& dir) {
-    std::lock_guard<std::mutex> lock(gMutex);
     gDirectory = dir;
 }
 
 void Preferences::setInternalInstallMarker(const std::string& path) {
-    std::lock_guard<std::mutex> lock(gMutex);
     gMarker = path.empty() ? kInternalInstallMarker : path;
 }
 
@@ -69,12 +65,7 @@ void Preferences::writeShellBool(const char* key, bool value) {
 }
 
 bool Preferences::internalInstallMarkerExists() {
-    std::string marker;
-    {
-        std::lock_guard<std::mutex> lock(gMutex);
-        marker = gMarker;
-    }
-    return QFileInfo::exists(QString::fromStdString(marker));
+    return QFileInfo::exists(QString::fromStdString(gMarker));
 }
 
 }  // namespace vantorel

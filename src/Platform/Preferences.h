@@ -1,4 +1,4 @@
-// Preferences: the program's own settings domain and the home-screen shell's domain (QSettings), and the internal-install marker (Part 1.1; DESIGN.md "Preferences").
+// Preferences: the program's own settings domain and the home-screen shell's domain (QSettings), and the internal-install marker.
 #pragma once
 
 #include <QObject>

@@ -1,4 +1,4 @@
-// ProgrammingError: abstract operations end here (Parts 3.1 and 3.3).
+// ProgrammingError: where an abstract operation that a subclass should have replaced ends the program.
 #include "Platform/ProgrammingError.h"
 
 #include "Platform/SystemLog.h"

@@ -1,4 +1,4 @@
-// ProgrammingError: the loud end of a programming error (an abstract operation reached); Overview "Conventions", Parts 3.1 and 3.3.
+// ProgrammingError: the loud end of a programming error (an abstract operation reached).
 #pragma once
 
 namespace vantorel {

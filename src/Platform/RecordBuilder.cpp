@@ -1,27 +1,28 @@
-// RecordBuilder: Morvek-channel log records for tests and the emulator (Part 3.2 header layout).
+// RecordBuilder: Morvek-channel log records (type, DLF length, code, time stamp, payload) for tests and the emulator.
 #include "Platform/RecordBuilder.h"
 
+#include "Platform/LogCodes.h"
 #include "PropertyList/PropertyListSerialization.h"
 
 #include <algorithm>
 
 namespace vantorel {
 
-RecordBuilder::RecordBuilder(uint8_t type, uint16_t code, size_t totalLength)
+RecordBuilder::RecordBuilder(uint8_t type, int32_t code, size_t totalLength)
     : record_(std::max(totalLength, kHeaderLength), 0) {
     record_[0] = type;
-    put(record_, 3, code, 2);
+    put(record_, 3, static_cast<uint16_t>(code & 0xFFFF), 2);
 }
 
-RecordBuilder RecordBuilder::ordinary(uint16_t code, size_t totalLength) {
-    return RecordBuilder(kOrdinary, code, totalLength);
+RecordBuilder RecordBuilder::ordinary(int32_t code, size_t totalLength) {
+    return RecordBuilder(LogCode::kOrdinaryType, code, totalLength);
 }
 
-RecordBuilder RecordBuilder::extra(uint16_t code, size_t totalLength) {
-    return RecordBuilder(kExtra, code, totalLength);
+RecordBuilder RecordBuilder::extra(int32_t code, size_t totalLength) {
+    return RecordBuilder(LogCode::kExtraType, code, totalLength);
 }
 
-Bytes RecordBuilder::extraPropertyList(uint16_t code, const Value& value, bool binary) {
+Bytes RecordBuilder::extraPropertyList(int32_t code, const Value& value, bool binary) {
     auto payload = PropertyListSerialization::write(
         value, binary ? PropertyListSerialization::Format::Binary : PropertyListSerialization::Format::XML);
     RecordBuilder b = extra(code);

@@ -1,4 +1,4 @@
-// RemoteMessagePort: a remote message port on a QLocalSocket: blocking requests with send/receive timeouts, streaming posts, notifications, invalidation (Parts 2.1, 2.2; DESIGN.md "Message ports"; docs/protocol.md).
+// RemoteMessagePort: a remote message port on a QLocalSocket: blocking requests with send/receive timeouts, streaming posts, notifications, invalidation (docs/protocol.md).
 #include "Platform/RemoteMessagePort.h"
 
 #include "Platform/MessagePortFrame.h"

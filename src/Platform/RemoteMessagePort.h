@@ -1,4 +1,4 @@
-// RemoteMessagePort: a remote message port looked up by name (QLocalSocket): requests with send and receive timeouts, validity, invalidation (Part 2.1, 2.2; DESIGN.md "Message ports").
+// RemoteMessagePort: a remote message port looked up by name (QLocalSocket): requests with send and receive timeouts, validity, invalidation (docs/protocol.md).
 #pragma once
 
 #include "PropertyList/Value.h"

@@ -1,4 +1,4 @@
-// ResourceBundle: the application's property-list resources through Qt's resource system (DESIGN.md stack table).
+// ResourceBundle: the application's property-list resources through Qt's resource system.
 #include "Platform/ResourceBundle.h"
 
 #include "Platform/SystemLog.h"
@@ -7,23 +7,20 @@
 #include <QDir>
 #include <QFile>
 
-#include <mutex>
 
 namespace vantorel {
 
 namespace {
 const char* const kDefaultDirectory = ":/templates";
-std::mutex gMutex;
+// Set and read on the main thread only: the decoders load their templates there.
 std::string gDirectory = kDefaultDirectory;
 }  // namespace
 
 std::string ResourceBundle::directory() {
-    std::lock_guard<std::mutex> lock(gMutex);
     return gDirectory;
 }
 
 void ResourceBundle::setDirectory(const std::string& dir) {
-    std::lock_guard<std::mutex> lock(gMutex);
     gDirectory = dir.empty() ? kDefaultDirectory : dir;
 }
 

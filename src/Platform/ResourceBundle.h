@@ -1,4 +1,4 @@
-// ResourceBundle: lists and loads the application's property-list resources (Qt resources from resources/templates/); Overview "Platform interfaces", Parts 3.2 and 7.1.
+// ResourceBundle: lists and loads the application's property-list resources (Qt resources from resources/templates/).
 #pragma once
 
 #include "PropertyList/Value.h"

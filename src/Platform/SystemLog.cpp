@@ -1,4 +1,4 @@
-// SystemLog: syslog with the spec's priorities, a stderr mirror and a test observer (DESIGN.md "Platform stand-ins").
+// SystemLog: syslog with the monitor's priorities, a stderr mirror and an observer for the test capture.
 #include "Platform/SystemLog.h"
 
 #include "Platform/StringFormat.h"

@@ -1,4 +1,4 @@
-// SystemLog: the system log of DESIGN.md (syslog with the spec's priorities 3, 4 and 16, a stderr mirror, a test capture); Overview "Conventions".
+// SystemLog: the system log (syslog with priorities 3, 4 and 16, a stderr mirror, a test capture).
 #pragma once
 
 #include <functional>
@@ -8,17 +8,17 @@ namespace vantorel {
 
 class SystemLog {
 public:
-    // The priority values the spec names. Dlf is the DLF writer's value 16 (user
-    // facility, emergency level, Part 3.4), passed to syslog as it stands.
+    // The priorities the monitor logs with. Dlf is the DLF writer's value 16 (user
+    // facility, emergency level), passed to syslog as it stands, as the handset's tool does.
     static constexpr int kError = 3;
     static constexpr int kWarning = 4;
     static constexpr int kNotice = 5;
     static constexpr int kDlf = 16;
-    // Lines for the platform's console log (Part 7.2 "Display Dict = ..."): not sent
+    // Lines for the platform's console log (the decoders' "Display Dict = ..." dumps): not sent
     // to syslog, only mirrored and captured.
     static constexpr int kConsole = -1;
 
-    // printf-style: the spec's "%@" placeholders are passed as "%s" with the text.
+    // printf-style: object placeholders ("%@") are written as "%s" with the text.
     static void log(int priority, const char* format, ...) __attribute__((format(printf, 2, 3)));
     static void write(int priority, const std::string& line);
 

@@ -1,4 +1,4 @@
-// SystemLogCapture: the test hook on the system log (DESIGN.md "Platform stand-ins").
+// SystemLogCapture: the observer that keeps the system-log lines written while it lives.
 #include "Platform/SystemLogCapture.h"
 
 #include "Platform/SystemLog.h"

@@ -1,4 +1,4 @@
-// SystemLogCapture: records the system-log lines written while it lives, so tests can assert the spec's exact lines (DESIGN.md).
+// SystemLogCapture: records the system-log lines written while it lives, so tests can assert exact lines.
 #pragma once
 
 #include <mutex>

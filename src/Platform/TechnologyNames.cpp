@@ -1,4 +1,4 @@
-// TechnologyNames: short names for the technology identifiers of Part 2.2.
+// TechnologyNames: short names for the telephony service's technology identifiers.
 #include "Platform/TechnologyNames.h"
 
 #include "Platform/TelephonyIdentifiers.h"

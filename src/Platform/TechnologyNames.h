@@ -1,4 +1,4 @@
-// TechnologyNames: the short names users type for the five technology identifiers (ifx, gsm, cdma, lte, utran) of Part 2.2's table.
+// TechnologyNames: the short names users type for the five technology identifiers (ifx, gsm, cdma, lte, utran).
 #pragma once
 
 #include <optional>

@@ -1,16 +1,16 @@
-// TelephonyIdentifiers: the telephony service's technology identifiers and cell-monitor keys, defined once for the model, decoders and service (Overview "Platform interfaces", Part 2.2).
+// TelephonyIdentifiers: the telephony service's technology identifiers and cell-monitor keys, defined once for the model, decoders and service.
 #pragma once
 
 namespace vantorel {
 
-// Technology identifiers answered to "GetTechnology" (Part 2.2 table, in its order).
+// Technology identifiers answered to "GetTechnology", in the order the service lists them.
 inline constexpr const char* kTSLogChannelTechnology_IFX = "kTSLogChannelTechnology_IFX";
 inline constexpr const char* kTSLogChannelTechnology_Morvek_GSM = "kTSLogChannelTechnology_Morvek_GSM";
 inline constexpr const char* kTSLogChannelTechnology_Morvek_CDMA = "kTSLogChannelTechnology_Morvek_CDMA";
 inline constexpr const char* kTSLogChannelTechnology_Morvek_LTE = "kTSLogChannelTechnology_Morvek_LTE";
 inline constexpr const char* kTSLogChannelTechnology_Morvek_UTRAN2 = "kTSLogChannelTechnology_Morvek_UTRAN2";
 
-// Cell-monitor dictionary keys (the 0xFF0001 extra record; Parts 5.2, 6.2, 7.2).
+// Cell-monitor dictionary keys (the 0xFF0001 extra record the GSM, LTE and UTRAN decoders read).
 inline constexpr const char* kTSCellMonitorMCC = "kTSCellMonitorMCC";
 inline constexpr const char* kTSCellMonitorMNC = "kTSCellMonitorMNC";
 inline constexpr const char* kTSCellMonitorLAC = "kTSCellMonitorLAC";

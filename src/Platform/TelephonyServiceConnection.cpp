@@ -1,4 +1,4 @@
-// TelephonyServiceConnection: client of the telephony service's well-known port: notifications and CreateLogChannel (Parts 2.1, 2.2; docs/protocol.md).
+// TelephonyServiceConnection: client of the telephony service's well-known port: notifications and CreateLogChannel (docs/protocol.md).
 #include "Platform/TelephonyServiceConnection.h"
 
 #include "Platform/RemoteMessagePort.h"

@@ -1,4 +1,4 @@
-// TelephonyServiceConnection: the client side of the telephony service: a server connection with notifications, and creating a network-monitor log channel (Parts 2.1, 2.2; docs/protocol.md).
+// TelephonyServiceConnection: the client side of the telephony service: a server connection with notifications, and creating a network-monitor log channel (docs/protocol.md).
 #pragma once
 
 #include "PropertyList/Value.h"

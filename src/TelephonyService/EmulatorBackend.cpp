@@ -1,4 +1,4 @@
-// EmulatorBackend: scenario lookup by technology and the tick timer of the emulated modem (DESIGN.md "The telephony service", Emulator/).
+// EmulatorBackend: scenario lookup by technology and the tick timer of the emulated modem.
 #include "TelephonyService/EmulatorBackend.h"
 
 #include "Platform/StringFormat.h"
@@ -8,11 +8,8 @@
 
 namespace vantorel {
 
-EmulatorBackend::EmulatorBackend(std::unique_ptr<EmulatorScenario> scenario, std::chrono::milliseconds tickInterval,
-                                 QObject* parent)
-    : ModemBackend(parent),
-      scenario_(std::move(scenario)),
-      interval_(tickInterval.count() > 0 ? tickInterval : scenario_->tickInterval()) {
+EmulatorBackend::EmulatorBackend(std::unique_ptr<EmulatorScenario> scenario, QObject* parent)
+    : ModemBackend(parent), scenario_(std::move(scenario)) {
     timer_.setTimerType(Qt::PreciseTimer);
     connect(&timer_, &QTimer::timeout, this, &EmulatorBackend::tick);
 }
@@ -42,7 +39,7 @@ std::string EmulatorBackend::description() const {
     return StringFormat::format("emulator (%s scenario, seed %llu, tick %lld ms)",
                                 TechnologyNames::shortName(scenario_->technology()).c_str(),
                                 static_cast<unsigned long long>(scenario_->seed()),
-                                static_cast<long long>(interval_.count()));
+                                static_cast<long long>(scenario_->tickInterval().count()));
 }
 
 void EmulatorBackend::start() {
@@ -59,7 +56,8 @@ void EmulatorBackend::stop() {
 
 void EmulatorBackend::tick() {
     if (state() != State::Streaming) return;
-    if (timer_.interval() != static_cast<int>(interval_.count())) timer_.setInterval(static_cast<int>(interval_.count()));
+    const int interval = static_cast<int>(scenario_->tickInterval().count());
+    if (timer_.interval() != interval) timer_.setInterval(interval);
     const std::vector<Bytes> records = scenario_->recordsForTick(nextTick_++);
     for (const Bytes& record : records) {
         emitMessage(0, record);

@@ -1,4 +1,4 @@
-// EmulatorBackend: the modem backend that runs an EmulatorScenario on a timer, one tick per tickInterval (DESIGN.md "The telephony service", Emulator/).
+// EmulatorBackend: the modem backend that runs an EmulatorScenario on a timer, one tick per scenario interval.
 #pragma once
 
 #include "TelephonyService/Emulator/EmulatorScenario.h"
@@ -19,10 +19,8 @@ namespace vantorel {
 class EmulatorBackend : public ModemBackend {
     Q_OBJECT
 public:
-    // tickInterval zero: the scenario's own.
-    explicit EmulatorBackend(std::unique_ptr<EmulatorScenario> scenario,
-                             std::chrono::milliseconds tickInterval = std::chrono::milliseconds(0),
-                             QObject* parent = nullptr);
+    // Ticks come every scenario->tickInterval().
+    explicit EmulatorBackend(std::unique_ptr<EmulatorScenario> scenario, QObject* parent = nullptr);
     ~EmulatorBackend() override;
 
     // The scenario for a technology name (ifx, gsm, cdma, lte, utran, any case) or full
@@ -38,15 +36,10 @@ public:
     void start() override;
     void stop() override;
 
-    std::chrono::milliseconds tickInterval() const { return interval_; }
-    // Ticks run so far.
-    uint64_t ticks() const { return nextTick_; }
-
 private:
     void tick();
 
     std::unique_ptr<EmulatorScenario> scenario_;
-    std::chrono::milliseconds interval_;
     QTimer timer_;
     uint64_t nextTick_ = 0;
 };

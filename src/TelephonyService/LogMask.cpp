@@ -1,4 +1,4 @@
-// LogMask: classification of channel messages and the start command's log mask (DESIGN.md "The telephony service"; Part 3.2).
+// LogMask: classification of channel messages by type and log code, and the start command's log mask.
 #include "TelephonyService/LogMask.h"
 
 #include "Platform/ByteReader.h"
@@ -33,15 +33,14 @@ size_t addCodes(const Dictionary& command, const char* key, std::set<uint16_t>& 
 }  // namespace
 
 std::optional<LogMask::Classification> LogMask::classify(ByteView message) {
-    ByteReader whole(message);
+    const ByteReader whole(message);
     // The prefix is two bytes: 0x81 and one byte that nobody reads.
-    const ByteView record = whole.u8(0) == kPrefixByte ? whole.from(kPrefixLength) : message;
-    ByteReader r(record);
-    const std::optional<uint8_t> type = r.u8(0);
-    const std::optional<uint16_t> code = r.u16(3);
-    if (!type || !code) return std::nullopt;
-    if (*type != kOrdinaryType && *type != kExtraType) return std::nullopt;
-    return Classification{*type, *code};
+    const bool prefixed = whole.has(0, 1) && whole.u8(0).value_or(0) == kPrefixByte;
+    const ByteReader r(prefixed ? whole.from(kPrefixLength) : message);
+    if (!r.has(0, 5)) return std::nullopt;  // type at 0, code at 3..4
+    const uint8_t type = r.u8(0).value_or(0);
+    if (type != LogCode::kOrdinaryType && type != LogCode::kExtraType) return std::nullopt;
+    return Classification{type, r.u16(3).value_or(0)};
 }
 
 LogMask LogMask::all() {
@@ -51,12 +50,12 @@ LogMask LogMask::all() {
 }
 
 LogMask LogMask::fromStartCommand(const Dictionary& command, std::string* problem) {
+    if (problem) problem->clear();
     if (!command.contains(kOrdinaryKey) && !command.contains(kExtraKey)) return all();
     LogMask mask;
     const size_t skippedOrdinary = addCodes(command, kOrdinaryKey, mask.ordinary_);
     const size_t skippedExtra = addCodes(command, kExtraKey, mask.extra_);
     if (problem) {
-        problem->clear();
         if (skippedOrdinary + skippedExtra > 0)
             *problem = StringFormat::format("skipped %zu entries of %s and %zu of %s that are not codes 0..65535",
                                             skippedOrdinary, kOrdinaryKey, skippedExtra, kExtraKey);
@@ -68,7 +67,7 @@ bool LogMask::forwards(ByteView message) const {
     if (all_) return true;
     const std::optional<Classification> c = classify(message);
     if (!c) return true;  // junk goes through, as from a real modem
-    const std::set<uint16_t>& codes = c->type == kExtraType ? extra_ : ordinary_;
+    const std::set<uint16_t>& codes = c->isOrdinary() ? ordinary_ : extra_;
     return codes.count(c->code) != 0;
 }
 

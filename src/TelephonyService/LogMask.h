@@ -1,6 +1,7 @@
-// LogMask: the log mask a channel's start command sets, forwarding only subscribed log codes like a modem (DESIGN.md "The telephony service"; Part 3.2 start command and record header).
+// LogMask: the log mask a channel's start command sets, forwarding only subscribed log codes like a modem.
 #pragma once
 
+#include "Platform/LogCodes.h"
 #include "PropertyList/Dictionary.h"
 #include "PropertyList/Value.h"
 
@@ -11,7 +12,7 @@
 
 namespace vantorel {
 
-// A message is classified the way the decoders frame it (Part 3.2):
+// A message is classified the way the decoders frame it:
 //   [0x81 xx]  optional two-byte prefix, removed first
 //   0          type: 1 ordinary record, 255 extra record
 //   1..2       length (not read)
@@ -24,15 +25,13 @@ class LogMask {
 public:
     static constexpr uint8_t kPrefixByte = 0x81;
     static constexpr size_t kPrefixLength = 2;
-    static constexpr uint8_t kOrdinaryType = 1;
-    static constexpr uint8_t kExtraType = 255;
-    static constexpr uint32_t kExtraCodeBase = 0xFF0000;
 
     struct Classification {
-        uint8_t type = 0;   // kOrdinaryType or kExtraType
+        uint8_t type = 0;   // LogCode::kOrdinaryType or LogCode::kExtraType
         uint16_t code = 0;  // the 16-bit code of bytes 3..4
-        // 0xFF0000 | code for an extra record, code for an ordinary one.
-        uint32_t effectiveCode() const { return type == kExtraType ? (kExtraCodeBase | code) : code; }
+        bool isOrdinary() const { return type == LogCode::kOrdinaryType; }
+        // LogCode::kExtraBase | code for an extra record, code for an ordinary one.
+        int32_t effectiveCode() const { return isOrdinary() ? code : (LogCode::kExtraBase | code); }
     };
     // Empty when the message cannot be classified (see above).
     static std::optional<Classification> classify(ByteView message);
@@ -47,10 +46,7 @@ public:
     // given) then says which.
     static LogMask fromStartCommand(const Dictionary& command, std::string* problem = nullptr);
 
-    void addOrdinaryCode(uint16_t code) { ordinary_.insert(code); }
-    void addExtraCode(uint16_t code) { extra_.insert(code); }
 
-    bool forwardsAll() const { return all_; }
     bool forwards(ByteView message) const;
     // "all codes" or "<n> log codes, <m> extra codes", for status lines.
     std::string description() const;

@@ -1,4 +1,4 @@
-// ModemBackend: state, pause flag and message counting shared by the service's modem backends (DESIGN.md "The telephony service").
+// ModemBackend: state, pause flag and message counting shared by the service's modem backends.
 #include "TelephonyService/ModemBackend.h"
 
 #include "Platform/StringFormat.h"

@@ -1,4 +1,4 @@
-// ModemBackend: the abstract modem behind the telephony service: a technology, a state, and a stream of messages (DESIGN.md "The telephony service").
+// ModemBackend: the abstract modem behind the telephony service: a technology, a state, and a stream of messages.
 #pragma once
 
 #include "PropertyList/Value.h"

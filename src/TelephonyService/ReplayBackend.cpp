@@ -1,4 +1,4 @@
-// ReplayBackend: paced replay of a recorded stream with looping and pausing (DESIGN.md "The telephony service", Replay/).
+// ReplayBackend: paced replay of a recorded stream with looping and pausing.
 #include "TelephonyService/ReplayBackend.h"
 
 #include "Platform/StringFormat.h"
@@ -33,7 +33,6 @@ std::string ReplayBackend::description() const {
 void ReplayBackend::start() {
     if (state() == State::Streaming) return;
     index_ = 0;
-    passes_ = 0;
     clock_.start();
     dueMicros_ = 0;
     setState(State::Streaming);
@@ -64,7 +63,7 @@ double ReplayBackend::gapBefore(size_t i) const {
     const int64_t earlier = messages[i - 1].timeMicros;
     if (later <= earlier) return 0;
     const uint64_t gap = static_cast<uint64_t>(later) - static_cast<uint64_t>(earlier);
-    const uint64_t cap = static_cast<uint64_t>(std::max<int64_t>(0, maxGap_.count()));
+    const uint64_t cap = static_cast<uint64_t>(kMaxGap.count());
     return static_cast<double>(std::min(gap, cap)) / speed_;
 }
 
@@ -82,7 +81,6 @@ void ReplayBackend::run() {
     size_t sent = 0;
     while (sent < kBatch) {
         if (index_ >= messages.size()) {
-            ++passes_;
             if (!loop_ || messages.empty()) {
                 setState(State::Finished);
                 return;

@@ -1,4 +1,4 @@
-// ReplayBackend: the modem backend that plays a RecordedStream back at its recorded pace, faster, or as fast as the client takes it (DESIGN.md "The telephony service", Replay/).
+// ReplayBackend: the modem backend that plays a RecordedStream back at its recorded pace, faster, or as fast as the client takes it.
 #pragma once
 
 #include "TelephonyService/ModemBackend.h"
@@ -21,14 +21,15 @@ namespace vantorel {
 // looping (a new pass; the first message of a pass follows the last one at once),
 // else the state becomes Finished. While paused nothing is sent; on resume the next
 // message is due at once and the pace goes on from there. A recorded gap longer than
-// maxGap() (10 s by default) is cut to it: real captures hold pauses of most of an hour
+// kMaxGap (10 s) is cut to it: real captures hold pauses of most of an hour
 // and time stamps decades off (sprint.mi2log), which no one wants to wait out.
 class ReplayBackend : public ModemBackend {
     Q_OBJECT
 public:
     // Messages sent per event-loop turn at most, so sockets and clients get their turn.
     static constexpr size_t kBatch = 256;
-    static constexpr std::chrono::microseconds kDefaultMaxGap{10000000};
+    // The longest recorded gap kept (before the speed divides it); longer ones are cut.
+    static constexpr std::chrono::microseconds kMaxGap{10000000};
 
     // name: what description() calls the stream (its file name).
     ReplayBackend(RecordedStream stream, double speed, bool loop, std::string name = {}, QObject* parent = nullptr);
@@ -39,17 +40,7 @@ public:
     void start() override;
     void stop() override;
 
-    // The longest recorded gap kept (before the speed divides it); longer ones are cut.
-    void setMaxGap(std::chrono::microseconds gap) { maxGap_ = gap; }
-    std::chrono::microseconds maxGap() const { return maxGap_; }
-
     const RecordedStream& stream() const { return stream_; }
-    double speed() const { return speed_; }
-    bool loops() const { return loop_; }
-    // Index of the next message to send in the current pass.
-    size_t position() const { return index_; }
-    // Passes completed (each time the end of the stream was reached).
-    uint64_t passesCompleted() const { return passes_; }
 
 protected:
     void pausedChanged() override;
@@ -58,19 +49,17 @@ private:
     void run();
     void schedule();
     // Wall-clock gap before message i (i > 0) in microseconds, from the recorded times
-    // (none when they go backwards, at most maxGap_), divided by the speed.
+    // (none when they go backwards, at most kMaxGap), divided by the speed.
     double gapBefore(size_t i) const;
 
     RecordedStream stream_;
     double speed_;
     bool loop_;
     std::string name_;
-    std::chrono::microseconds maxGap_ = kDefaultMaxGap;
     QTimer timer_;
     QElapsedTimer clock_;
-    size_t index_ = 0;
+    size_t index_ = 0;      // the next message to send in the current pass
     double dueMicros_ = 0;  // clock_ time at which message index_ is due
-    uint64_t passes_ = 0;
 };
 
 }  // namespace vantorel

@@ -1,4 +1,4 @@
-// TelephonyService: the service's well-known port, log channels, streaming with log masks and flow control, notifications and recording (DESIGN.md "The telephony service"; Parts 2.1, 2.2, 3.2; docs/protocol.md).
+// TelephonyService: the service's well-known port, log channels, streaming with log masks and flow control, notifications and recording (docs/protocol.md).
 #include "TelephonyService/TelephonyService.h"
 
 #include "Platform/LocalMessagePort.h"
@@ -67,7 +67,7 @@ std::unique_ptr<ModemBackend> TelephonyService::createBackend(const TelephonySer
     if (!options.emulate.empty()) {
         std::unique_ptr<EmulatorScenario> scenario = EmulatorBackend::scenarioFor(options.emulate, error, options.seed);
         if (!scenario) return nullptr;
-        return std::make_unique<EmulatorBackend>(std::move(scenario), options.tickInterval);
+        return std::make_unique<EmulatorBackend>(std::move(scenario));
     }
 
     std::string technology;
@@ -151,10 +151,6 @@ void TelephonyService::stop() {
         recorder_->flush();
         recorder_.reset();
     }
-}
-
-bool TelephonyService::isListening() const {
-    return port_ && port_->isValid();
 }
 
 TelephonyService::Counters TelephonyService::counters() const {

@@ -1,4 +1,4 @@
-// TelephonyService: the telephony service the model talks to: a well-known message port, network-monitor log channels with their log masks, a modem backend, recording (DESIGN.md "The telephony service"; Parts 2.1, 2.2, 3.2; docs/protocol.md).
+// TelephonyService: the telephony service the model talks to: a well-known message port, network-monitor log channels with their log masks, a modem backend, recording (docs/protocol.md).
 #pragma once
 
 #include "PropertyList/Value.h"
@@ -32,7 +32,6 @@ struct TelephonyServiceOptions {
     bool loop = false;       // --loop (replay)
     std::string record;      // --record FILE: every message sent, as a capture
     uint64_t seed = 1;       // emulator scenario seed
-    std::chrono::milliseconds tickInterval{0};  // emulator tick; zero: the scenario's
     // Builds the backend instead of emulate / replay (tests, embedders); called on the
     // service's thread.
     std::function<std::unique_ptr<ModemBackend>()> backendFactory;
@@ -92,7 +91,6 @@ public:
     bool start(std::string* error);
     // Closes every channel and the port, stops the backend, flushes the recording.
     void stop();
-    bool isListening() const;
 
     const std::string& portName() const { return portName_; }
     ModemBackend* backend() const { return backend_.get(); }

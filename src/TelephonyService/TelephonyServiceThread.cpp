@@ -1,4 +1,4 @@
-// TelephonyServiceThread: the embedded service on its own QThread and event loop (DESIGN.md "Threads" and "The telephony service").
+// TelephonyServiceThread: the embedded service on its own QThread and event loop.
 #include "TelephonyService/TelephonyServiceThread.h"
 
 #include <QMetaObject>

@@ -1,4 +1,4 @@
-// TelephonyServiceThread: runs a TelephonyService on a thread of its own with its own event loop, so a program can embed the service (DESIGN.md "Threads": the model's GetTechnology request blocks the main thread).
+// TelephonyServiceThread: runs a TelephonyService on a thread of its own with its own event loop, so a program can embed the service while its main thread blocks on GetTechnology.
 #pragma once
 
 #include "TelephonyService/TelephonyService.h"

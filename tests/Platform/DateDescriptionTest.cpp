@@ -1,4 +1,4 @@
-// Tests for DateDescription: the default date text "YYYY-MM-DD HH:MM:SS +ZZZZ" and local zone facts (DESIGN.md; Parts 3.1, 3.4).
+// Tests for DateDescription: the default date text "YYYY-MM-DD HH:MM:SS +ZZZZ" and the local zone facts, in a zone with a half-hour offset.
 #include "Platform/DateDescription.h"
 
 #include <gtest/gtest.h>

@@ -1,125 +1,77 @@
-// Tests for DiagnosticLogDirectory: the default from XDG_STATE_HOME or HOME, the overrides and creation on demand (DESIGN.md "Diagnostic-log directory").
+// Tests DiagnosticLogDirectory: which of the variable, the override, XDG_STATE_HOME and HOME wins, and creation on demand.
 #include "Platform/DiagnosticLogDirectory.h"
 
-#include <QDir>
 #include <QFile>
-#include <QFileInfo>
 #include <QTemporaryDir>
 #include <gtest/gtest.h>
 
 #include <cstdlib>
 #include <optional>
 #include <string>
+#include <vector>
 
-using namespace vantorel;
-
+namespace vantorel {
 namespace {
+
+using Env = std::optional<std::string>;
 
 // Sets (or, with nullopt, unsets) one environment variable for a scope and restores it.
 class ScopedEnvironment {
 public:
-    ScopedEnvironment(const char* name, std::optional<std::string> value) : name_(name) {
+    ScopedEnvironment(const char* name, Env value) : name_(name) {
         if (const char* old = std::getenv(name)) old_ = old;
-        if (value)
-            setenv(name, value->c_str(), 1);
-        else
-            unsetenv(name);
+        value ? setenv(name, value->c_str(), 1) : unsetenv(name);
     }
-    ~ScopedEnvironment() {
-        if (old_)
-            setenv(name_, old_->c_str(), 1);
-        else
-            unsetenv(name_);
-    }
+    ~ScopedEnvironment() { old_ ? setenv(name_, old_->c_str(), 1) : unsetenv(name_); }
 
 private:
     const char* name_;
-    std::optional<std::string> old_;
+    Env old_;
 };
 
-// Every test starts with neither the variable nor an override.
-class DiagnosticLogDirectoryTest : public ::testing::Test {
-protected:
-    void TearDown() override { DiagnosticLogDirectory::setOverride(""); }
-    ScopedEnvironment noVariable{DiagnosticLogDirectory::kEnvironmentVariable, std::nullopt};
-};
+TEST(DiagnosticLogDirectory, TheFirstUsableSourceWins) {
+    struct Row {
+        Env variable, override_, stateHome, home;
+        std::string path;
+    };
+    const std::vector<Row> rows = {
+        {{}, {}, "/srv/state", "/home/u", "/srv/state/vantorel/DiagnosticLogs"},
+        {{}, {}, "/srv/state//", "/home/u", "/srv/state/vantorel/DiagnosticLogs"},
+        {{}, {}, {}, "/home/u/", "/home/u/.local/state/vantorel/DiagnosticLogs"},
+        {{}, {}, "", "/home/u", "/home/u/.local/state/vantorel/DiagnosticLogs"},
+        {{}, {}, "relative/state", "/home/u", "/home/u/.local/state/vantorel/DiagnosticLogs"},
+        {{}, "/tmp/logs/", "/srv/state", "/home/u", "/tmp/logs"},
+        {"/var/logs/", "/tmp/logs", "/srv/state", "/home/u", "/var/logs"},
+        {"", {}, "/srv/state", "/home/u", "/srv/state/vantorel/DiagnosticLogs"},
+    };
+    for (const Row& row : rows) {
+        ScopedEnvironment variable(DiagnosticLogDirectory::kEnvironmentVariable, row.variable);
+        ScopedEnvironment state("XDG_STATE_HOME", row.stateHome);
+        ScopedEnvironment home("HOME", row.home);
+        DiagnosticLogDirectory::setOverride(row.override_.value_or(""));
+        EXPECT_EQ(DiagnosticLogDirectory::path(), row.path);
+    }
+    DiagnosticLogDirectory::setOverride("");
+}
+
+TEST(DiagnosticLogDirectory, EnsureExistsMakesTheParentsAndFailsUnderAFile) {
+    ScopedEnvironment variable(DiagnosticLogDirectory::kEnvironmentVariable, std::nullopt);
+    QTemporaryDir tmp;
+    QFile(tmp.filePath("plain")).open(QIODevice::WriteOnly);
+    const std::vector<std::pair<QString, std::string>> rows = {  // directory, error ("" for success)
+        {"a/b/logs", ""},
+        {"a/b/logs", ""},  // it exists now
+        {"plain/logs", "cannot create directory " + tmp.filePath("plain/logs").toStdString()},
+        {"plain", "not a directory: " + tmp.filePath("plain").toStdString()},
+    };
+    for (const auto& [dir, why] : rows) {
+        DiagnosticLogDirectory::setOverride(tmp.filePath(dir).toStdString());
+        std::string error;
+        EXPECT_EQ(DiagnosticLogDirectory::ensureExists(&error), why.empty());
+        EXPECT_EQ(error, why);
+    }
+    DiagnosticLogDirectory::setOverride("");
+}
 
 }  // namespace
-
-TEST_F(DiagnosticLogDirectoryTest, DefaultIsUnderXdgStateHome) {
-    ScopedEnvironment state("XDG_STATE_HOME", "/srv/state");
-    EXPECT_EQ(DiagnosticLogDirectory::path(), "/srv/state/vantorel/DiagnosticLogs");
-    EXPECT_EQ(DiagnosticLogDirectory::defaultPath(), "/srv/state/vantorel/DiagnosticLogs");
-}
-
-TEST_F(DiagnosticLogDirectoryTest, TrailingSlashOfXdgStateHomeIsNotDoubled) {
-    ScopedEnvironment state("XDG_STATE_HOME", "/srv/state/");
-    EXPECT_EQ(DiagnosticLogDirectory::path(), "/srv/state/vantorel/DiagnosticLogs");
-}
-
-TEST_F(DiagnosticLogDirectoryTest, WithoutXdgStateHomeTheDefaultIsUnderHomeLocalState) {
-    ScopedEnvironment state("XDG_STATE_HOME", std::nullopt);
-    ScopedEnvironment home("HOME", "/home/tester");
-    EXPECT_EQ(DiagnosticLogDirectory::path(), "/home/tester/.local/state/vantorel/DiagnosticLogs");
-}
-
-TEST_F(DiagnosticLogDirectoryTest, EmptyOrRelativeXdgStateHomeIsIgnoredAsTheXdgRulesSay) {
-    ScopedEnvironment home("HOME", "/home/tester");
-    {
-        ScopedEnvironment state("XDG_STATE_HOME", "");
-        EXPECT_EQ(DiagnosticLogDirectory::path(), "/home/tester/.local/state/vantorel/DiagnosticLogs");
-    }
-    {
-        ScopedEnvironment state("XDG_STATE_HOME", "relative/state");
-        EXPECT_EQ(DiagnosticLogDirectory::path(), "/home/tester/.local/state/vantorel/DiagnosticLogs");
-    }
-}
-
-TEST_F(DiagnosticLogDirectoryTest, OverrideReplacesTheDefaultAndAnEmptyTextRestoresIt) {
-    ScopedEnvironment state("XDG_STATE_HOME", "/srv/state");
-    DiagnosticLogDirectory::setOverride("/tmp/logs/");
-    EXPECT_EQ(DiagnosticLogDirectory::path(), "/tmp/logs");
-    DiagnosticLogDirectory::setOverride("");
-    EXPECT_EQ(DiagnosticLogDirectory::path(), "/srv/state/vantorel/DiagnosticLogs");
-}
-
-TEST_F(DiagnosticLogDirectoryTest, EnvironmentVariableWinsOverTheOverrideAndTheDefault) {
-    ScopedEnvironment state("XDG_STATE_HOME", "/srv/state");
-    DiagnosticLogDirectory::setOverride("/tmp/logs");
-    {
-        ScopedEnvironment variable(DiagnosticLogDirectory::kEnvironmentVariable, "/var/diag");
-        EXPECT_EQ(DiagnosticLogDirectory::path(), "/var/diag");
-    }
-    {
-        ScopedEnvironment empty(DiagnosticLogDirectory::kEnvironmentVariable, "");  // set but empty: ignored
-        EXPECT_EQ(DiagnosticLogDirectory::path(), "/tmp/logs");
-    }
-}
-
-TEST_F(DiagnosticLogDirectoryTest, EnsureExistsCreatesTheDirectoryWithItsParents) {
-    QTemporaryDir tmp;
-    ScopedEnvironment state("XDG_STATE_HOME", tmp.path().toStdString());
-    const QString expected = tmp.path() + "/vantorel/DiagnosticLogs";
-    ASSERT_FALSE(QFileInfo::exists(expected));
-    std::string error = "untouched";
-    EXPECT_TRUE(DiagnosticLogDirectory::ensureExists(&error));
-    EXPECT_TRUE(QFileInfo(expected).isDir());
-    EXPECT_EQ(error, "untouched");
-    EXPECT_TRUE(DiagnosticLogDirectory::ensureExists(nullptr));  // an existing directory is fine
-}
-
-TEST_F(DiagnosticLogDirectoryTest, EnsureExistsFailsWithAReasonUnderARegularFile) {
-    QTemporaryDir tmp;
-    QFile file(tmp.filePath("plain"));
-    ASSERT_TRUE(file.open(QIODevice::WriteOnly));
-    file.close();
-    DiagnosticLogDirectory::setOverride(tmp.filePath("plain/logs").toStdString());
-    std::string error;
-    EXPECT_FALSE(DiagnosticLogDirectory::ensureExists(&error));
-    EXPECT_NE(error.find(tmp.filePath("plain/logs").toStdString()), std::string::npos) << error;
-    EXPECT_FALSE(DiagnosticLogDirectory::ensureExists(nullptr));
-
-    DiagnosticLogDirectory::setOverride(tmp.filePath("plain").toStdString());  // the file itself
-    EXPECT_FALSE(DiagnosticLogDirectory::ensureExists(&error));
-    EXPECT_EQ(error, "not a directory: " + tmp.filePath("plain").toStdString());
-}
+}  // namespace vantorel

@@ -1,30 +1,24 @@
-// ServiceTestSupport: test-side helpers for the telephony service tests: unique port names, waiting on the event loop, in-memory streams and a model-like client.
+// ServiceTestSupport: test-side helpers for the telephony service tests: HDLC frames and DIAG log packets, in-memory streams, start commands and a model-like client.
 #pragma once
 
 #include "Platform/LocalMessagePort.h"
+#include "Platform/RecordBuilder.h"
 #include "Platform/RemoteMessagePort.h"
+#include "Platform/TelephonyIdentifiers.h"
 #include "Platform/TelephonyServiceConnection.h"
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
 #include "PropertyList/PropertyListSerialization.h"
 #include "TelephonyService/Replay/CaptureWriter.h"
+#include "TelephonyService/Replay/HdlcDeframer.h"
 #include "TelephonyService/Replay/RecordedStream.h"
+#include "support/EventLoopWait.h"
 
-#include <QCoreApplication>
-#include <QDeadlineTimer>
-#include <QEventLoop>
-#include <QTimer>
-
-#include <atomic>
-#include <functional>
 #include <initializer_list>
 #include <memory>
 #include <optional>
 #include <string>
 #include <vector>
-
-#include "TelephonyService/ModemBackend.h"
-#include "support/EventLoopWait.h"
 
 namespace vantorel::servicetest {
 
@@ -32,27 +26,47 @@ using vantorel::testing::spin;
 using vantorel::testing::uniquePortName;
 using vantorel::testing::waitUntil;
 
-// Collects what a backend emits: its messages and its state changes, in order.
-struct Collector {
-    std::vector<Bytes> messages;
-    std::vector<ModemBackend::State> states;
-    void attach(ModemBackend& backend) {
-        QObject::connect(&backend, &ModemBackend::messageReady,
-                         [this](int32_t, const Bytes& data) { messages.push_back(data); });
-        QObject::connect(&backend, &ModemBackend::stateChanged, [this](ModemBackend::State s) { states.push_back(s); });
-    }
-};
+inline std::string capturePath(const std::string& name) { return std::string(VANTOREL_CAPTURES_DIR) + "/" + name; }
 
-// An in-memory capture of the messages (times 1 ms apart unless given), as a RecordedStream.
-inline RecordedStream streamOf(const std::vector<Bytes>& messages, const std::string& technology,
-                               int64_t stepMicros = 1000) {
-    Bytes file = CaptureWriter::headerBytes(technology);
-    int64_t time = 1700000000000000;
-    for (const Bytes& m : messages) {
-        const Bytes one = CaptureWriter::messageBytes(time, 0, m);
-        file.insert(file.end(), one.begin(), one.end());
-        time += stepMicros;
+inline void append(Bytes& out, ByteView more) { out.insert(out.end(), more.begin(), more.end()); }
+
+// escape(body + CRC16 LE) + 7E; a non-zero crcXor spoils the CRC on purpose.
+inline Bytes hdlcFrame(ByteView body, uint16_t crcXor = 0) {
+    Bytes raw(body.begin(), body.end());
+    const uint16_t crc = static_cast<uint16_t>(HdlcDeframer::crc16(body) ^ crcXor);
+    raw.push_back(static_cast<uint8_t>(crc));
+    raw.push_back(static_cast<uint8_t>(crc >> 8));
+    Bytes out;
+    for (uint8_t b : raw) {
+        if (b == 0x7E || b == 0x7D) out.push_back(0x7D);
+        out.push_back(b == 0x7E || b == 0x7D ? static_cast<uint8_t>(b ^ 0x20) : b);
     }
+    out.push_back(0x7E);
+    return out;
+}
+
+// The Morvek record of an ordinary log record with that code, time stamp and payload.
+inline Bytes morvekRecord(uint16_t code, uint64_t timeStamp, std::initializer_list<uint8_t> payload) {
+    return RecordBuilder::ordinary(code).timestamp(timeStamp).bytes(13, ByteView(payload.begin(), payload.size())).build();
+}
+
+// A DIAG log packet 10 00 <len> followed by the DLF record (the Morvek record without
+// its type byte), len = 12 + payload.
+inline Bytes logPacketBody(uint16_t code, uint64_t timeStamp, std::initializer_list<uint8_t> payload) {
+    const Bytes morvek = morvekRecord(code, timeStamp, payload);
+    Bytes body{0x10, 0x00};
+    RecordBuilder::put(body, 2, morvek.size() - 1, 2);
+    body.insert(body.end(), morvek.begin() + 1, morvek.end());
+    return body;
+}
+
+// An in-memory UTRAN capture of the messages at the given times in microseconds (1 ms
+// apart when none are given), as a RecordedStream.
+inline RecordedStream streamOf(const std::vector<Bytes>& messages, const std::vector<int64_t>& times = {}) {
+    Bytes file = CaptureWriter::headerBytes(kTSLogChannelTechnology_Morvek_UTRAN2);
+    for (size_t i = 0; i < messages.size(); ++i)
+        append(file, CaptureWriter::messageBytes(times.empty() ? 1700000000000000 + int64_t(i) * 1000 : times[i], 0,
+                                                 messages[i]));
     return RecordedStream::fromBytes(file);
 }
 
@@ -60,20 +74,23 @@ inline Bytes xmlOf(const DictionaryRef& dict) {
     return PropertyListSerialization::write(Value(dict), PropertyListSerialization::Format::XML).value();
 }
 
-inline DictionaryRef startCommand(std::initializer_list<int64_t> ordinary, std::initializer_list<int64_t> extra) {
+// {"SetState": "Streaming"} with the code lists, or with none when withLists is false.
+inline DictionaryRef startCommand(std::initializer_list<int64_t> ordinary, std::initializer_list<int64_t> extra,
+                                  bool withLists = true) {
+    auto dict = Dictionary::create();
+    dict->set("SetState", Value("Streaming"));
+    if (!withLists) return dict;
     auto codes = Array::create();
     for (int64_t c : ordinary) codes->append(Value::integer(c));
     auto extras = Array::create();
     for (int64_t c : extra) extras->append(Value::integer(c));
-    auto dict = Dictionary::create();
-    dict->set("SetState", Value("Streaming"));
     dict->set("SetMorvekLogCodes", Value(codes));
     dict->set("SetTsExtraCodes", Value(extras));
     return dict;
 }
 
-// The model's side of the channel (Parts 2.1, 2.2): a receive port, the service
-// connection, the channel's send port; every message with id 0 is kept.
+// The model's side of a log channel: a receive port, the service connection, the
+// channel's send port; every message with id 0 is kept.
 class TestClient {
 public:
     struct Notification {
@@ -85,12 +102,11 @@ public:
     std::vector<Notification> notifications;
     TelephonyServiceConnection::LogChannelResult channel;
 
-    // Creates the receive port and asks the service for a channel; true when the
-    // channel's port was found. keepConnection: keep the server connection (for
-    // notifications) instead of releasing it as the model does.
+    // True when the channel's port was found. keepConnection: keep the server
+    // connection (for notifications) instead of releasing it as the model does.
     bool connect(const std::string& serviceName, bool keepConnection = false) {
-        recvName_ = uniquePortName("client");
-        recv_ = LocalMessagePort::create(recvName_, [this](int32_t id, const Bytes& data) -> std::optional<Bytes> {
+        const std::string recvName = uniquePortName("client");
+        recv_ = LocalMessagePort::create(recvName, [this](int32_t id, const Bytes& data) -> std::optional<Bytes> {
             if (id == 0) received.push_back(data);
             return std::nullopt;
         });
@@ -98,7 +114,7 @@ public:
         connection_ = TelephonyServiceConnection::open(
             [this](const std::string& name, const Value& info) { notifications.push_back({name, info}); }, serviceName);
         if (!connection_) return false;
-        channel = connection_->createLogChannel(recvName_);
+        channel = connection_->createLogChannel(recvName);
         if (!keepConnection) connection_.reset();
         if (channel.errorCode != 0 || channel.portName.empty()) return false;
         send_ = RemoteMessagePort::lookup(channel.portName);
@@ -121,16 +137,22 @@ public:
         return send_->sendRequest(0, xmlOf(command), 1.0, 0, nullptr) == RemoteMessagePort::Success;
     }
 
-    // Closes both ports, as the model's destroyPorts does.
+    // Closes both ports, as the model does when it lets go of the channel.
     void close() {
         if (recv_) recv_->invalidate();
         if (send_) send_->invalidate();
     }
 
-    const std::string& receivePortName() const { return recvName_; }
+    // The states of the BackendStateChanged notifications heard so far.
+    std::vector<std::string> backendStates() const {
+        std::vector<std::string> states;
+        for (const Notification& n : notifications)
+            if (const DictionaryRef info = n.info.asDictionary(); info && n.name == "BackendStateChanged")
+                states.push_back(info->get("State").asString() ? *info->get("State").asString() : "?");
+        return states;
+    }
 
 private:
-    std::string recvName_;
     std::unique_ptr<LocalMessagePort> recv_;
     std::unique_ptr<TelephonyServiceConnection> connection_;
     std::unique_ptr<RemoteMessagePort> send_;

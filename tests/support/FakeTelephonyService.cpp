@@ -1,4 +1,4 @@
-// FakeTelephonyService: a scriptable telephony service on its own thread for the Part 2.1/2.2 tests.
+// FakeTelephonyService: a scriptable telephony service on its own thread, built from the real message ports.
 #include "support/FakeTelephonyService.h"
 
 #include "Platform/LocalMessagePort.h"
@@ -6,16 +6,12 @@
 #include "PropertyList/Dictionary.h"
 #include "PropertyList/PropertyListSerialization.h"
 
-#include <QCoreApplication>
-#include <QElapsedTimer>
 #include <QMetaObject>
-
-#include <unistd.h>
 
 namespace vantorel::testing {
 
 namespace {
-Bytes xml(const Value& v) { return *PropertyListSerialization::write(v, PropertyListSerialization::Format::XML); }
+Bytes xml(const DictionaryRef& d) { return *PropertyListSerialization::write(Value(d), PropertyListSerialization::Format::XML); }
 }  // namespace
 
 // Lives on the service thread; owns the ports there.
@@ -25,100 +21,60 @@ public:
 
     void start() {
         server_ = LocalMessagePort::create(owner_->name_, [this](int32_t id, const Bytes& data) {
-            return onServerRequest(id, data);
+            return id == 1 ? createLogChannel(data) : std::nullopt;
         });
         // The well-known port outlives its clients' connections.
         if (server_) server_->setStaysValidWithoutPeers(true);
     }
-    void stop() {
-        channels_.clear();
-        clients_.clear();
-        server_.reset();
-    }
 
-    std::optional<Bytes> onServerRequest(int32_t id, const Bytes& data) {
-        if (id != 1) return std::nullopt;
-        auto request = PropertyListSerialization::readDictionary(data);
+    std::optional<Bytes> createLogChannel(const Bytes& data) {
+        const FakeTelephonyService::Behaviour b = owner_->behaviour();
+        const auto request = PropertyListSerialization::readDictionary(data);
+        const std::string* clientPort = request ? request.value->asDictionary()->get("PortName").asString() : nullptr;
         auto reply = Dictionary::create();
-        FakeTelephonyService::Behaviour b;
-        {
-            std::lock_guard<std::mutex> lock(owner_->mutex_);
-            b = owner_->behaviour_;
-        }
-        const std::string clientPort =
-            request && request.value->asDictionary()->get("PortName").asString()
-                ? *request.value->asDictionary()->get("PortName").asString()
-                : "";
-        if (b.channelErrorCode != 0 || clientPort.empty()) {
+        if (b.channelErrorCode != 0 || !clientPort || clientPort->empty()) {
             reply->set("ErrorDomain", Value::integer(1));
             reply->set("ErrorCode", Value::integer(b.channelErrorCode ? b.channelErrorCode : 1));
             reply->set("PortName", "");
-            return xml(Value(reply));
+            return xml(reply);
         }
-        const int n = ++owner_->channels_;
-        const std::string channelName = owner_->name_ + ".channel." + std::to_string(n);
-        auto channel = LocalMessagePort::create(channelName, [this](int32_t cid, const Bytes& cdata) {
-            return onChannelCommand(cid, cdata);
-        });
-        clients_.push_back(RemoteMessagePort::lookup(clientPort, 1000));
+        const std::string channelName = owner_->name_ + ".channel." + std::to_string(++owner_->channels_);
+        channels_.push_back(LocalMessagePort::create(channelName, [this](int32_t, const Bytes& c) { return command(c); }));
+        clients_.push_back(RemoteMessagePort::lookup(*clientPort, 1000));
         {
             std::lock_guard<std::mutex> lock(owner_->mutex_);
-            owner_->clientPorts_.push_back(clientPort);
+            owner_->clientPorts_.push_back(*clientPort);
         }
-        channels_.push_back(std::move(channel));
         reply->set("ErrorDomain", Value::integer(0));
         reply->set("ErrorCode", Value::integer(0));
         reply->set("PortName", b.emptyPortName ? "" : channelName);
-        return xml(Value(reply));
+        return xml(reply);
     }
 
-    std::optional<Bytes> onChannelCommand(int32_t, const Bytes& data) {
-        auto parsed = PropertyListSerialization::readDictionary(data);
+    std::optional<Bytes> command(const Bytes& data) {
+        const auto parsed = PropertyListSerialization::readDictionary(data);
         if (!parsed) return std::nullopt;
-        DictionaryRef command = parsed.value->asDictionary();
-        if (command->contains("GetTechnology")) {
-            ++owner_->queries_;
-            FakeTelephonyService::Behaviour b;
-            {
-                std::lock_guard<std::mutex> lock(owner_->mutex_);
-                b = owner_->behaviour_;
-            }
-            if (!b.answerGetTechnology) {
-                QThread::msleep(1500);  // longer than any receive timeout in the tests
-                return std::nullopt;
-            }
-            if (!b.answerWithPlist) {
-                const std::string text = "not a property list";
-                return Bytes(text.begin(), text.end());
-            }
-            auto answer = Dictionary::create();
-            if (b.answerHasTechnology) answer->set("GetTechnology", b.technology);
-            else answer->set("Something", "else");
-            return xml(Value(answer));
+        const DictionaryRef command = parsed.value->asDictionary();
+        if (!command->contains("GetTechnology")) {
+            std::lock_guard<std::mutex> lock(owner_->mutex_);
+            owner_->startCommands_.push_back(Value(command));
+            return std::nullopt;
         }
-        std::lock_guard<std::mutex> lock(owner_->mutex_);
-        owner_->startCommands_.push_back(Value(command));
-        return std::nullopt;
+        ++owner_->queries_;
+        const FakeTelephonyService::Behaviour b = owner_->behaviour();
+        if (!b.answerGetTechnology) {
+            QThread::msleep(1500);  // longer than any receive timeout in the tests
+            return std::nullopt;
+        }
+        if (!b.answerWithPlist) return Bytes{'n', 'o', 't', ' ', 'a', ' ', 'p', 'l', 'i', 's', 't'};
+        auto answer = Dictionary::create();
+        answer->set(b.answerHasTechnology ? "GetTechnology" : "Something", b.answerHasTechnology ? b.technology : "else");
+        return xml(answer);
     }
 
-    bool send(const Bytes& data, int32_t id) {
-        if (clients_.empty() || !clients_.back() || !clients_.back()->isValid()) return false;
-        return clients_.back()->post(id, data);
-    }
-    void closeChannelPort() {
-        if (!channels_.empty() && channels_.back()) channels_.back()->invalidate();
-    }
-    void dropClient() {
-        if (!clients_.empty() && clients_.back()) clients_.back()->invalidate();
-    }
-    void notify(const std::string& name) {
-        auto info = Dictionary::create();
-        info->set("State", "Streaming");
-        auto n = Dictionary::create();
-        n->set("Name", name);
-        n->set("Info", Value(info));
-        if (server_) server_->broadcastNotification(0, xml(Value(n)));
-    }
+    LocalMessagePort* lastChannel() { return channels_.empty() ? nullptr : channels_.back().get(); }
+    RemoteMessagePort* lastClient() { return clients_.empty() ? nullptr : clients_.back().get(); }
+    LocalMessagePort* server() { return server_.get(); }
 
 private:
     FakeTelephonyService* owner_;
@@ -132,13 +88,22 @@ FakeTelephonyService::FakeTelephonyService(Behaviour behaviour)
     worker_ = new FakeServiceWorker(this);
     worker_->moveToThread(&thread_);
     thread_.start();
-    QMetaObject::invokeMethod(worker_, [this] { worker_->start(); }, Qt::BlockingQueuedConnection);
+    onServiceThread([](FakeServiceWorker& w) { w.start(); });
 }
 
 FakeTelephonyService::~FakeTelephonyService() {
-    QMetaObject::invokeMethod(worker_, [this] { worker_->stop(); delete worker_; }, Qt::BlockingQueuedConnection);
+    onServiceThread([](FakeServiceWorker& worker) { delete &worker; });
     thread_.quit();
     thread_.wait();
+}
+
+void FakeTelephonyService::onServiceThread(const std::function<void(FakeServiceWorker&)>& fn) {
+    QMetaObject::invokeMethod(worker_, [&] { fn(*worker_); }, Qt::BlockingQueuedConnection);
+}
+
+FakeTelephonyService::Behaviour FakeTelephonyService::behaviour() const {
+    std::lock_guard<std::mutex> lock(mutex_);
+    return behaviour_;
 }
 
 void FakeTelephonyService::setBehaviour(const Behaviour& behaviour) {
@@ -148,20 +113,25 @@ void FakeTelephonyService::setBehaviour(const Behaviour& behaviour) {
 
 bool FakeTelephonyService::send(const Bytes& data, int32_t messageId) {
     bool ok = false;
-    QMetaObject::invokeMethod(worker_, [&] { ok = worker_->send(data, messageId); }, Qt::BlockingQueuedConnection);
+    onServiceThread([&](FakeServiceWorker& w) { ok = w.lastClient() && w.lastClient()->isValid() && w.lastClient()->post(messageId, data); });
     return ok;
 }
 
 void FakeTelephonyService::closeChannelPort() {
-    QMetaObject::invokeMethod(worker_, [this] { worker_->closeChannelPort(); }, Qt::BlockingQueuedConnection);
+    onServiceThread([](FakeServiceWorker& w) { if (w.lastChannel()) w.lastChannel()->invalidate(); });
 }
 
 void FakeTelephonyService::dropClient() {
-    QMetaObject::invokeMethod(worker_, [this] { worker_->dropClient(); }, Qt::BlockingQueuedConnection);
+    onServiceThread([](FakeServiceWorker& w) { if (w.lastClient()) w.lastClient()->invalidate(); });
 }
 
 void FakeTelephonyService::notify(const std::string& name) {
-    QMetaObject::invokeMethod(worker_, [this, name] { worker_->notify(name); }, Qt::BlockingQueuedConnection);
+    auto info = Dictionary::create();
+    info->set("State", "Streaming");
+    auto notification = Dictionary::create();
+    notification->set("Name", name);
+    notification->set("Info", Value(info));
+    onServiceThread([&](FakeServiceWorker& w) { if (w.server()) w.server()->broadcastNotification(0, xml(notification)); });
 }
 
 std::vector<Value> FakeTelephonyService::startCommands() const {

@@ -1,4 +1,4 @@
-// FakeTelephonyService: a telephony service for the model's tests (Parts 2.1, 2.2), built from the real message ports on its own thread, whose answers a test can change.
+// FakeTelephonyService: a telephony service for the model's tests, built from the real message ports on its own thread, whose answers a test can change.
 #pragma once
 
 #include "Platform/TelephonyIdentifiers.h"
@@ -8,6 +8,7 @@
 #include <QThread>
 
 #include <atomic>
+#include <functional>
 #include <memory>
 #include <mutex>
 #include <string>
@@ -54,6 +55,10 @@ public:
 
 private:
     friend class FakeServiceWorker;
+    Behaviour behaviour() const;
+    // Runs fn on the service thread and waits for it.
+    void onServiceThread(const std::function<void(FakeServiceWorker&)>& fn);
+
     std::string name_;
     QThread thread_;
     FakeServiceWorker* worker_ = nullptr;

@@ -1,4 +1,4 @@
-// TestSections: a test-only class index with two small sections (Part 3.3) that the Part 3.2 tests route built records to.
+// TestSections: a test-only class index with two small sections that the decoder framework's tests route built records to.
 #pragma once
 
 #include "LogGenerator/Base.h"

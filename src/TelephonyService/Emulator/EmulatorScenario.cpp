@@ -1,4 +1,4 @@
-// EmulatorScenario: the abstract synthetic modem the emulator backend runs (DESIGN.md "The telephony service"; records of Part 3.2).
+// EmulatorScenario: the seeded random sequence and time stamps shared by the emulator's synthetic modems.
 #include "TelephonyService/Emulator/EmulatorScenario.h"
 
 namespace vantorel {

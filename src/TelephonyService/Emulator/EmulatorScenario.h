@@ -1,4 +1,4 @@
-// EmulatorScenario: the abstract synthetic modem that the emulator backend runs on a clock, one subclass per technology (DESIGN.md "The telephony service"; records of Part 3.2).
+// EmulatorScenario: the abstract synthetic modem that the emulator backend runs on a clock, one subclass per technology.
 #pragma once
 
 #include "PropertyList/Value.h"

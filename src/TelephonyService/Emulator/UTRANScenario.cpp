@@ -1,6 +1,7 @@
-// UTRANScenario: the emulator's TD-SCDMA modem, records laid out as Part 7.2 reads them (extras: Parts 5.2, 5.6, 7.2).
+// UTRANScenario: the emulator's TD-SCDMA modem, its cell evolving tick by tick, sent in the byte layouts the UTRAN decoders read.
 #include "TelephonyService/Emulator/UTRANScenario.h"
 
+#include "Platform/LogCodes.h"
 #include "Platform/RecordBuilder.h"
 #include "Platform/StringFormat.h"
 #include "Platform/TelephonyIdentifiers.h"
@@ -354,7 +355,7 @@ std::vector<Bytes> UTRANScenario::step() {
 // ---- records -----------------------------------------------------------------
 
 Bytes UTRANScenario::rrcStateRecord(uint64_t tick, bool valid) const {
-    return RecordBuilder::ordinary(kLogCodeRRCState, 15)
+    return RecordBuilder::ordinary(LogCode::kUTRANRRCState, 15)
         .timestamp(timestampForTick(tick))
         .u8(13, valid ? 1 : 0)  // 13: validity flag; the mode counts only when it is 1
         .u8(14, rrc_)           // 14: RRC mode (0 Disconnected ... 5 Cell URA PCH)
@@ -364,7 +365,7 @@ Bytes UTRANScenario::rrcStateRecord(uint64_t tick, bool valid) const {
 Bytes UTRANScenario::servingCellRecord(uint64_t tick) {
     // Now and then the cell restricts access (access class barring): emergency calls only.
     bool restricted = chance(5);
-    return RecordBuilder::ordinary(kLogCodeServingCell, 26)
+    return RecordBuilder::ordinary(LogCode::kUTRANServingCell, 26)
         .timestamp(timestampForTick(tick))
         .u8(14, restricted ? 1 : 0)                            // 14: cell access restrictions
         .u8(15, uraId_)                                        // 15: URA ID
@@ -382,7 +383,7 @@ Bytes UTRANScenario::neighbourListRecord(uint64_t tick, bool withPrefix) const {
         if (c.present) cells.push_back(&c);
     }
     const size_t n = cells.size();
-    RecordBuilder b = RecordBuilder::ordinary(kLogCodeNeighbourList, 168 + 16 * n);
+    RecordBuilder b = RecordBuilder::ordinary(LogCode::kUTRANNeighbourList, 168 + 16 * n);
     b.timestamp(timestampForTick(tick));
     // 16: bits 1-7 the entry count; bit 0 is another flag (toggled so the shift is exercised).
     b.u8(16, static_cast<uint8_t>((n << 1) | (tick & 1)));
@@ -410,7 +411,7 @@ Bytes UTRANScenario::gsmNeighbourListRecord(uint64_t tick) const {
     for (const GSMCell& g : gsmCells_) {
         if (g.present) cells.push_back(&g);
     }
-    RecordBuilder b = RecordBuilder::ordinary(kLogCodeGSMNeighbourList, 17 + 8 * cells.size());
+    RecordBuilder b = RecordBuilder::ordinary(LogCode::kUTRANGSMNeighbourList, 17 + 8 * cells.size());
     b.timestamp(timestampForTick(tick));
     b.u8(16, static_cast<uint8_t>(cells.size()));  // 16: entry count
     for (size_t i = 0; i < cells.size(); ++i) {
@@ -443,8 +444,8 @@ Bytes UTRANScenario::blerSIRRecord(uint64_t tick) {
     }
     const size_t t = trchs_.size();
     const size_t c = cctrchTimeslots_.size();
-    // The CCTRCH entries start at 289 + 34*t (Part 7.2's factor 34, not 2), beyond the TRCH entries.
-    RecordBuilder b = RecordBuilder::ordinary(kLogCodeBLERSIR, 289 + 34 * t + 8 * c);
+    // The CCTRCH entries start at 289 + 34*t (the decoder's stride of 34 per TRCH, kept as the modem's tool reads it), beyond the TRCH entries.
+    RecordBuilder b = RecordBuilder::ordinary(LogCode::kUTRANBLERAndSIR, 289 + 34 * t + 8 * c);
     b.timestamp(timestampForTick(tick));
     // 14-15 as one 16-bit value: bits 6-11 TRCH count t, bits 12-15 (byte 15 bits 4-7) CCTRCH count c.
     b.u16(14, static_cast<uint16_t>(((t & 0x3F) << 6) | ((c & 0x0F) << 12)));
@@ -466,7 +467,7 @@ Bytes UTRANScenario::blerSIRRecord(uint64_t tick) {
 }
 
 Bytes UTRANScenario::simFilesRecord(bool binary) const {
-    // Part 5.6's SIM files, as hex or text strings the way the service reads them.
+    // The SIM's elementary files, as hex or text strings the way the service reads them.
     // BCD PLMN 460-00 is 64 F0 00; LAI = PLMN + LAC.
     const std::string lai = StringFormat::format("64F000%04X", static_cast<unsigned>(kLAC));
     auto sim = Dictionary::create();
@@ -479,7 +480,7 @@ Bytes UTRANScenario::simFilesRecord(bool binary) const {
     sim->set("kSimFile_AD", "00000002");                                 // normal operation, 2-digit MNC
     sim->set("kSimFile_FPLMN", "64F01064F030FFFFFFFFFFFF");              // 460-01, 460-03 forbidden
     sim->set("kSimFile_AHPLMN", "64F000");
-    return RecordBuilder::extraPropertyList(kExtraSimFiles, Value(sim), binary);
+    return RecordBuilder::extraPropertyList(LogCode::kSimFiles, Value(sim), binary);
 }
 
 Bytes UTRANScenario::cellMonitorRecord(bool binary) const {
@@ -533,11 +534,11 @@ Bytes UTRANScenario::cellMonitorRecord(bool binary) const {
         g->set(kTSCellMonitorRSSI, Value::integer(best->rssi));
         cells->append(Value(g));
     }
-    return RecordBuilder::extraPropertyList(kExtraCellMonitor, Value(cells), binary);
+    return RecordBuilder::extraPropertyList(LogCode::kCellMonitor, Value(cells), binary);
 }
 
 Bytes UTRANScenario::pdpContextsRecord(bool binary) const {
-    // Part 5.2's PDP list: each dictionary is shown as sent, so every value is a display string.
+    // The PDP context list: each dictionary is shown as sent, so every value is a display string.
     auto contexts = Array::create();
     for (const PDPContext& p : pdp_) {
         if (&p != &pdp_[0] && !p.active) continue;  // the WAP context only while it exists
@@ -549,17 +550,17 @@ Bytes UTRANScenario::pdpContextsRecord(bool binary) const {
         d->set("State", p.active ? "Active" : "Inactive");
         contexts->append(Value(d));
     }
-    return RecordBuilder::extraPropertyList(kExtraPDPContexts, Value(contexts), binary);
+    return RecordBuilder::extraPropertyList(LogCode::kPDPContexts, Value(contexts), binary);
 }
 
 Bytes UTRANScenario::malformedRecord(uint64_t tick) const {
     switch ((tick / 25) % 3) {
     case 0:
         // Cut inside the header: 9 bytes, shorter than the 13-byte header.
-        return RecordBuilder::ordinary(kLogCodeRRCState, 15).timestamp(timestampForTick(tick)).resize(9).build();
+        return RecordBuilder::ordinary(LogCode::kUTRANRRCState, 15).timestamp(timestampForTick(tick)).resize(9).build();
     case 1:
         // A serving-cell record with record type 2, neither ordinary (1) nor extra (255).
-        return RecordBuilder(2, kLogCodeServingCell, 26)
+        return RecordBuilder(2, LogCode::kUTRANServingCell, 26)
             .timestamp(timestampForTick(tick))
             .u16(17, serving_.uarfcn)
             .u16(19, serving_.uarfcn)
@@ -570,7 +571,7 @@ Bytes UTRANScenario::malformedRecord(uint64_t tick) const {
         static constexpr std::string_view kCut =
             "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<plist version=\"1.0\">\n<dict>\n\t<key>kSimFile_ICCID</key>\n\t<str";
         Bytes payload(kCut.begin(), kCut.end());
-        return RecordBuilder::extra(kExtraSimFiles)
+        return RecordBuilder::extra(LogCode::kSimFiles)
             .timestamp(timestampForTick(tick))
             .bytes(RecordBuilder::kHeaderLength, ByteView(payload))
             .build();

@@ -1,4 +1,4 @@
-// UTRANScenario: the emulator's TD-SCDMA (UTRAN2) modem, a China Mobile-like cell over time, in the record layouts of Part 7.2 (extras of Parts 5.2, 5.6, 7.2).
+// UTRANScenario: the emulator's TD-SCDMA (UTRAN2) modem, a China Mobile-like cell over time, in the record layouts the UTRAN decoders read.
 #pragma once
 
 #include "TelephonyService/Emulator/EmulatorScenario.h"
@@ -30,16 +30,7 @@ namespace vantorel {
 // the seed and n.
 class UTRANScenario : public EmulatorScenario {
 public:
-    static constexpr uint16_t kLogCodeNeighbourList = 0xD00A;
-    static constexpr uint16_t kLogCodeBLERSIR = 0xD00C;
-    static constexpr uint16_t kLogCodeGSMNeighbourList = 0xD00E;
-    static constexpr uint16_t kLogCodeRRCState = 0xD0E0;
-    static constexpr uint16_t kLogCodeServingCell = 0xD0E2;
-    static constexpr uint16_t kExtraSimFiles = 0x0000;     // effective 0xFF0000
-    static constexpr uint16_t kExtraCellMonitor = 0x0001;  // effective 0xFF0001
-    static constexpr uint16_t kExtraPDPContexts = 0x0002;  // effective 0xFF0002
-
-    // RRC modes of 0xD0E0 byte 14 (Part 7.2).
+    // RRC modes of 0xD0E0 byte 14.
     enum RRCMode : uint8_t {
         kDisconnected = 0,
         kConnecting = 1,

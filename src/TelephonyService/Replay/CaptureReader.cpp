@@ -1,4 +1,4 @@
-// CaptureReader: capture files (docs/capture-format.md) into messages with times and a RecordedLog-style report (DESIGN.md "The telephony service", Replay/).
+// CaptureReader: capture files (docs/capture-format.md) into messages with times and a RecordedLog-style report.
 #include "TelephonyService/Replay/CaptureReader.h"
 
 #include "Platform/ByteReader.h"
@@ -32,57 +32,56 @@ Capture CaptureReader::readBytes(ByteView data) {
         report.error = "not a Vantorel capture (no \"VNTRLCAP\" at the start)";
         return capture;
     }
-    const std::optional<uint32_t> version = r.u32(8);
-    const std::optional<uint32_t> techLength = r.u32(12);
-    if (!version || !techLength) {
+    if (!r.has(0, CaptureWriter::kFileHeaderLength)) {
         report.error = "capture header cut short";
         return capture;
     }
-    if (*version != CaptureWriter::kFormatVersion) {
-        report.error = StringFormat::format("unsupported capture format version %u (this reader knows %u)", *version,
+    const uint32_t version = r.u32(8).value_or(0);
+    const uint32_t techLength = r.u32(12).value_or(0);
+    if (version != CaptureWriter::kFormatVersion) {
+        report.error = StringFormat::format("unsupported capture format version %u (this reader knows %u)", version,
                                             CaptureWriter::kFormatVersion);
         return capture;
     }
-    const std::optional<ByteView> tech = r.slice(CaptureWriter::kFileHeaderLength, *techLength);
-    if (!tech) {
+    if (!r.has(CaptureWriter::kFileHeaderLength, techLength)) {
         report.error = StringFormat::format("capture header cut short: technology of %u bytes runs past the end",
-                                            *techLength);
+                                            techLength);
         return capture;
     }
-    capture.version = *version;
-    capture.technology.assign(tech->begin(), tech->end());
+    const ByteView tech = r.slice(CaptureWriter::kFileHeaderLength, techLength).value_or(ByteView{});
+    capture.version = version;
+    capture.technology.assign(tech.begin(), tech.end());
 
-    size_t offset = CaptureWriter::kFileHeaderLength + tech->size();
+    // Each message is read through its own reader, at offsets from the message's start.
+    size_t offset = CaptureWriter::kFileHeaderLength + techLength;
     while (offset < r.size()) {
-        const std::optional<uint64_t> time = r.u64(offset);
-        const std::optional<uint32_t> id = r.u32(offset + 8);
-        const std::optional<uint32_t> length = r.u32(offset + 12);
-        ByteView body;
-        bool whole = time && id && length;
-        if (whole) {
-            const std::optional<ByteView> slice = r.slice(offset + CaptureWriter::kMessageHeaderLength, *length);
-            whole = slice.has_value();
-            if (whole) body = *slice;
-        }
-        if (!whole) {
+        const ByteReader entry(r.from(offset));
+        if (!entry.has(0, CaptureWriter::kMessageHeaderLength)) {
             ++report.truncated;
             report.addProblem(offset, "truncated message",
-                              length ? StringFormat::format("%u bytes of data announced, %zu bytes left in the file",
-                                                            *length, r.size() - offset - CaptureWriter::kMessageHeaderLength)
-                                     : StringFormat::format("%zu bytes left, less than a message header",
-                                                            r.size() - offset));
+                              StringFormat::format("%zu bytes left, less than a message header", entry.size()));
             break;
         }
-        TimedMessage message{static_cast<int64_t>(*time), static_cast<int32_t>(*id), Bytes(body.begin(), body.end())};
+        const uint32_t length = entry.u32(12).value_or(0);
+        if (!entry.has(CaptureWriter::kMessageHeaderLength, length)) {
+            ++report.truncated;
+            report.addProblem(offset, "truncated message",
+                              StringFormat::format("%u bytes of data announced, %zu bytes left in the file", length,
+                                                   entry.size() - CaptureWriter::kMessageHeaderLength));
+            break;
+        }
+        const ByteView body = entry.slice(CaptureWriter::kMessageHeaderLength, length).value_or(ByteView{});
+        TimedMessage message{static_cast<int64_t>(entry.u64(0).value_or(0)),
+                             static_cast<int32_t>(entry.u32(8).value_or(0)), Bytes(body.begin(), body.end())};
         const auto c = LogMask::classify(message.data);
-        if (c && c->type == LogMask::kOrdinaryType) {
+        if (c && c->isOrdinary()) {
             ++report.logPackets;
             ++report.codeCounts[c->code];
         } else {
             ++report.otherPackets;
         }
         capture.messages.push_back(std::move(message));
-        offset += CaptureWriter::kMessageHeaderLength + *length;
+        offset += CaptureWriter::kMessageHeaderLength + length;
     }
     return capture;
 }

@@ -1,4 +1,4 @@
-// CaptureReader: reads a Vantorel capture file back into its technology and its messages with their arrival times (docs/capture-format.md; DESIGN.md "The telephony service", Replay/).
+// CaptureReader: reads a Vantorel capture file back into its technology and its messages with their arrival times (docs/capture-format.md).
 #pragma once
 
 #include "PropertyList/Value.h"

@@ -1,4 +1,4 @@
-// CaptureWriter: the capture file writer behind the service's --record option (docs/capture-format.md; DESIGN.md "The telephony service").
+// CaptureWriter: the capture file writer behind the service's --record option (docs/capture-format.md).
 #include "TelephonyService/Replay/CaptureWriter.h"
 
 #include "Platform/RecordBuilder.h"
@@ -35,9 +35,7 @@ CaptureWriter::~CaptureWriter() {
 }
 
 bool CaptureWriter::write(int64_t timeMicros, int32_t messageId, ByteView data) {
-    if (!writeAll(messageBytes(timeMicros, messageId, data))) return false;
-    ++messages_;
-    return true;
+    return writeAll(messageBytes(timeMicros, messageId, data));
 }
 
 bool CaptureWriter::flush() {

@@ -1,4 +1,4 @@
-// CaptureWriter: writes Vantorel capture files, every message as the service sent it (docs/capture-format.md; DESIGN.md "The telephony service", Replay/).
+// CaptureWriter: writes Vantorel capture files, every message as the service sent it (docs/capture-format.md).
 #pragma once
 
 #include "PropertyList/Value.h"
@@ -44,7 +44,6 @@ public:
     bool flush();
 
     const std::string& path() const { return path_; }
-    uint64_t messagesWritten() const { return messages_; }
     const std::string& error() const { return error_; }
 
     // The bytes of the file header and of one message (also for tests and in-memory captures).
@@ -59,7 +58,6 @@ private:
 
     std::string path_;
     std::unique_ptr<QFile> file_;
-    uint64_t messages_ = 0;
     std::string error_;
 };
 

@@ -1,69 +1,68 @@
-// DiagPacket: classifies one deframed DIAG body and splits a log packet into the DLF record the decoders read (DESIGN.md "The telephony service", Replay/).
+// DiagPacket: classifies one deframed DIAG body and splits a log packet into the DLF record the decoders read.
 #include "TelephonyService/Replay/DiagPacket.h"
 
 #include "Platform/ByteReader.h"
+#include "Platform/LogCodes.h"
 #include "Platform/StringFormat.h"
 
 namespace vantorel {
 
 DiagPacket::DiagPacket(ByteView body) : inner_(body) {
-    ByteReader outer(body);
+    const ByteReader outer(body);
     // Dual-SIM phones wrap a body in 98 01 00 00 <subscription id u32>. Only that exact
     // prefix is a wrapper; any other 0x98 body is some command response.
-    if (outer.u8(0) == kMultiSimCommand && outer.u8(1) == 0x01 && outer.u8(2) == 0x00 && outer.u8(3) == 0x00) {
-        auto id = outer.u32(4);
-        if (!id) {
+    const bool wrapped = outer.has(0, 4) && outer.u32(0).value_or(0) == kMultiSimPrefix;
+    if (wrapped) {
+        if (!outer.has(0, kMultiSimWrapperLength)) {
             kind_ = Kind::Malformed;
             error_ = StringFormat::format("dual-SIM wrapper cut short: %zu of %zu bytes", body.size(),
                                           kMultiSimWrapperLength);
             return;
         }
-        subscriptionId_ = *id;
+        subscriptionId_ = outer.u32(4).value_or(0);
         inner_ = outer.from(kMultiSimWrapperLength);
     }
-    if (ByteReader(inner_).u8(0) == kLogCommand) parseLogPacket();
+    if (command() == kLogCommand) parseLogPacket();
 }
 
 void DiagPacket::parseLogPacket() {
     // Offsets in the inner body:
     //   0 cmd 0x10 | 1 more | 2..3 outer len | 4..5 inner len | 6..7 log code | 8..15 time stamp | 16.. payload
-    ByteReader r(inner_);
+    const ByteReader r(inner_);
     kind_ = Kind::Malformed;
-    const auto outerLength = r.u16(2);
-    const auto innerLength = r.u16(4);
-    const auto code = r.u16(6);
-    const auto stamp = r.u64(8);
-    if (!outerLength || !innerLength || !code || !stamp) {
+    if (!r.has(0, kCommandHeaderLength + kLogHeaderLength)) {
         error_ = StringFormat::format("log packet of %zu bytes, shorter than its %zu-byte header", inner_.size(),
                                       kCommandHeaderLength + kLogHeaderLength);
         return;
     }
-    if (*outerLength != *innerLength) {
-        error_ = StringFormat::format("log packet lengths differ: outer %u, inner %u", unsigned(*outerLength),
-                                      unsigned(*innerLength));
+    const uint16_t outerLength = r.u16(2).value_or(0);
+    const uint16_t innerLength = r.u16(4).value_or(0);
+    if (outerLength != innerLength) {
+        error_ = StringFormat::format("log packet lengths differ: outer %u, inner %u", unsigned(outerLength),
+                                      unsigned(innerLength));
         return;
     }
-    if (*innerLength < kLogHeaderLength) {
-        error_ = StringFormat::format("log packet length %u is below the %zu-byte log header", unsigned(*innerLength),
+    if (innerLength < kLogHeaderLength) {
+        error_ = StringFormat::format("log packet length %u is below the %zu-byte log header", unsigned(innerLength),
                                       kLogHeaderLength);
         return;
     }
     const size_t available = inner_.size() - kCommandHeaderLength;
-    if (*innerLength > available) {
+    if (innerLength > available) {
         error_ = StringFormat::format("log packet length %u runs past the body (%zu bytes after the command header)",
-                                      unsigned(*innerLength), available);
+                                      unsigned(innerLength), available);
         return;
     }
-    if (*innerLength < available) {
+    if (innerLength < available) {
         // A modem's log packet always ends with its record; extra bytes mean the body
         // is not what its header says.
         error_ = StringFormat::format("log packet length %u leaves %zu bytes over at the end of the body",
-                                      unsigned(*innerLength), available - *innerLength);
+                                      unsigned(innerLength), available - innerLength);
         return;
     }
     kind_ = Kind::LogPacket;
-    logCode_ = *code;
-    timeStamp_ = *stamp;
+    logCode_ = r.u16(6).value_or(0);
+    timeStamp_ = r.u64(8).value_or(0);
     dlfRecord_ = r.from(kCommandHeaderLength);
     payload_ = r.from(kCommandHeaderLength + kLogHeaderLength);
 }
@@ -80,7 +79,7 @@ Bytes DiagPacket::morvekRecord() const {
 Bytes DiagPacket::morvekRecordFromDlf(ByteView dlfRecord) {
     Bytes record;
     record.reserve(1 + dlfRecord.size());
-    record.push_back(kMorvekOrdinaryType);
+    record.push_back(LogCode::kOrdinaryType);
     record.insert(record.end(), dlfRecord.begin(), dlfRecord.end());
     return record;
 }

@@ -1,4 +1,4 @@
-// DiagPacket: one deframed DIAG body, classified and, for a log packet, split into code, time stamp and payload (DESIGN.md "The telephony service", Replay/; Part 3.2 record header).
+// DiagPacket: one deframed DIAG body, classified and, for a log packet, split into code, time stamp and payload.
 #pragma once
 
 #include "PropertyList/Value.h"
@@ -26,12 +26,11 @@ public:
     };
 
     static constexpr uint8_t kLogCommand = 0x10;
-    static constexpr uint8_t kMultiSimCommand = 0x98;
+    // The wrapper's first four bytes 98 01 00 00, read as a little-endian u32.
+    static constexpr uint32_t kMultiSimPrefix = 0x00000198;
     static constexpr size_t kMultiSimWrapperLength = 8;
     static constexpr size_t kCommandHeaderLength = 4;  // 10 <more> <len>
     static constexpr size_t kLogHeaderLength = 12;     // <len> <code> <time stamp>
-    // Morvek-channel record type of an ordinary log record (Part 3.2).
-    static constexpr uint8_t kMorvekOrdinaryType = 1;
 
     explicit DiagPacket(ByteView body);
     // The packet keeps views into its body: a temporary buffer would dangle.
@@ -44,8 +43,6 @@ public:
 
     // The subscription id of a dual-SIM wrapper, when the body had one.
     std::optional<uint32_t> subscriptionId() const { return subscriptionId_; }
-    // The body without the dual-SIM wrapper.
-    ByteView innerBody() const { return inner_; }
     // First byte of the inner body (the DIAG command code), empty for an empty body.
     std::optional<uint8_t> command() const;
 
@@ -53,12 +50,10 @@ public:
     uint16_t logCode() const { return logCode_; }
     uint64_t timeStamp() const { return timeStamp_; }
     ByteView payload() const { return payload_; }
-    // <len> <code> <time stamp> <payload>: the inner body after its first 4 bytes.
-    ByteView dlfRecord() const { return dlfRecord_; }
     // The Morvek-channel record the decoders read: type byte 1 + the DLF record;
     // empty unless isLogPacket().
     Bytes morvekRecord() const;
-    // Type byte 1 + dlfRecord: the Morvek record of any DLF record (DlfReader uses it too).
+    // Type byte 1 + a DLF record <len> <code> <time stamp> <payload>: the Morvek record of any DLF record (DlfReader uses it too).
     static Bytes morvekRecordFromDlf(ByteView dlfRecord);
 
     // A DIAG time stamp as microseconds since 1970-01-01 00:00:00 UTC: the upper 48 bits
@@ -78,7 +73,7 @@ private:
     uint16_t logCode_ = 0;
     uint64_t timeStamp_ = 0;
     ByteView payload_;
-    ByteView dlfRecord_;
+    ByteView dlfRecord_;  // <len> <code> <time stamp> <payload>: the inner body after its first 4 bytes
 };
 
 }  // namespace vantorel

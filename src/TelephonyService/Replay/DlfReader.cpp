@@ -1,4 +1,4 @@
-// DlfReader: QXDM DLF records (Part 3.4) into a RecordedLog of Morvek records (DESIGN.md "The telephony service", Replay/).
+// DlfReader: QXDM DLF records into a RecordedLog of Morvek records.
 #include "TelephonyService/Replay/DlfReader.h"
 
 #include "Platform/ByteReader.h"
@@ -16,34 +16,34 @@ RecordedLog DlfReader::readFile(const std::string& path) {
 
 RecordedLog DlfReader::readBytes(ByteView data) {
     RecordedLog log;
-    ByteReader r(data);
+    const ByteReader r(data);
     size_t offset = 0;
     while (offset < r.size()) {
-        const auto length = r.u16(offset);
-        if (!length) {
+        if (!r.has(offset, 2)) {
             ++log.truncated;
             log.addProblem(offset, "truncated record", "1 byte left, too short for a record length");
             break;
         }
-        if (*length < kRecordHeaderLength) {
+        const uint16_t length = r.u16(offset).value_or(0);
+        if (length < kRecordHeaderLength) {
             ++log.malformed;
             log.addProblem(offset, "malformed record",
-                           StringFormat::format("length %u is below the %zu-byte record header", unsigned(*length),
+                           StringFormat::format("length %u is below the %zu-byte record header", unsigned(length),
                                                 kRecordHeaderLength));
             break;
         }
-        const auto record = r.slice(offset, *length);
-        if (!record) {
+        if (!r.has(offset, length)) {
             ++log.truncated;
             log.addProblem(offset, "truncated record",
                            StringFormat::format("length %u runs past the end of the file (%zu bytes left)",
-                                                unsigned(*length), r.size() - offset));
+                                                unsigned(length), r.size() - offset));
             break;
         }
-        // len >= 12 and the record fits, so its code and time stamp are there.
-        ByteReader rec(*record);
-        log.addEntry(rec.u16(2).value_or(0), rec.u64(4).value_or(0), DiagPacket::morvekRecordFromDlf(*record));
-        offset += *length;
+        // The record fits and is at least a header long, so its code and time stamp are there.
+        const ByteView recordBytes = r.slice(offset, length).value_or(ByteView{});
+        const ByteReader record(recordBytes);
+        log.addEntry(record.u16(2).value_or(0), record.u64(4).value_or(0), DiagPacket::morvekRecordFromDlf(recordBytes));
+        offset += length;
     }
     return log;
 }

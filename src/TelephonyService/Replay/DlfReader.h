@@ -1,4 +1,4 @@
-// DlfReader: reads a QXDM DLF file (Part 3.4's format) into the Morvek records it holds (DESIGN.md "The telephony service", Replay/).
+// DlfReader: reads a QXDM DLF file into the Morvek records it holds.
 #pragma once
 
 #include "PropertyList/Value.h"
@@ -10,14 +10,13 @@ namespace vantorel {
 
 // A DLF file is a raw concatenation of records, no file header or trailer:
 //   0..1 len u16 LE (12 + payload length) | 2..3 code u16 LE | 4..11 time stamp u64 LE | 12.. payload
-// Part 3.4's writer leads with a 161-byte version record of code 0x1FFD; it is read like
-// any other record (an entry with code 0x1FFD). Each record becomes the Morvek record
+// The monitor's own DLF writer leads with a 161-byte version record (LogCode::kDlfVersionReport); it is
+// read like any other record. Each record becomes the Morvek record
 // type byte 1 + the record. Records carry no sync marks, so at the first record with
 // len < 12 (malformed) or running past the end of the file (truncated) reading stops;
 // the records before it are kept.
 class DlfReader {
 public:
-    static constexpr uint16_t kVersionReportCode = 0x1FFD;
     static constexpr size_t kRecordHeaderLength = 12;
 
     // A file that cannot be read gives a log with `error` set ("<path>: <reason>").

@@ -1,4 +1,4 @@
-// HdlcDeframer: streaming HDLC deframer with CRC-16/X.25 check for recorded DIAG streams (DESIGN.md "The telephony service", Replay/).
+// HdlcDeframer: streaming HDLC deframer with CRC-16/X.25 check for recorded DIAG streams.
 #include "TelephonyService/Replay/HdlcDeframer.h"
 
 #include "Platform/ByteReader.h"

@@ -1,4 +1,4 @@
-// HdlcDeframer: streaming HDLC deframer with CRC-16/X.25 check for recorded DIAG streams (DESIGN.md "The telephony service", Replay/; captures/README.md format).
+// HdlcDeframer: streaming HDLC deframer with CRC-16/X.25 check for recorded DIAG streams (.qmdl / .mi2log framing).
 #pragma once
 
 #include "PropertyList/Value.h"

@@ -1,4 +1,4 @@
-// QmdlReader: .qmdl / .mi2log files through HdlcDeframer and DiagPacket into a RecordedLog (DESIGN.md "The telephony service", Replay/).
+// QmdlReader: .qmdl / .mi2log files through HdlcDeframer and DiagPacket into a RecordedLog.
 #include "TelephonyService/Replay/QmdlReader.h"
 
 #include "TelephonyService/Replay/DiagPacket.h"

@@ -1,4 +1,4 @@
-// QmdlReader: reads a .qmdl / .mi2log file (HDLC-framed DIAG) into the Morvek records of its log packets (DESIGN.md "The telephony service", Replay/).
+// QmdlReader: reads a .qmdl / .mi2log file (HDLC-framed DIAG) into the Morvek records of its log packets.
 #pragma once
 
 #include "PropertyList/Value.h"

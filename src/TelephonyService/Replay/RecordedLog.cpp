@@ -1,4 +1,4 @@
-// RecordedLog: entries and counters shared by the recorded-stream readers, with the file loader and the per-code summary (DESIGN.md "The telephony service", Replay/).
+// RecordedLog: entries and counters shared by the recorded-stream readers, with the file loader and the per-code summary.
 #include "TelephonyService/Replay/RecordedLog.h"
 
 #include "Platform/StringFormat.h"

@@ -1,4 +1,4 @@
-// RecordedLog: what a recorded-stream reader (QmdlReader, DlfReader) found in a file: the Morvek records in order and the counts (DESIGN.md "The telephony service", Replay/).
+// RecordedLog: what a recorded-stream reader (QmdlReader, DlfReader) found in a file: the Morvek records in order and the counts.
 #pragma once
 
 #include "PropertyList/Value.h"

@@ -1,7 +1,8 @@
-// RecordedStream: format detection and the common timed-message view of captures, DLF and QMDL files (DESIGN.md "The telephony service", Replay/).
+// RecordedStream: format detection and the common timed-message view of captures, DLF and QMDL files.
 #include "TelephonyService/Replay/RecordedStream.h"
 
 #include "Platform/ByteReader.h"
+#include "Platform/LogCodes.h"
 #include "Platform/StringFormat.h"
 #include "TelephonyService/Replay/DiagPacket.h"
 #include "TelephonyService/Replay/DlfReader.h"
@@ -18,15 +19,17 @@ namespace {
 // or text and event packets) inside HDLC escaping, which chains only by accident and
 // then not to the exact end of a file.
 bool looksLikeDlf(ByteView data) {
-    ByteReader r(data);
+    const ByteReader r(data);
     size_t offset = 0;
     size_t records = 0;
     while (offset < r.size()) {
-        const std::optional<uint16_t> length = r.u16(offset);
-        if (!length || *length < DlfReader::kRecordHeaderLength || !r.has(offset, *length)) return false;
-        if (records == 0 && r.u16(offset + 2) == DlfReader::kVersionReportCode) return true;
+        if (!r.has(offset, DlfReader::kRecordHeaderLength)) return false;
+        const ByteReader record(r.from(offset));
+        const uint16_t length = record.u16(0).value_or(0);
+        if (length < DlfReader::kRecordHeaderLength || !record.has(0, length)) return false;
+        if (records == 0 && record.u16(2).value_or(0) == LogCode::kDlfVersionReport) return true;
         ++records;
-        offset += *length;
+        offset += length;
     }
     return records >= 2;
 }

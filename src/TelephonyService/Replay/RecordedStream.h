@@ -1,4 +1,4 @@
-// RecordedStream: a recorded stream of any of our formats (capture, QXDM DLF, QMDL / mi2log), detected from the content, as timed messages for replay and inspection (DESIGN.md "The telephony service", Replay/).
+// RecordedStream: a recorded stream of any of our formats (capture, QXDM DLF, QMDL / mi2log), detected from the content, as timed messages for replay and inspection.
 #pragma once
 
 #include "PropertyList/Value.h"
@@ -13,7 +13,7 @@ namespace vantorel {
 // Detection, in this order:
 //   - "VNTRLCAP" at the start: a capture (CaptureReader); its technology is the file's.
 //   - a chain of DLF records (DlfReader's layout): the first record's length is at least
-//     12 and fits in the file, and either its code is 0x1FFD (the version report Part 3.4's
+//     12 and fits in the file, and either its code is LogCode::kDlfVersionReport (the version report the monitor's
 //     writer puts first) or at least 2 records chain exactly to the end of the file.
 //   - anything else: QMDL / mi2log (HDLC-framed DIAG, QmdlReader).
 // QMDL and DLF records become Morvek records (type byte 1 + DLF record, message id 0)

@@ -1,4 +1,4 @@
-// vantorel-telephonyd: the telephony service as a program of its own, on the modem emulator or a recorded stream (DESIGN.md "The telephony service"; docs/protocol.md).
+// vantorel-telephonyd: the telephony service as a program of its own, on the modem emulator or a recorded stream (docs/protocol.md).
 #include "Platform/QuitOnSignal.h"
 #include "Platform/SystemLog.h"
 #include "Platform/TechnologyNames.h"

@@ -1,0 +1,172 @@
+// Tests the modem backends and the log mask: replay pace, gaps, looping, pausing; emulator ticks and scenario lookup; which messages a start command's mask forwards.
+#include "TelephonyService/EmulatorBackend.h"
+#include "TelephonyService/LogMask.h"
+#include "TelephonyService/ReplayBackend.h"
+
+#include "Platform/RecordBuilder.h"
+#include "Platform/TelephonyIdentifiers.h"
+#include "TelephonyService/Emulator/UTRANScenario.h"
+#include "TelephonyService/ServiceTestSupport.h"
+
+#include <QElapsedTimer>
+#include <gtest/gtest.h>
+
+#include <vector>
+
+namespace vantorel {
+namespace {
+
+using servicetest::spin;
+using servicetest::streamOf;
+using servicetest::waitUntil;
+using State = ModemBackend::State;
+
+// What a backend emits, in order.
+struct Collector {
+    std::vector<Bytes> messages;
+    std::vector<State> states;
+    explicit Collector(ModemBackend& backend) {
+        QObject::connect(&backend, &ModemBackend::messageReady, [this](int32_t, const Bytes& m) { messages.push_back(m); });
+        QObject::connect(&backend, &ModemBackend::stateChanged, [this](State s) { states.push_back(s); });
+    }
+};
+
+std::vector<Bytes> numberedRecords(size_t n) {
+    std::vector<Bytes> out;
+    for (size_t i = 0; i < n; ++i)
+        out.push_back(RecordBuilder::ordinary(0xD00A, 16).u16(13, static_cast<uint16_t>(i)).build());
+    return out;
+}
+
+TEST(ReplayBackend, ThePaceFollowsTheRecordedGapsDividedByTheSpeed) {
+    struct Row {
+        const char* name;
+        std::vector<int64_t> times;  // microseconds
+        double speed;
+        int minMs, maxMs;
+    };
+    std::vector<int64_t> minuteApart;
+    for (size_t i = 0; i < 3 * ReplayBackend::kBatch + 7; ++i) minuteApart.push_back(int64_t(i) * 60000000);
+    const std::vector<Row> rows = {
+        {"speed 1 keeps 150 ms gaps", {1000000, 1150000, 1300000}, 1.0, 295, 2000},
+        {"speed 3 shortens them", {1000000, 1150000, 1300000}, 3.0, 95, 295},
+        {"time going backwards is no gap", {20000000, 10000000, 10100000}, 1.0, 95, 2000},
+        {"an hour's gap is cut to 10 s", {0, 3600000000}, 100.0, 95, 2000},
+        {"speed 0 waits for nothing, over several batches", minuteApart, 0.0, 0, 2000},
+    };
+    for (const Row& row : rows) {
+        SCOPED_TRACE(row.name);
+        const std::vector<Bytes> records = numberedRecords(row.times.size());
+        ReplayBackend backend(streamOf(records, row.times), row.speed, false);
+        Collector c(backend);
+        QElapsedTimer clock;
+        clock.start();
+        backend.start();
+        ASSERT_TRUE(waitUntil([&] { return backend.state() == State::Finished; }, 3000));
+        EXPECT_GE(clock.elapsed(), row.minMs);
+        EXPECT_LT(clock.elapsed(), row.maxMs);
+        EXPECT_EQ(c.messages, records);
+        EXPECT_EQ(c.states, (std::vector<State>{State::Streaming, State::Finished}));
+    }
+}
+
+TEST(ReplayBackend, ALoopingReplayWaitsWhilePausedAndStartsOverAtItsEnd) {
+    const std::vector<Bytes> records = numberedRecords(3);
+    ReplayBackend backend(streamOf(records), 0, true);
+    Collector c(backend);
+    backend.setPaused(true);
+    backend.start();
+    spin(50);
+    EXPECT_TRUE(c.messages.empty());
+    backend.setPaused(false);
+    ASSERT_TRUE(waitUntil([&] { return c.messages.size() >= 8; }));
+    for (size_t i = 0; i < 8; ++i) EXPECT_EQ(c.messages[i], records[i % 3]) << i;
+    backend.stop();
+    EXPECT_EQ(backend.state(), State::Idle);
+
+    ReplayBackend empty(streamOf({}), 0, true);
+    empty.start();
+    ASSERT_TRUE(waitUntil([&] { return empty.state() == State::Finished; }));
+}
+
+// The UTRAN modem ticking every 20 ms.
+class FastUTRANScenario : public UTRANScenario {
+public:
+    explicit FastUTRANScenario(uint64_t seed) : UTRANScenario(seed) {}
+    std::chrono::milliseconds tickInterval() const override { return std::chrono::milliseconds(20); }
+};
+
+TEST(EmulatorBackend, TicksComeAtOnceThenEveryIntervalAndGoOnCountingAfterAStop) {
+    EmulatorBackend backend(std::make_unique<FastUTRANScenario>(7));
+    FastUTRANScenario reference(7);
+    std::vector<std::vector<Bytes>> ticks;
+    for (uint64_t t = 0; t < 200; ++t) ticks.push_back(reference.recordsForTick(t));
+    auto recordsOf = [&](size_t from, size_t to) {
+        std::vector<Bytes> out;
+        for (size_t t = from; t < to; ++t) out.insert(out.end(), ticks[t].begin(), ticks[t].end());
+        return out;
+    };
+    Collector c(backend);
+    backend.setPaused(true);  // a live modem does not wait for its listener
+    backend.start();
+    ASSERT_TRUE(waitUntil([&] { return c.messages.size() >= recordsOf(0, 4).size(); }));
+    backend.stop();
+    // A tick's records are emitted together: the stream holds whole ticks 0..n-1.
+    size_t n = 0, count = 0;
+    while (count < c.messages.size()) count += ticks[n++].size();
+    EXPECT_EQ(c.messages, recordsOf(0, n));
+    spin(60);
+    EXPECT_EQ(c.messages.size(), count) << "nothing after stop";
+
+    c.messages.clear();
+    backend.start();  // tick n follows: the modem does not rewind
+    ASSERT_TRUE(waitUntil([&] { return c.messages.size() >= ticks[n].size(); }));
+    c.messages.resize(ticks[n].size());
+    EXPECT_EQ(c.messages, ticks[n]);
+}
+
+TEST(LogMask, AStartCommandForwardsItsCodesAndAlwaysTheJunk) {
+    const Bytes ordinary = RecordBuilder::ordinary(0x7130).build();
+    const Bytes prefixed = RecordBuilder::ordinary(0x7130).buildWithPrefix();
+    const Bytes otherCode = RecordBuilder::ordinary(0x7131).build();
+    const Bytes extra1 = RecordBuilder::extra(1).build();
+    const Bytes extraAsOrdinary = RecordBuilder::ordinary(1).build();  // code 1, but ordinary
+    const Bytes wrongType = RecordBuilder(2, 0x7130).build();
+    const Bytes shortRecord{0x01, 0x10, 0x00, 0x30};  // no room for the code
+    const std::vector<Bytes> messages = {ordinary, prefixed, otherCode, extra1, extraAsOrdinary, wrongType, shortRecord};
+
+    auto command = [](std::optional<std::vector<Value>> ordinaryCodes, std::optional<std::vector<Value>> extraCodes) {
+        auto dict = Dictionary::create();
+        dict->set("SetState", Value("Streaming"));
+        if (ordinaryCodes) dict->set("SetMorvekLogCodes", Value(Array::of(*ordinaryCodes)));
+        if (extraCodes) dict->set("SetTsExtraCodes", Value(Array::of(*extraCodes)));
+        return dict;
+    };
+    struct Row {
+        const char* name;
+        DictionaryRef command;
+        std::vector<bool> forwards;  // per message above
+        std::string problem;
+    };
+    const std::vector<Row> rows = {
+        {"no lists: all", command({}, {}), {1, 1, 1, 1, 1, 1, 1}, ""},
+        {"one ordinary code", command(std::vector<Value>{Value::integer(0x7130)}, {}), {1, 1, 0, 0, 0, 1, 1}, ""},
+        {"one extra code", command({}, std::vector<Value>{Value::integer(1)}), {0, 0, 0, 1, 0, 1, 1}, ""},
+        {"entries that are no codes", command(std::vector<Value>{Value::integer(0x7131), Value::integer(-1), Value("x")},
+                                              std::vector<Value>{Value::integer(0x10000)}),
+         {0, 0, 1, 0, 0, 1, 1},
+         "skipped 2 entries of SetMorvekLogCodes and 1 of SetTsExtraCodes that are not codes 0..65535"},
+    };
+    for (const Row& row : rows) {
+        SCOPED_TRACE(row.name);
+        std::string problem = "untouched";
+        const LogMask mask = LogMask::fromStartCommand(*row.command, &problem);
+        EXPECT_EQ(problem, row.problem);
+        for (size_t i = 0; i < messages.size(); ++i) EXPECT_EQ(mask.forwards(messages[i]), row.forwards[i]) << i;
+    }
+    EXPECT_EQ(LogMask::classify(extra1)->effectiveCode(), LogCode::kCellMonitor);
+    EXPECT_EQ(LogMask::classify(prefixed)->effectiveCode(), 0x7130);
+}
+
+}  // namespace
+}  // namespace vantorel
