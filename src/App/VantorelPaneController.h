@@ -1,4 +1,4 @@
-// VantorelPaneController: one level of the display tree as a table pane with its toolbar (Part 1.2).
+// VantorelPaneController: one level of the display tree as a table pane with its toolbar (status, activity, save).
 #pragma once
 
 #include "Model/VantorelModelNode.h"
@@ -25,7 +25,7 @@ class VantorelCell;
 // The platform's table view controller stands behind this class: a one-column
 // table of 50-point rows above the pane's toolbar. Its rows are VantorelCells that
 // go through a reuse pool, as the platform's cells do, so that a reused cell keeps
-// the kind it was made as (Part 1.2).
+// the kind it was made as.
 class VantorelPaneController : public QWidget {
     Q_OBJECT
 public:
@@ -58,7 +58,7 @@ public:
     // save button only when the application allows it.
     void createToolbarItems();
 
-    // The data source and delegate of Part 1.2, by row (the index path's last index).
+    // The table's data source and delegate, by row (the index path's last index).
     int numberOfRowsInSection() const;
     VantorelCell* cellForRowAtIndexPath(int row);
     // Selection; std::nullopt stands for "no index path".
@@ -94,7 +94,6 @@ protected:
 private:
     void updateTitle();
 
-    // The fields of Part 1.2, in its order.
     NodeRef _nodes;
     std::string _keyPath;
     std::string _status;

@@ -1,7 +1,8 @@
-// VantorelSaveViewController: the snapshot save screen of Part 1.3 as a modal QDialog; the file goes through libplist (XML) into the diagnostic-log directory.
+// VantorelSaveViewController: the snapshot save screen as a modal QDialog; the file goes through libplist (XML) into the diagnostic-log directory.
 #include "App/VantorelSaveViewController.h"
 
 #include "App/PaneApplication.h"
+#include "Model/MonitorClock.h"
 #include "Platform/DateDescription.h"
 #include "Platform/DiagnosticLogDirectory.h"
 #include "Platform/StringFormat.h"
@@ -22,21 +23,14 @@
 #include <QVBoxLayout>
 
 #include <algorithm>
-#include <mutex>
 
 namespace vantorel {
 
 namespace {
 
-std::mutex gClockMutex;
-VantorelSaveViewController::Clock gClock;
+std::chrono::system_clock::time_point now() { return MonitorClock::current().now(); }
 
-std::chrono::system_clock::time_point now() {
-    std::lock_guard<std::mutex> lock(gClockMutex);
-    return gClock ? gClock() : std::chrono::system_clock::now();
-}
-
-// Part 1.3 list data: each row's label font.
+// Each row's label font.
 const char* const kRowFontFamily = "Helvetica";
 constexpr int kRowFontPoints = 13;
 // The list grows with its rows up to this many (the model's contents are at most
@@ -51,7 +45,7 @@ QString descriptionOf(const Value& element) {
 }
 
 // Writes the snapshot in place (not atomically: a failed write may leave a partial
-// file, which Part 1.3 keeps). Returns the reason of a failure, empty on success.
+// file, as the handset's tool does). Returns the reason of a failure, empty on success.
 std::string writeSnapshot(const Value& snapshot, const std::string& path) {
     const std::optional<Bytes> bytes = PropertyListSerialization::write(snapshot, PropertyListSerialization::Format::XML);
     if (!bytes) return "the contents cannot be written as a property list";
@@ -136,11 +130,6 @@ VantorelSaveViewController::VantorelSaveViewController(const Value& saveHistory,
 
 VantorelSaveViewController::~VantorelSaveViewController() = default;
 
-void VantorelSaveViewController::setClock(Clock clock) {
-    std::lock_guard<std::mutex> lock(gClockMutex);
-    gClock = std::move(clock);
-}
-
 void VantorelSaveViewController::fillContentTable() {
     const QFont font(QString::fromLatin1(kRowFontFamily), kRowFontPoints);
     for (const Value& element : *_saveHistory) {
@@ -216,7 +205,7 @@ void VantorelSaveViewController::reject() {
 
 void VantorelSaveViewController::showWriteError() {
     // Owned by the screen's parent, not the screen: the alert stays up after the
-    // application has closed the screen (Part 1.3 step 5).
+    // application has closed the screen.
     auto* alert = new QMessageBox(parentWidget());
     alert->setObjectName(QStringLiteral("fileErrorAlert"));
     alert->setAttribute(Qt::WA_DeleteOnClose);

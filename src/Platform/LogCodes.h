@@ -5,10 +5,10 @@
 
 namespace vantorel::LogCode {
 
-// A record's type byte: 0 for an ordinary modem record, 255 for an extra record that the
+// A record's type byte: 1 for an ordinary modem record, 255 for an extra record that the
 // telephony service adds to the stream (SIM files, cell monitor, PDP contexts). An extra
 // record's effective code is kExtraBase | its 16-bit code.
-inline constexpr uint8_t kOrdinaryType = 0;
+inline constexpr uint8_t kOrdinaryType = 1;
 inline constexpr uint8_t kExtraType = 255;
 inline constexpr int32_t kExtraBase = 0xFF0000;
 
