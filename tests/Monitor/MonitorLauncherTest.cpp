@@ -1,8 +1,8 @@
 // End-to-end tests: an in-process service replaying a capture (or running the emulator), the model, the UTRAN decoder and the tree, shown by the terminal view.
-#include "cli/MonitorLauncher.h"
+#include "Monitor/MonitorLauncher.h"
 
 #include "Model/VantorelModel.h"
-#include "cli/TerminalView.h"
+#include "Monitor/TerminalView.h"
 #include "support/EventLoopWait.h"
 #include "support/ScenarioCapture.h"
 

@@ -1,5 +1,5 @@
 // Tests for TreeFormatter: the display as the panes show it (Part 2.3), as JSON and as an XML property list.
-#include "cli/TreeFormatter.h"
+#include "Monitor/TreeFormatter.h"
 
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
