@@ -1,9 +1,13 @@
-// End-to-end tests: an in-process service replaying a capture (or running the emulator), the model, the UTRAN decoder and the tree, shown by the terminal view.
+// End-to-end tests of the monitor wiring: an in-process service replaying a capture or running the emulator, the model, the UTRAN decoder, and the terminal view's rows.
 #include "Monitor/MonitorLauncher.h"
 
 #include "Model/VantorelModel.h"
 #include "Monitor/TerminalView.h"
+#include "Monitor/TreeFormatter.h"
+#include "PropertyList/Array.h"
+#include "PropertyList/Dictionary.h"
 #include "support/EventLoopWait.h"
+#include "support/FastMonitorClock.h"
 #include "support/ScenarioCapture.h"
 
 #include <QCommandLineParser>
@@ -17,87 +21,77 @@ using namespace vantorel::testing;
 
 namespace {
 
-std::string readAll(std::FILE* f) {
-    std::fflush(f);
-    std::rewind(f);
-    std::string text;
-    char buf[4096];
-    size_t n;
-    while ((n = std::fread(buf, 1, sizeof buf, f)) > 0) text.append(buf, n);
-    return text;
+std::optional<MonitorLauncher::Source> parse(const QStringList& args, std::string* error) {
+    QCommandLineParser parser;
+    MonitorLauncher::addOptions(parser);
+    parser.process(QStringList{"watch"} + args);
+    return MonitorLauncher::sourceFrom(parser, error);
 }
 
 }  // namespace
 
-TEST(MonitorLauncher, ServiceWithAReplayedCaptureModelDecoderAndTreeEndToEnd) {
+TEST(MonitorLauncher, AReplayedCaptureReachesTheTerminalViewThroughServiceModelAndDecoder) {
+    FastMonitorClock::installed();
     QTemporaryDir dir;
     const std::string path = dir.filePath("utran.vcap").toStdString();
     writeUtranCapture(path, 3, 40, 500);
+    std::string error;
+    auto source = parse({"--replay", QString::fromStdString(path), "--speed", "0"}, &error);
+    ASSERT_TRUE(source) << error;
     std::FILE* out = std::tmpfile();
     TerminalView view(out);
     MonitorLauncher launcher;
-    MonitorLauncher::Source source;
-    source.replay = path;
-    source.speed = 0;  // as fast as the model takes it
-    std::string error;
-    ASSERT_TRUE(launcher.start(source, &view, &error)) << error;
+    ASSERT_TRUE(launcher.start(*source, &view, &error)) << error;
     view.setModel(launcher.model());
-    // Records build the display as they arrive, so the first refresh already shows them.
+    EXPECT_EQ(launcher.description(), "replay of " + path);
     ASSERT_TRUE(waitUntil(
         [&] {
             NodeRef lac = launcher.model()->nodeAtPath("/Serving Cell/Serving Cell Info/Local Area Code");
             return view.refreshes() >= 1 && lac && *lac->value() == "23071";
         },
         10000));
-    const std::string screen = readAll(out);
-    EXPECT_NE(screen.find("Technology: UTRAN (TD-SCDMA)"), std::string::npos) << screen;
-    EXPECT_NE(screen.find("    Local Area Code: 23071"), std::string::npos) << screen;
-    EXPECT_NE(screen.find(" messages decoded"), std::string::npos);
-    EXPECT_NE(screen.find("Updated "), std::string::npos);
-    EXPECT_TRUE(launcher.model()->isConnected());
+    const std::string screen = view.screen();
+    EXPECT_EQ(screen.rfind("Vantorel - Updated ", 0), 0u) << screen;
+    EXPECT_NE(screen.find(" messages decoded\n\nTechnology: UTRAN (TD-SCDMA)\n"), std::string::npos) << screen;
+    EXPECT_NE(screen.find("\n    Local Area Code: 23071\n"), std::string::npos) << screen;
     std::fclose(out);
 }
 
-TEST(MonitorLauncher, TheEmbeddedDefaultIsTheUTRANEmulator) {
-    QCommandLineParser parser;
-    MonitorLauncher::addOptions(parser);
-    parser.process(QStringList{"watch"});
+TEST(MonitorLauncher, TheEmbeddedDefaultIsTheUTRANEmulatorAndBadSourcesAreClearErrors) {
     std::string error;
-    auto source = MonitorLauncher::sourceFrom(parser, &error);
+    auto source = parse({}, &error);
     ASSERT_TRUE(source);
     EXPECT_EQ(source->emulate, "utran");
-
-    std::FILE* out = std::tmpfile();
-    TerminalView view(out);
+    EXPECT_FALSE(parse({"--emulate", "utran", "--service", "x"}, &error));
+    EXPECT_EQ(error, "choose one of --emulate, --replay and --service");
+    EXPECT_FALSE(parse({"--speed", "fast"}, &error));
     MonitorLauncher launcher;
-    ASSERT_TRUE(launcher.start(*source, &view, &error)) << error;
-    view.setModel(launcher.model());
-    EXPECT_EQ(launcher.description(), "emulator (utran)");
-    ASSERT_TRUE(waitUntil([&] { return launcher.model()->messagesDecoded() > 10; }, 10000));
-    EXPECT_EQ(launcher.model()->logGenerator() != nullptr, true);
-    std::fclose(out);
+    EXPECT_FALSE(launcher.start(*parse({"--emulate", "lte"}, &error), nullptr, &error));
+    EXPECT_NE(error.find("no emulator scenario for lte yet (available: utran)"), std::string::npos) << error;
 }
 
-TEST(MonitorLauncher, ConflictingSourcesAndBadSpeedAreClearErrors) {
-    QCommandLineParser parser;
-    MonitorLauncher::addOptions(parser);
-    parser.process(QStringList{"watch", "--emulate", "utran", "--service", "x"});
-    std::string error;
-    EXPECT_FALSE(MonitorLauncher::sourceFrom(parser, &error));
-    EXPECT_EQ(error, "choose one of --emulate, --replay and --service");
-
-    QCommandLineParser speed;
-    MonitorLauncher::addOptions(speed);
-    speed.process(QStringList{"watch", "--speed", "fast"});
-    EXPECT_FALSE(MonitorLauncher::sourceFrom(speed, &error));
-
-    QCommandLineParser lte;
-    MonitorLauncher::addOptions(lte);
-    lte.process(QStringList{"watch", "--emulate", "lte"});
-    auto source = MonitorLauncher::sourceFrom(lte, &error);
-    ASSERT_TRUE(source);
-    TerminalView view(stderr);
-    MonitorLauncher launcher;
-    EXPECT_FALSE(launcher.start(*source, &view, &error));
-    EXPECT_NE(error.find("no emulator scenario for lte yet (available: utran)"), std::string::npos) << error;
+TEST(TerminalView, ListsOfValuesShowOneLinePerEntryAndEmptyNodesSaySo) {
+    auto entry = Dictionary::create();
+    entry->set("UARFCN", "10096");
+    entry->set("Cell ID", "120");
+    auto sir = Dictionary::create();
+    sir->set("CCTRCH ID", "1");
+    sir->set("SIR", Value(Array::of({"13", "16"})));
+    auto root = Dictionary::create();
+    root->set("Neighbor Cell List", Value(Array::of({Value(entry)})));
+    root->set("CCTRCH SIR", Value(Array::of({Value(sir)})));
+    root->set("RRC Info", Value(Dictionary::create()));
+    root->set("Count", Value::integer(3));
+    PathDictionary paths;
+    const NodeRef tree = VantorelModelNode::makeTreeFromObject(Value(root), paths);
+    EXPECT_EQ(TreeFormatter::compactTree(tree),
+              "Neighbor Cell List\n"
+              "  0: UARFCN 10096 | Cell ID 120\n"
+              "CCTRCH SIR\n"
+              "  0\n"
+              "    CCTRCH ID: 1\n"
+              "    SIR: 13 16\n"
+              "RRC Info (empty)\n"
+              "Count: (unknown)\n");
+    EXPECT_EQ(TreeFormatter::tree(tree).rfind("Neighbor Cell List\n  0\n    UARFCN: 10096\n    Cell ID: 120\n", 0), 0u);
 }
