@@ -57,8 +57,6 @@ public:
     NavigationController* navigationController() const { return _navController; }
     VantorelSaveViewController* saveViewController() const { return _saveViewController; }
     VantorelModel* model() const { return launcher_ ? launcher_->model() : nullptr; }
-    const std::string& updateMessage() const { return _updateMessage; }
-    bool unsetRSSI() const { return _unsetRSSI; }
 
 private:
     std::unique_ptr<QMainWindow> _window;

@@ -147,8 +147,6 @@ void VantorelPaneController::createToolbarItems() {
     }
 }
 
-int VantorelPaneController::toolbarItemCount() const { return int(toolbar_->actions().size()); }
-
 int VantorelPaneController::numberOfRowsInSection() const {
     const std::vector<NodeRef>* children = _nodes ? _nodes->childNodes() : nullptr;
     return children ? int(children->size()) : 0;

@@ -42,7 +42,6 @@ public:
     const std::string& title() const { return title_; }
     const std::string& status() const { return _status; }
     bool isLoading() const { return _isLoading; }
-    PaneApplication* application() const { return application_; }
 
     // The platform's appearance calls, sent by the navigation controller.
     void viewWillAppear();
@@ -74,13 +73,11 @@ public:
     NavigationController* navigationController() const { return navigationController_; }
     void setNavigationController(NavigationController* controller) { navigationController_ = controller; }
 
-    // What tests and the navigation controller look at.
+    // The table, its rows' cells and the cells waiting for reuse.
     QTableWidget* tableView() const { return table_; }
     VantorelCell* cellAtRow(int row) const;     // the cell shown in that row
     std::size_t reusePoolSize() const { return reusePool_.size(); }
-    QToolBar* toolbar() const { return toolbar_; }
-    int toolbarItemCount() const;
-    ActivityIndicator* activityIndicator() const { return activityIndicator_; }
+    // The toolbar's items: the indicator's action is hidden while not loading.
     QAction* activityIndicatorItem() const { return activityIndicatorItem_; }
     QLabel* statusLabel() const { return statusLabel_; }
     QAction* saveItem() const { return saveItem_; }  // nullptr without the save button

@@ -45,20 +45,14 @@ QString descriptionOf(const Value& element) {
 }
 
 // Writes the snapshot in place (not atomically: a failed write may leave a partial
-// file, as the handset's tool does). Returns the reason of a failure, empty on success.
-std::string writeSnapshot(const Value& snapshot, const std::string& path) {
+// file, as the handset's tool does). False when anything failed.
+bool writeSnapshot(const Value& snapshot, const std::string& path) {
     const std::optional<Bytes> bytes = PropertyListSerialization::write(snapshot, PropertyListSerialization::Format::XML);
-    if (!bytes) return "the contents cannot be written as a property list";
-    std::string directoryError;
-    if (!DiagnosticLogDirectory::ensureExists(&directoryError)) return directoryError;
+    if (!bytes || !DiagnosticLogDirectory::ensureExists(nullptr)) return false;
     QFile file(QString::fromStdString(path));
-    if (!file.open(QIODevice::WriteOnly | QIODevice::Truncate)) return file.errorString().toStdString();
+    if (!file.open(QIODevice::WriteOnly | QIODevice::Truncate)) return false;
     const auto size = static_cast<qint64>(bytes->size());
-    const qint64 written = file.write(reinterpret_cast<const char*>(bytes->data()), size);
-    const bool flushed = file.flush();
-    if (written != size || !flushed) return file.errorString().toStdString();
-    file.close();
-    return std::string();
+    return file.write(reinterpret_cast<const char*>(bytes->data()), size) == size && file.flush();
 }
 
 }  // namespace
@@ -183,8 +177,7 @@ void VantorelSaveViewController::savePressed() {
         static_cast<long>(std::chrono::duration_cast<std::chrono::seconds>(pressed.time_since_epoch()).count());
     const std::string directory = DiagnosticLogDirectory::path();
     lastWritePath_ = StringFormat::format("%s/VantorelSnapshot-%ld.vantorel", directory.c_str(), seconds);
-    lastWriteError_ = writeSnapshot(Value(snapshot), lastWritePath_);
-    if (!lastWriteError_.empty()) {
+    if (!writeSnapshot(Value(snapshot), lastWritePath_)) {
         SystemLog::log(SystemLog::kError, "Unable to write snapshot to %s", lastWritePath_.c_str());
         showWriteError();
     }

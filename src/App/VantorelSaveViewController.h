@@ -38,13 +38,8 @@ public:
     QPushButton* saveButton() const { return saveButton_; }
     QPushButton* cancelButton() const { return cancelButton_; }
 
-    std::chrono::system_clock::time_point timeStamp() const { return _timeStamp; }
-    const ArrayRef& saveHistory() const { return _saveHistory; }
-
-    // The path of the last Save (written or not), empty before the first; the reason
-    // of the last failure, empty after a success.
+    // The path of the last Save (written or not), empty before the first.
     const std::string& lastWritePath() const { return lastWritePath_; }
-    const std::string& lastWriteError() const { return lastWriteError_; }
     // The "File Error" alert of the last failed Save while it is open, else null.
     QMessageBox* errorAlert() const { return errorAlert_; }
 
@@ -80,7 +75,6 @@ private:
     QPushButton* cancelButton_ = nullptr;
     PaneApplication* application_ = nullptr;
     std::string lastWritePath_;
-    std::string lastWriteError_;
     QPointer<QMessageBox> errorAlert_;
     bool closeRequested_ = false;
 };

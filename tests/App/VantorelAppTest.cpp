@@ -100,7 +100,9 @@ TEST_F(VantorelAppTest, WhenADeeperPanesBranchVanishesTheStackPopsToThePaneBelow
     ASSERT_TRUE(waitUntil([&] { return nav.panes().size() == 3; }, 3000));
     EXPECT_EQ(nav.topPane()->path(), "/Packet Data/PDP Context Info");
     EXPECT_EQ(nav.topPane()->node()->childNodes()->size(), 1u);  // reloaded
-    if (qos) EXPECT_EQ(qos->node(), qosNode);                    // not reloaded before it went
+    if (qos) {
+        EXPECT_EQ(qos->node(), qosNode);  // not reloaded before it went
+    }
 }
 
 TEST_F(VantorelAppTest, TheShellShowsTheRSSIWhileRunningUnlessTheUserAlreadyChoseTo) {
