@@ -72,6 +72,7 @@ TEST(PaneNavigation, RowsDrillDownByClickOrEnterAndBackByButtonBackspaceOrAltLef
     Stack s;
     s.top().setStatus("Updated 2016-06-28 at 22:01:10", false);
     s.clickRow("Mode");  // a leaf: nothing pushed, no row left selected
+    s.top().didSelectRowAtIndexPath(std::nullopt);  // Enter with no current row
     EXPECT_EQ(s.navigation.panes().size(), 1u);
     EXPECT_TRUE(s.top().tableView()->selectionModel()->selectedRows().empty());
 

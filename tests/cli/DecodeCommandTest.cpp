@@ -30,6 +30,9 @@ TEST(DecodeCommand, ACaptureDecodesToTheDisplayAsTreeOrJsonWithOnlyDataOnStandar
     EXPECT_NE(tree.out.find("  Neighbor Cell List\n    0\n      UARFCN: "), std::string::npos);
     EXPECT_NE(tree.err.find("1 skipped (message id not 0)"), std::string::npos) << tree.err;
     EXPECT_NE(tree.err.find("Deallocing ClassIndex"), std::string::npos);  // kept out of the data
+    CommandOutput twice = decode({path, path});  // files of one technology go to one decoder
+    EXPECT_EQ(twice.code, 0) << twice.err;
+    EXPECT_NE(twice.err.find("2 skipped"), std::string::npos) << twice.err;
 
     CommandOutput json = decode({"--format", "json", path});
     const QJsonObject serving = QJsonDocument::fromJson(QByteArray::fromStdString(json.out)).object()["1;Serving Cell"].toObject();
