@@ -1,4 +1,4 @@
-// ActivityIndicator: the small grey spinning activity indicator of a pane's toolbar (Part 1.2, createToolbarItems item 1).
+// ActivityIndicator: the small grey spinning indicator at the left of a pane's toolbar, shown while the pane is loading.
 #pragma once
 
 #include <QWidget>

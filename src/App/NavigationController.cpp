@@ -1,4 +1,4 @@
-// NavigationController: the navigation stack of panes with its top bar and back button, standing in for the platform's navigation controller (Parts 1.1 and 1.2).
+// NavigationController: the stack of drill-down panes with its top bar (title, back button), standing in for the handset's navigation controller.
 #include "App/NavigationController.h"
 
 #include "App/NavigationControllerDelegate.h"

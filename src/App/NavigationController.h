@@ -1,4 +1,4 @@
-// NavigationController: the navigation stack of panes with its top bar and back button, standing in for the platform's navigation controller (Parts 1.1 and 1.2).
+// NavigationController: the stack of drill-down panes with its top bar (title, back button), standing in for the handset's navigation controller.
 #pragma once
 
 #include <QWidget>
@@ -44,7 +44,7 @@ public:
     const std::vector<VantorelPaneController*>& panes() const { return panes_; }
     VantorelPaneController* topPane() const { return panes_.empty() ? nullptr : panes_.back(); }
 
-    // The top bar, for tests.
+    // The top bar: the back button (titled after the pane below) and the title.
     QToolButton* backButton() const { return backButton_; }
     QLabel* titleLabel() const { return titleLabel_; }
 

@@ -1,4 +1,4 @@
-// NavigationControllerDelegate: told by the navigation controller before it shows a pane (Part 1.1's navigationController:willShowViewController:animated:, Part 1.2's stack).
+// NavigationControllerDelegate: told by the navigation controller before it shows a pane, so that the pane's status line is current when it appears.
 #pragma once
 
 namespace vantorel {

@@ -1,4 +1,4 @@
-// PaneApplication: what panes and the save screen need of the application object (Parts 1.2 and 1.3): the save-button decision, showSaveView and closeSaveView.
+// PaneApplication: what panes and the save screen need of the application object: the save-button decision, showSaveView and closeSaveView.
 #pragma once
 
 namespace vantorel {
@@ -6,11 +6,11 @@ namespace vantorel {
 class PaneApplication {
 public:
     virtual ~PaneApplication() = default;
-    // Part 1.1's `allowSaveButton`: panes show the save button only when true.
+    // Panes show the save button only when true (internal installs, or asked for).
     virtual bool allowSaveButton() const = 0;
-    // Part 1.1: present the save screen (a second call while shown does nothing).
+    // Presents the save screen (a second call while shown does nothing).
     virtual void showSaveView() = 0;
-    // Part 1.1: dismiss the save screen, sent by the screen itself when done.
+    // Dismisses the save screen, sent by the screen itself when done.
     virtual void closeSaveView() = 0;
 };
 

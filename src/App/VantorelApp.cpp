@@ -1,10 +1,11 @@
-// VantorelApp: Part 1.1's application object.
+// VantorelApp: the application object: launch and exit, the status line, the pane refresh walk, the save screen.
 #include "App/VantorelApp.h"
 
 #include "App/NavigationController.h"
 #include "App/VantorelPaneController.h"
 #include "App/VantorelSaveViewController.h"
 #include "Model/VantorelModel.h"
+#include "Monitor/StatusText.h"
 #include "Platform/Preferences.h"
 
 #include <QDateTime>
@@ -33,11 +34,10 @@ bool VantorelApp::applicationDidFinishLaunching(std::string* error) {
     _window->resize(bounds.isEmpty() ? QSize(480, 800) : QSize(std::min(bounds.width(), 560), bounds.height() * 9 / 10));
 
     launcher_ = std::make_unique<MonitorLauncher>();
-    _updateMessage = "Connecting...";
-    _dateFormat = QStringLiteral("'Updated' yyyy-MM-dd 'at' HH:mm:ss");
+    _updateMessage = StatusText::kConnecting;
 
     auto root = std::make_unique<VantorelPaneController>(nullptr, "/", this);
-    root->setStatus(std::string("Connecting"), true);
+    root->setStatus(std::string(StatusText::kFirstConnecting), true);
     auto* navigation = new NavigationController(std::move(root));
     _navController = navigation;
     _window->setCentralWidget(navigation);
@@ -45,12 +45,13 @@ bool VantorelApp::applicationDidFinishLaunching(std::string* error) {
     _window->raise();
     _window->activateWindow();
     // The delegate is set once the root is on screen: the first pane keeps reading
-    // "Connecting" until the first update (Part 1.1's edge case), as on the handset.
+    // "Connecting" until the first update, as on the handset (deliberate: the root is
+    // not told "Connecting..." when it first appears).
     navigation->setDelegate(this);
 
     // Creates the model and queues restartMonitor on the main queue: connecting
     // starts after launch returns.
-    return launcher_->start(options_.source, this, error, options_.timeScale);
+    return launcher_->start(options_.source, this, error);
 }
 
 void VantorelApp::applicationWillTerminate() {
@@ -77,7 +78,7 @@ void VantorelApp::getRSSIPref() {
 
 void VantorelApp::getSaveButtonPref() {
     // The internal-install marker, as on the handset; our own setting and
-    // --allow-save also enable it (Part 1.1 "Left to the implementer").
+    // --allow-save also enable it, since desktop installs have no such marker.
     _allowSaveButton = Preferences::internalInstallMarkerExists() ||
                        Preferences::ownBool(Preferences::kAllowSaveButton).value_or(false) || options_.allowSave;
 }
@@ -97,7 +98,7 @@ void VantorelApp::updateViewControllerFromModel() {
         }
         panes[i]->reloadWithNode(node);
     }
-    if (m->isConnected()) _updateMessage = QDateTime::currentDateTime().toString(_dateFormat).toStdString();
+    if (m->isConnected()) _updateMessage = StatusText::updated(QDateTime::currentDateTime());
     updateStatusForViewController(_navController->topPane());
 }
 
@@ -107,7 +108,7 @@ void VantorelApp::updateStatusForViewController(VantorelPaneController* pane) {
     if (m && m->isConnected())
         pane->setStatus(_updateMessage, false);
     else
-        pane->setStatus(std::string("Connecting..."), true);
+        pane->setStatus(std::string(StatusText::kConnecting), true);
 }
 
 void VantorelApp::navigationControllerWillShow(NavigationController&, VantorelPaneController& pane) {

@@ -1,10 +1,10 @@
-// VantorelApp: the application object and its own delegate: launch and exit, the preferences, the status line, refreshing the panes, and the save screen (Part 1.1).
+// VantorelApp: the application object and its own delegate: launch and exit, the preferences, the status line, refreshing the panes, and the save screen.
 #pragma once
 
 #include "App/NavigationControllerDelegate.h"
 #include "App/PaneApplication.h"
 #include "Model/ApplicationObject.h"
-#include "cli/MonitorLauncher.h"
+#include "Monitor/MonitorLauncher.h"
 
 #include <QObject>
 
@@ -29,13 +29,13 @@ public:
     struct Options {
         MonitorLauncher::Source source;  // where the monitor's data comes from
         bool allowSave = false;          // --allow-save
-        double timeScale = 1.0;          // tests only: scales the model's 5 s and 2 s
     };
 
     explicit VantorelApp(Options options);
     ~VantorelApp() override;
 
-    // Part 1.1's launch sequence; false (with *error) when the in-process service
+    // Reads the preferences, opens the window on the root pane and starts the
+    // monitor (connecting begins once the event loop runs); false (with *error) when the in-process service
     // cannot start.
     bool applicationDidFinishLaunching(std::string* error);
     void applicationWillTerminate();
@@ -57,8 +57,6 @@ public:
     NavigationController* navigationController() const { return _navController; }
     VantorelSaveViewController* saveViewController() const { return _saveViewController; }
     VantorelModel* model() const { return launcher_ ? launcher_->model() : nullptr; }
-    const std::string& updateMessage() const { return _updateMessage; }
-    bool unsetRSSI() const { return _unsetRSSI; }
 
 private:
     std::unique_ptr<QMainWindow> _window;
@@ -67,7 +65,6 @@ private:
     std::unique_ptr<MonitorLauncher> launcher_;      // `_model`, with the service it talks to
     bool _unsetRSSI = false;
     bool _allowSaveButton = false;
-    QString _dateFormat;                             // `_dateFormatter`'s pattern
     std::string _updateMessage;
     Options options_;
 };

@@ -1,4 +1,4 @@
-// VantorelCell: one row of a pane, a drill-down row or a value row, with the layout arithmetic of Part 1.2.
+// VantorelCell: a pane's row: the key inset 10 from the left, the value flush right or 50 right of the key and scrollable.
 #include "App/VantorelCell.h"
 
 #include <QApplication>
@@ -7,6 +7,7 @@
 #include <QPainter>
 #include <QScrollArea>
 
+#include <algorithm>
 #include <cmath>
 
 namespace vantorel {
@@ -48,7 +49,7 @@ VantorelCell::VantorelCell(CellStyle style, std::string reuseIdentifier, QWidget
     key_ = makeLabel(boldFont(), scrollContent_);
     value_ = makeLabel(regularFont(), scrollContent_);
     view_->setWidget(scrollContent_);
-    view_->setGeometry(0, 0, width(), kRowHeight);
+    view_->setGeometry(0, 0, width(), kRowHeight - kSeparatorHeight);
     makeAccessory();
     resize(width(), kRowHeight);
 }
@@ -114,7 +115,7 @@ void VantorelCell::setLayoutKey() {
     key_->setGeometry(content.x() + kKeyInset, centred(content.height(), k.height()), k.width(), k.height());
 }
 
-void VantorelCell::setLayout() {
+void VantorelCell::setLayoutValue() {
     layoutMode_ = LayoutMode::Full;
     // The base layout: only the accessory has a place of its own.
     placeAccessory();
@@ -125,7 +126,7 @@ void VantorelCell::setLayout() {
     key_->setGeometry(content.x() + kKeyInset, centred(content.height(), k.height()), k.width(), k.height());
 
     // A drill-down row reused for a leaf has no value label: its value counts as
-    // the measure of nothing (Part 1.2 keeps that behaviour).
+    // the measure of nothing (deliberate: the handset's reused cells behave so).
     const QSize v = value_ ? measure(value_->text()) : QSize(0, 0);
     const int needed = kKeyInset + k.width() + kValueGap + v.width();
     if (value_) {
@@ -135,8 +136,10 @@ void VantorelCell::setLayout() {
     }
     if (view_) {
         const int extent = W < needed ? W + k.width() + v.width() : W;
-        scrollContent_->resize(extent, kRowHeight);
-        view_->setGeometry(content.x(), content.y(), W, kRowHeight);
+        // Above the separator, which the cell paints along its bottom pixel row.
+        const int viewHeight = std::max(0, content.height() - kSeparatorHeight);
+        scrollContent_->resize(extent, viewHeight);
+        view_->setGeometry(content.x(), content.y(), W, viewHeight);
     }
 }
 
@@ -150,7 +153,7 @@ void VantorelCell::resizeEvent(QResizeEvent* event) {
     QWidget::resizeEvent(event);
     switch (layoutMode_) {
         case LayoutMode::Key: setLayoutKey(); break;
-        case LayoutMode::Full: setLayout(); break;
+        case LayoutMode::Full: setLayoutValue(); break;
         case LayoutMode::None: break;
     }
     placeAccessory();

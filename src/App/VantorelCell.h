@@ -1,4 +1,4 @@
-// VantorelCell: one row of a pane, a drill-down row or a value row, with the layout arithmetic of Part 1.2.
+// VantorelCell: one row of a pane, a drill-down row or a value row, laid out as the handset's rows: key at the left, value flush right or scrolled.
 #pragma once
 
 #include <QWidget>
@@ -20,11 +20,12 @@ public:
     static constexpr int kKeyInset = 10;     // the key's left edge within the content area
     static constexpr int kValueGap = 50;     // a long value starts this far right of its key
     static constexpr int kFontSize = 15;     // bold key, regular value (pixels)
+    static constexpr int kSeparatorHeight = 1;
 
-    // The platform's row styles; Part 1.2 makes every row with the value style.
+    // The platform's row styles; every row is made with the value style.
     enum class CellStyle { Default, Value1 };
     enum class AccessoryType { None, DisclosureIndicator };
-    // What the cell was made as; a reused cell keeps it (Part 1.2).
+    // What the cell was made as; a reused cell keeps it, as the platform's cells do.
     enum class Kind { DrillDown, Value };
 
     // Selects the constructor that stands for `initWithStyleKey:reuseIdentifier:`.
@@ -42,7 +43,7 @@ public:
     QLabel* value() const { return value_; }   // nullptr in a drill-down row
     QScrollArea* view() const { return view_; } // nullptr in a drill-down row
     Kind kind() const { return view_ ? Kind::Value : Kind::DrillDown; }
-    CellStyle style() const { return style_; }
+    CellStyle cellStyle() const { return style_; }
     const std::string& reuseIdentifier() const { return reuseIdentifier_; }
 
     void setAccessoryType(AccessoryType type);
@@ -53,23 +54,22 @@ public:
     // The scroll extent of `view` (its scrolled content's size); empty without `view`.
     QSize scrollExtent() const;
 
-    // Part 1.2's `setLayoutKey` (drill-down row) and `setLayout` (value row). Each
-    // is run again whenever the row changes size, so that the arithmetic always
-    // uses the row's current content area.
+    // The drill-down row's layout (the key alone) and the value row's (key, value and
+    // scroll extent). Each is run again whenever the row changes size, so that the
+    // arithmetic always uses the row's current content area.
     void setLayoutKey();
-    void setLayout();
-    using QWidget::setLayout;
+    void setLayoutValue();
 
-    // The fonts of Part 1.2: bold system 15 pt (key, and every measurement) and
-    // system 15 pt (value).
+    // Bold system 15 pt (key, and every measurement) and system 15 pt (value).
     static QFont boldFont();
     static QFont regularFont();
-    // A text's size as Part 1.2 measures it: in the bold 15 pt font.
+    // A text's size as the rows measure it: in the bold 15 pt font, values included.
     static QSize measure(const QString& text);
 
 protected:
     void resizeEvent(QResizeEvent* event) override;
-    // The row separator: a hairline along the bottom, from the key's inset.
+    // The row separator: a hairline along the bottom, from the key's inset. The value
+    // row's scroll view stops one pixel above it so that it stays visible.
     void paintEvent(QPaintEvent* event) override;
 
 private:

@@ -1,4 +1,4 @@
-// VantorelPaneController: one level of the display tree as a table pane with its toolbar (Part 1.2).
+// VantorelPaneController: one level of the display tree as a table pane with its toolbar (status, activity, save).
 #include "App/VantorelPaneController.h"
 
 #include "App/ActivityIndicator.h"
@@ -22,11 +22,6 @@ namespace {
 
 constexpr const char* kUntitled = "Vantorel";
 constexpr int kStatusFontSize = 14;
-
-// Part 2.3's path rule: "/" + name below the root, parent + "/" + name deeper.
-std::string childPath(const std::string& parent, const std::string& name) {
-    return parent == "/" ? "/" + name : parent + "/" + name;
-}
 
 }  // namespace
 
@@ -152,8 +147,6 @@ void VantorelPaneController::createToolbarItems() {
     }
 }
 
-int VantorelPaneController::toolbarItemCount() const { return int(toolbar_->actions().size()); }
-
 int VantorelPaneController::numberOfRowsInSection() const {
     const std::vector<NodeRef>* children = _nodes ? _nodes->childNodes() : nullptr;
     return children ? int(children->size()) : 0;
@@ -187,10 +180,11 @@ VantorelCell* VantorelPaneController::cellForRowAtIndexPath(int row) {
         cell->key()->setText(name);
         cell->setAccessoryType(VantorelCell::AccessoryType::None);
         // A drill-down row reused for a leaf has no value label: the value is not
-        // shown until the table makes a new cell (kept, Part 1.2).
+        // shown until the table makes a new cell (deliberate: the handset's reused
+        // cells behave so).
         const std::string* value = child->value();
         if (cell->value()) cell->value()->setText(value ? QString::fromStdString(*value) : QString());
-        cell->setLayout();
+        cell->setLayoutValue();
     }
     return cell;
 }
@@ -234,7 +228,7 @@ void VantorelPaneController::didSelectRowAtIndexPath(std::optional<int> row) {
                                          QItemSelectionModel::Deselect | QItemSelectionModel::Rows);
         return;
     }
-    auto pane = std::make_unique<VantorelPaneController>(child, childPath(_keyPath, child->displayName()),
+    auto pane = std::make_unique<VantorelPaneController>(child, VantorelModelNode::childPath(_keyPath, child->displayName()),
                                                          application_);
     pane->setStatus(&_status, _isLoading);
     if (navigationController_) navigationController_->push(std::move(pane), true);

@@ -1,4 +1,4 @@
-// VantorelPaneController: one level of the display tree as a table pane with its toolbar (Part 1.2).
+// VantorelPaneController: one level of the display tree as a table pane with its toolbar (status, activity, save).
 #pragma once
 
 #include "Model/VantorelModelNode.h"
@@ -25,7 +25,7 @@ class VantorelCell;
 // The platform's table view controller stands behind this class: a one-column
 // table of 50-point rows above the pane's toolbar. Its rows are VantorelCells that
 // go through a reuse pool, as the platform's cells do, so that a reused cell keeps
-// the kind it was made as (Part 1.2).
+// the kind it was made as.
 class VantorelPaneController : public QWidget {
     Q_OBJECT
 public:
@@ -42,7 +42,6 @@ public:
     const std::string& title() const { return title_; }
     const std::string& status() const { return _status; }
     bool isLoading() const { return _isLoading; }
-    PaneApplication* application() const { return application_; }
 
     // The platform's appearance calls, sent by the navigation controller.
     void viewWillAppear();
@@ -58,7 +57,7 @@ public:
     // save button only when the application allows it.
     void createToolbarItems();
 
-    // The data source and delegate of Part 1.2, by row (the index path's last index).
+    // The table's data source and delegate, by row (the index path's last index).
     int numberOfRowsInSection() const;
     VantorelCell* cellForRowAtIndexPath(int row);
     // Selection; std::nullopt stands for "no index path".
@@ -74,13 +73,11 @@ public:
     NavigationController* navigationController() const { return navigationController_; }
     void setNavigationController(NavigationController* controller) { navigationController_ = controller; }
 
-    // What tests and the navigation controller look at.
+    // The table, its rows' cells and the cells waiting for reuse.
     QTableWidget* tableView() const { return table_; }
     VantorelCell* cellAtRow(int row) const;     // the cell shown in that row
     std::size_t reusePoolSize() const { return reusePool_.size(); }
-    QToolBar* toolbar() const { return toolbar_; }
-    int toolbarItemCount() const;
-    ActivityIndicator* activityIndicator() const { return activityIndicator_; }
+    // The toolbar's items: the indicator's action is hidden while not loading.
     QAction* activityIndicatorItem() const { return activityIndicatorItem_; }
     QLabel* statusLabel() const { return statusLabel_; }
     QAction* saveItem() const { return saveItem_; }  // nullptr without the save button
@@ -94,7 +91,6 @@ protected:
 private:
     void updateTitle();
 
-    // The fields of Part 1.2, in its order.
     NodeRef _nodes;
     std::string _keyPath;
     std::string _status;

@@ -1,7 +1,8 @@
-// VantorelSaveViewController: the snapshot save screen of Part 1.3 as a modal QDialog; the file goes through libplist (XML) into the diagnostic-log directory.
+// VantorelSaveViewController: the snapshot save screen as a modal QDialog; the file goes through libplist (XML) into the diagnostic-log directory.
 #include "App/VantorelSaveViewController.h"
 
 #include "App/PaneApplication.h"
+#include "Model/MonitorClock.h"
 #include "Platform/DateDescription.h"
 #include "Platform/DiagnosticLogDirectory.h"
 #include "Platform/StringFormat.h"
@@ -22,21 +23,14 @@
 #include <QVBoxLayout>
 
 #include <algorithm>
-#include <mutex>
 
 namespace vantorel {
 
 namespace {
 
-std::mutex gClockMutex;
-VantorelSaveViewController::Clock gClock;
+std::chrono::system_clock::time_point now() { return MonitorClock::current().now(); }
 
-std::chrono::system_clock::time_point now() {
-    std::lock_guard<std::mutex> lock(gClockMutex);
-    return gClock ? gClock() : std::chrono::system_clock::now();
-}
-
-// Part 1.3 list data: each row's label font.
+// Each row's label font.
 const char* const kRowFontFamily = "Helvetica";
 constexpr int kRowFontPoints = 13;
 // The list grows with its rows up to this many (the model's contents are at most
@@ -51,20 +45,14 @@ QString descriptionOf(const Value& element) {
 }
 
 // Writes the snapshot in place (not atomically: a failed write may leave a partial
-// file, which Part 1.3 keeps). Returns the reason of a failure, empty on success.
-std::string writeSnapshot(const Value& snapshot, const std::string& path) {
+// file, as the handset's tool does). False when anything failed.
+bool writeSnapshot(const Value& snapshot, const std::string& path) {
     const std::optional<Bytes> bytes = PropertyListSerialization::write(snapshot, PropertyListSerialization::Format::XML);
-    if (!bytes) return "the contents cannot be written as a property list";
-    std::string directoryError;
-    if (!DiagnosticLogDirectory::ensureExists(&directoryError)) return directoryError;
+    if (!bytes || !DiagnosticLogDirectory::ensureExists(nullptr)) return false;
     QFile file(QString::fromStdString(path));
-    if (!file.open(QIODevice::WriteOnly | QIODevice::Truncate)) return file.errorString().toStdString();
+    if (!file.open(QIODevice::WriteOnly | QIODevice::Truncate)) return false;
     const auto size = static_cast<qint64>(bytes->size());
-    const qint64 written = file.write(reinterpret_cast<const char*>(bytes->data()), size);
-    const bool flushed = file.flush();
-    if (written != size || !flushed) return file.errorString().toStdString();
-    file.close();
-    return std::string();
+    return file.write(reinterpret_cast<const char*>(bytes->data()), size) == size && file.flush();
 }
 
 }  // namespace
@@ -136,11 +124,6 @@ VantorelSaveViewController::VantorelSaveViewController(const Value& saveHistory,
 
 VantorelSaveViewController::~VantorelSaveViewController() = default;
 
-void VantorelSaveViewController::setClock(Clock clock) {
-    std::lock_guard<std::mutex> lock(gClockMutex);
-    gClock = std::move(clock);
-}
-
 void VantorelSaveViewController::fillContentTable() {
     const QFont font(QString::fromLatin1(kRowFontFamily), kRowFontPoints);
     for (const Value& element : *_saveHistory) {
@@ -194,8 +177,7 @@ void VantorelSaveViewController::savePressed() {
         static_cast<long>(std::chrono::duration_cast<std::chrono::seconds>(pressed.time_since_epoch()).count());
     const std::string directory = DiagnosticLogDirectory::path();
     lastWritePath_ = StringFormat::format("%s/VantorelSnapshot-%ld.vantorel", directory.c_str(), seconds);
-    lastWriteError_ = writeSnapshot(Value(snapshot), lastWritePath_);
-    if (!lastWriteError_.empty()) {
+    if (!writeSnapshot(Value(snapshot), lastWritePath_)) {
         SystemLog::log(SystemLog::kError, "Unable to write snapshot to %s", lastWritePath_.c_str());
         showWriteError();
     }
@@ -216,7 +198,7 @@ void VantorelSaveViewController::reject() {
 
 void VantorelSaveViewController::showWriteError() {
     // Owned by the screen's parent, not the screen: the alert stays up after the
-    // application has closed the screen (Part 1.3 step 5).
+    // application has closed the screen.
     auto* alert = new QMessageBox(parentWidget());
     alert->setObjectName(QStringLiteral("fileErrorAlert"));
     alert->setAttribute(Qt::WA_DeleteOnClose);

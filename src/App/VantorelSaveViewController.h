@@ -1,4 +1,4 @@
-// VantorelSaveViewController: the modal snapshot save screen; lists the contents, takes a description, writes one XML property-list snapshot (Part 1.3).
+// VantorelSaveViewController: the modal snapshot save screen; lists the contents, takes a description, writes one XML property-list snapshot.
 #pragma once
 
 #include "PropertyList/Value.h"
@@ -8,7 +8,6 @@
 #include <QPointer>
 
 #include <chrono>
-#include <functional>
 #include <string>
 
 class QLineEdit;
@@ -19,8 +18,8 @@ namespace vantorel {
 
 class PaneApplication;
 
-// The snapshot file is written as an XML property list (the spec allows either format;
-// XML keeps it readable by a person and by any plist tool). Return in the text field,
+// The snapshot file is written as an XML property list (readers take either format;
+// XML keeps it readable by a person and by any plist tool). Times come from MonitorClock. Return in the text field,
 // a click on a row and a click on the background only take the keyboard focus away
 // from the field: neither button is a default button, so Return never saves. Escape
 // and the window's close button act as Cancel (the application closes the screen).
@@ -28,17 +27,10 @@ class VantorelSaveViewController : public QDialog {
     Q_OBJECT
 
 public:
-    using Clock = std::function<std::chrono::system_clock::time_point()>;
-
     // `initWithSaveHistory:`: `_timeStamp` = now; `_saveHistory` = a deep copy of the
     // array (an empty array when saveHistory is null or not an array).
     VantorelSaveViewController(const Value& saveHistory, PaneApplication* application, QWidget* parent = nullptr);
     ~VantorelSaveViewController() override;
-
-    // The clock read for `_timeStamp` and for the file name; system_clock::now unless
-    // set. Process-wide so a test can set it before the screen is created; an empty
-    // function restores the system clock.
-    static void setClock(Clock clock);
 
     // The outlets (properties `saveContentTable` and `saveDescription`) and the buttons.
     QListWidget* saveContentTable() const { return saveContentTable_; }
@@ -46,18 +38,13 @@ public:
     QPushButton* saveButton() const { return saveButton_; }
     QPushButton* cancelButton() const { return cancelButton_; }
 
-    std::chrono::system_clock::time_point timeStamp() const { return _timeStamp; }
-    const ArrayRef& saveHistory() const { return _saveHistory; }
-
-    // The path of the last Save (written or not), empty before the first; the reason
-    // of the last failure, empty after a success.
+    // The path of the last Save (written or not), empty before the first.
     const std::string& lastWritePath() const { return lastWritePath_; }
-    const std::string& lastWriteError() const { return lastWriteError_; }
     // The "File Error" alert of the last failed Save while it is open, else null.
     QMessageBox* errorAlert() const { return errorAlert_; }
 
 public slots:
-    // Part 1.3 Algorithms: writes the snapshot, reports a failure, then asks the
+    // Writes the snapshot, reports a failure, then asks the
     // application (queued) to close the screen.
     void savePressed();
     // Asks the application (queued) to close the screen; writes nothing.
@@ -88,7 +75,6 @@ private:
     QPushButton* cancelButton_ = nullptr;
     PaneApplication* application_ = nullptr;
     std::string lastWritePath_;
-    std::string lastWriteError_;
     QPointer<QMessageBox> errorAlert_;
     bool closeRequested_ = false;
 };

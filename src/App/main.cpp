@@ -1,9 +1,9 @@
-// vantorel: the program a user starts: the window with drill-down panes on the embedded emulator, a replay or a running service (Part 1.1); the terminal view when there is no display.
+// vantorel: the program a user starts: the window with drill-down panes on the embedded emulator, a replay or a running service; the terminal view when there is no display.
 #include "App/VantorelApp.h"
 #include "Platform/QuitOnSignal.h"
 #include "Platform/SystemLog.h"
-#include "cli/MonitorLauncher.h"
-#include "cli/WatchCommand.h"
+#include "Monitor/MonitorLauncher.h"
+#include "Monitor/TerminalView.h"
 
 #include <QApplication>
 #include <QCommandLineParser>
@@ -53,7 +53,7 @@ int main(int argc, char** argv) {
         auto source = parseOptions(app, parser);
         if (!source) return 2;
         std::fprintf(stderr, "vantorel: no display (DISPLAY and WAYLAND_DISPLAY are unset): showing the terminal view\n");
-        return WatchCommand::runTerminal(*source, "vantorel");
+        return TerminalView::run(*source, "vantorel");
     }
 
     QApplication app(argc, argv);

@@ -1,4 +1,4 @@
-// ApplicationObject: what the model needs of "the application object" (Part 2.2 refresh step 4): the Qt application and the terminal view each play that role.
+// ApplicationObject: what the model tells the program that shows its display after new data; the window and the terminal view each play that role.
 #pragma once
 
 namespace vantorel {
@@ -6,7 +6,7 @@ namespace vantorel {
 class ApplicationObject {
 public:
     virtual ~ApplicationObject() = default;
-    // New data was decoded: reload the visible panes from the model (Part 1.1).
+    // New data was decoded: reload what is shown from the model.
     virtual void updateViewControllerFromModel() = 0;
 };
 

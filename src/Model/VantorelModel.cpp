@@ -1,7 +1,8 @@
-// VantorelModel: Part 2.1 (ports and callbacks), Part 2.2 (start-up, retries, refresh) and Part 2.3 (tree cache, save contents).
+// VantorelModel: opens the log channel, picks the decoder for the modem's technology, retries every 5 s, refreshes the display every 2 s.
 #include "Model/VantorelModel.h"
 
 #include "Model/ApplicationObject.h"
+#include "Model/MonitorClock.h"
 #include "Platform/LocalMessagePort.h"
 #include "Platform/RemoteMessagePort.h"
 #include "Platform/SystemLog.h"
@@ -13,7 +14,6 @@
 #include <QTimer>
 #include <QUuid>
 
-#include <cmath>
 
 namespace vantorel {
 
@@ -21,21 +21,14 @@ void VantorelModel::LaterDeleter::operator()(QObject* object) const {
     if (object) object->deleteLater();
 }
 
-VantorelModel::VantorelModel(ApplicationObject* application, std::string serviceName, double timeScale)
-    : _state(Dictionary::create()),
-      application_(application),
-      serviceName_(std::move(serviceName)),
-      timeScale_(timeScale > 0 ? timeScale : 1.0) {}
+VantorelModel::VantorelModel(ApplicationObject* application, std::string serviceName)
+    : _state(Dictionary::create()), application_(application), serviceName_(std::move(serviceName)) {}
 
 VantorelModel::~VantorelModel() { destroyPorts(); }
 
 std::string VantorelModel::defaultServiceName() { return TelephonyServiceConnection::defaultServiceName(); }
 
-std::chrono::milliseconds VantorelModel::scaled(std::chrono::milliseconds ms) const {
-    return std::chrono::milliseconds(std::max<long long>(1, std::llround(double(ms.count()) * timeScale_)));
-}
-
-// ---- Part 2.1 -------------------------------------------------------------
+// ---- The channel ---------------------------------------------------------
 
 bool VantorelModel::createPorts() {
     const QString uuid = QUuid::createUuid().toString(QUuid::WithoutBraces).toUpper();
@@ -112,10 +105,10 @@ void VantorelModel::invalidationCallback(LocalMessagePort* port) {
 
 void VantorelModel::serviceNotificationCallback(const std::string&, const Value&) { refresh(); }
 
-// ---- Part 2.2 -------------------------------------------------------------
+// ---- Start-up and refresh -------------------------------------------------
 
 void VantorelModel::scheduleRetry() {
-    QTimer::singleShot(scaled(kRetryDelay), this, [this] { startMonitor(); });
+    QTimer::singleShot(MonitorClock::current().retryDelay(), this, [this] { startMonitor(); });
 }
 
 void VantorelModel::startMonitor() {
@@ -157,7 +150,7 @@ void VantorelModel::startMonitor() {
 
     SystemLog::log(SystemLog::kError, "Starting the display update timer");
     _displayUpdateTimer = new QTimer(this);
-    _displayUpdateTimer->setInterval(scaled(kDisplayUpdateInterval));
+    _displayUpdateTimer->setInterval(MonitorClock::current().displayUpdateInterval());
     connect(_displayUpdateTimer, &QTimer::timeout, this, [this] { refresh(); });
     _displayUpdateTimer->start();
 }
@@ -201,6 +194,8 @@ void VantorelModel::configureGenerator() {
 
     std::unique_ptr<LogGenerator> chosen =
         technology->asString() ? LogGenerator::generatorFromTechnology(*technology->asString()) : nullptr;
+    // The state (and its history) outlives decoders; the display a previous decoder
+    // built in it is bound to that decoder's sections, so a new decoder starts its own.
     if (chosen) LogGenerator::forgetDisplay(*_state);
     _logGenerator = std::move(chosen);
     SystemLog::log(SystemLog::kError, "Got log generated: %p", static_cast<void*>(_logGenerator.get()));
@@ -228,7 +223,7 @@ void VantorelModel::updateWithData(ByteView data) {
     _updated = true;
 }
 
-// ---- Part 2.3 -------------------------------------------------------------
+// ---- The display tree ----------------------------------------------------
 
 NodeRef VantorelModel::topLevelNodes() {
     if (_nodes) return _nodes;

@@ -1,4 +1,4 @@
-// VantorelModel: the monitor core: the baseband log channel (Part 2.1), start-up and technology selection (Part 2.2), and the display tree cache (Part 2.3).
+// VantorelModel: the monitor core: the baseband log channel to the telephony service, start-up with technology selection and retries, and the cached display tree.
 #pragma once
 
 #include "LogGenerator/LogGenerator.h"
@@ -7,7 +7,6 @@
 
 #include <QObject>
 
-#include <chrono>
 #include <memory>
 #include <string>
 
@@ -23,33 +22,29 @@ class TelephonyServiceConnection;
 class VantorelModel : public QObject {
     Q_OBJECT
 public:
-    // The spec's constants (Part 2.2). Tests may scale the retry delay and the
-    // display interval by one factor (`timeScale`); the product never changes them.
-    // The 1.0 s request timeouts are never scaled.
-    static constexpr std::chrono::milliseconds kRetryDelay{5000};
-    static constexpr std::chrono::milliseconds kDisplayUpdateInterval{2000};
+    // Each request to the channel waits at most this long for its send and its reply.
+    // The retry delay and the display tick come from MonitorClock.
     static constexpr double kRequestTimeoutSeconds = 1.0;
 
     // `init`: an empty state, nothing connected. `application` receives
     // updateViewControllerFromModel; `serviceName` is the telephony service's port.
-    explicit VantorelModel(ApplicationObject* application, std::string serviceName = defaultServiceName(),
-                           double timeScale = 1.0);
+    explicit VantorelModel(ApplicationObject* application, std::string serviceName = defaultServiceName());
     ~VantorelModel() override;
     static std::string defaultServiceName();
 
-    // Part 2.1
+    // The channel: a receive port of our own, a send port the service gives us.
     bool isConnected() const { return _recvPort && _sendPort; }
     bool createPorts();
     void destroyPorts();
 
-    // Part 2.2
+    // Start-up (ports, technology query, start command, display tick) and refresh.
     void startMonitor();
     void restartMonitor();
     void configureGenerator();
     void refresh();
     void updateWithData(ByteView data);
 
-    // Part 2.3
+    // The display tree, rebuilt at most once per refresh that saw new data.
     NodeRef topLevelNodes();
     NodeRef nodeAtPath(const std::string& path);
     Value getSaveContents();
@@ -62,12 +57,11 @@ public:
     uint64_t messagesDecoded() const { return messagesDecoded_; }
 
 private:
-    // The three callbacks of Part 2.1 (the model is their context).
+    // The receive port's message and invalidation callbacks and the service's notifications.
     std::optional<Bytes> receiveCallback(int32_t messageId, const Bytes& data);
     void invalidationCallback(LocalMessagePort* port);
     void serviceNotificationCallback(const std::string& name, const Value& info);
     void scheduleRetry();
-    std::chrono::milliseconds scaled(std::chrono::milliseconds ms) const;
 
     // Ports are QObjects that may be inside their own callback when closed: they are
     // deleted from the event loop (deleteLater), never in place.
@@ -75,7 +69,6 @@ private:
         void operator()(QObject* object) const;
     };
 
-    // The fields of Part 2.1, in its order.
     std::unique_ptr<LocalMessagePort, LaterDeleter> _recvPort;
     std::unique_ptr<RemoteMessagePort, LaterDeleter> _sendPort;
     QTimer* _displayUpdateTimer = nullptr;
@@ -90,7 +83,6 @@ private:
     std::unique_ptr<TelephonyServiceConnection> serverConnection_;
     ApplicationObject* application_;
     std::string serviceName_;
-    double timeScale_;
     std::string receivePortName_;
     uint64_t messagesDecoded_ = 0;
 };

@@ -1,4 +1,4 @@
-// VantorelModelLeafNode: a display-tree node with a value string (Part 2.3).
+// VantorelModelLeafNode: a display-tree node with a value string.
 #pragma once
 
 #include "Model/VantorelModelNode.h"

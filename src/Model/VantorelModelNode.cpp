@@ -1,4 +1,4 @@
-// VantorelModelNode: makeTreeFromObject:withPathDictionary:, the display dictionary to tree conversion of Part 2.3.
+// VantorelModelNode: turns the decoder's display dictionary into the tree of rows the panes show, with an index by path.
 #include "Model/VantorelModelNode.h"
 
 #include "LogGenerator/ArrayLock.h"
@@ -12,10 +12,6 @@
 namespace vantorel {
 
 namespace {
-
-std::string childPath(const std::string& parent, const std::string& name) {
-    return parent == "/" ? "/" + name : parent + "/" + name;
-}
 
 NodeRef build(const std::string& name, const Value& value, const std::string& path, PathDictionary& index) {
     NodeRef node;
@@ -33,7 +29,7 @@ NodeRef build(const std::string& name, const Value& value, const std::string& pa
             std::string shown = key;
             // "prefix;name" shows as name, only with exactly one ";".
             if (ordered && std::count(key.begin(), key.end(), ';') == 1) shown = key.substr(key.find(';') + 1);
-            if (NodeRef c = build(shown, *child, childPath(path, shown), index)) children.push_back(std::move(c));
+            if (NodeRef c = build(shown, *child, VantorelModelNode::childPath(path, shown), index)) children.push_back(std::move(c));
         }
         node = std::make_shared<VantorelModelTreeNode>(name, std::move(children));
     } else if (ArrayRef array = value.asArray()) {
@@ -42,7 +38,7 @@ NodeRef build(const std::string& name, const Value& value, const std::string& pa
         std::vector<NodeRef> children;
         for (const Value& element : *array) {
             std::string shown = std::to_string(children.size());
-            if (NodeRef c = build(shown, element, childPath(path, shown), index)) children.push_back(std::move(c));
+            if (NodeRef c = build(shown, element, VantorelModelNode::childPath(path, shown), index)) children.push_back(std::move(c));
         }
         ArrayLock::unlockArray();
         node = std::make_shared<VantorelModelTreeNode>(name, std::move(children));
@@ -54,6 +50,10 @@ NodeRef build(const std::string& name, const Value& value, const std::string& pa
 }
 
 }  // namespace
+
+std::string VantorelModelNode::childPath(const std::string& parent, const std::string& name) {
+    return parent == "/" ? "/" + name : parent + "/" + name;
+}
 
 NodeRef VantorelModelNode::makeTreeFromObject(const Value& display, PathDictionary& withPathDictionary) {
     return build("Vantorel", display, "/", withPathDictionary);

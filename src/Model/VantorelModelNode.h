@@ -1,4 +1,4 @@
-// VantorelModelNode: a named node of the display tree, and makeTreeFromObject:withPathDictionary: (Part 2.3).
+// VantorelModelNode: a named node of the display tree, and the builder of that tree from a display dictionary.
 #pragma once
 
 #include "PropertyList/Value.h"
@@ -30,6 +30,9 @@ public:
     // Builds the tree of a display dictionary: the root is named "Vantorel" at "/";
     // every node is registered in pathDictionary under its path.
     static NodeRef makeTreeFromObject(const Value& display, PathDictionary& withPathDictionary);
+    // The path of the child shown as `name` under `parent`: "/name" below the root,
+    // "parent/name" deeper. Shown names may hold "/" themselves; they are not escaped.
+    static std::string childPath(const std::string& parent, const std::string& name);
 
 private:
     std::string _name;

@@ -1,4 +1,4 @@
-// VantorelModelTreeNode: a display-tree node with child nodes (Part 2.3).
+// VantorelModelTreeNode: a display-tree node with child nodes.
 #pragma once
 
 #include "Model/VantorelModelNode.h"

@@ -1,4 +1,4 @@
-// DecodeCommand: `vantorel-cli decode --technology TECH FILE...` (Parts 2.2 updateWithData:, 3.1 generateLogUsingState:).
+// DecodeCommand: `vantorel-cli decode --technology TECH FILE...`: every message to the decoder, then the display it builds.
 #include "cli/DecodeCommand.h"
 
 #include "LogGenerator/LogGenerator.h"
@@ -7,7 +7,7 @@
 #include "PropertyList/Dictionary.h"
 #include "TelephonyService/Replay/RecordedStream.h"
 #include "cli/StdoutToStderr.h"
-#include "cli/TreeFormatter.h"
+#include "Monitor/TreeFormatter.h"
 
 #include <QCommandLineParser>
 

@@ -1,4 +1,4 @@
-// DecodeCommand: `vantorel-cli decode`: feeds recorded messages to a decoder exactly as the model does (Parts 2.2, 3.1) and prints the display.
+// DecodeCommand: `vantorel-cli decode`: feeds recorded messages to a decoder exactly as the model does and prints the display.
 #pragma once
 
 #include <QStringList>

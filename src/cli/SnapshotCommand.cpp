@@ -1,4 +1,4 @@
-// SnapshotCommand: `vantorel-cli snapshot`: reads a VantorelSnapshot-*.vantorel file with libplist, lists it and writes out its DLF (Parts 1.3, 3.4).
+// SnapshotCommand: `vantorel-cli snapshot`: reads a VantorelSnapshot-*.vantorel file with libplist, lists it and writes out its DLF.
 #include "cli/SnapshotCommand.h"
 
 #include "PropertyList/Array.h"
@@ -19,7 +19,7 @@ namespace {
 
 const char* const kPrefix = "vantorel-cli snapshot";
 
-// A snapshot's three keys and the type each must have (Part 1.3 table).
+// A snapshot's three keys and the type each must have, as the save screen writes them.
 struct RequiredKey {
     const char* key;
     Value::Type type;

@@ -1,4 +1,4 @@
-// SnapshotCommand: `vantorel-cli snapshot FILE [--dlf OUT]`: lists a saved snapshot (Part 1.3 file, Parts 3.1/3.4 entries) and extracts its DLF.
+// SnapshotCommand: `vantorel-cli snapshot FILE [--dlf OUT]`: lists a saved snapshot (display history entries, DLF entry) and extracts its DLF.
 #pragma once
 
 #include <QStringList>

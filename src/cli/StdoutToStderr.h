@@ -1,4 +1,4 @@
-// StdoutToStderr: while it lives, standard output goes to standard error, so that lines the spec sends to standard output (Part 3.3's "Deallocing ClassIndex") stay out of the CLI's data output.
+// StdoutToStderr: while it lives, standard output goes to standard error, so that lines the decoders print on standard output (the class index's "Deallocing ClassIndex" at teardown) stay out of the CLI's data output.
 #pragma once
 
 namespace vantorel {

@@ -1,13 +1,11 @@
-// WatchCommand: `vantorel-cli watch` runs VantorelModel (Parts 2.1-2.3) with the terminal view as its application object.
+// WatchCommand: `vantorel-cli watch` runs the monitor with the terminal view as its application object.
 #include "cli/WatchCommand.h"
 
-#include "Platform/QuitOnSignal.h"
 #include "Platform/SystemLog.h"
-#include "cli/MonitorLauncher.h"
-#include "cli/TerminalView.h"
+#include "Monitor/MonitorLauncher.h"
+#include "Monitor/TerminalView.h"
 
 #include <QCommandLineParser>
-#include <QCoreApplication>
 
 #include <cstdio>
 
@@ -30,21 +28,7 @@ int WatchCommand::run(const QStringList& args) {
         std::fprintf(stderr, "vantorel-cli watch: %s\n", error.c_str());
         return 2;
     }
-    return runTerminal(*source, "vantorel-cli watch");
-}
-
-int WatchCommand::runTerminal(const MonitorLauncher::Source& source, const char* program) {
-    std::string error;
-    TerminalView view;
-    MonitorLauncher launcher;
-    if (!launcher.start(source, &view, &error)) {
-        std::fprintf(stderr, "%s: %s\n", program, error.c_str());
-        return 1;
-    }
-    view.setModel(launcher.model());
-    std::fprintf(stderr, "%s: %s; Ctrl-C ends\n", program, launcher.description().c_str());
-    QuitOnSignal quit;
-    return QCoreApplication::exec();
+    return TerminalView::run(*source, "vantorel-cli watch");
 }
 
 }  // namespace vantorel

@@ -1,4 +1,4 @@
-// vantorel-cli: headless decoding and inspection of recorded streams, and the monitor in the terminal (issue "monitor spine").
+// vantorel-cli: headless decoding and inspection of recorded streams, and the monitor in the terminal.
 #include "cli/DecodeCommand.h"
 #include "cli/InfoCommand.h"
 #include "cli/SnapshotCommand.h"

@@ -1,7 +1,9 @@
-// TerminalView: the terminal view: plays the application object (Part 1.1's updateViewControllerFromModel) and prints the display tree on every refresh.
+// TerminalView: the monitor in a terminal: plays the application object and prints the status line and the display tree on every refresh.
 #pragma once
 
 #include "Model/ApplicationObject.h"
+#include "Monitor/StatusText.h"
+#include "Monitor/MonitorLauncher.h"
 
 #include <QObject>
 
@@ -25,8 +27,12 @@ public:
     void updateViewControllerFromModel() override;
     int refreshes() const { return refreshes_; }
 
-    // The text of one screen: the status line, then the tree (exposed for tests).
+    // The text of one screen: the status line, then the tree.
     std::string screen() const;
+
+    // The terminal view on `source` until Ctrl-C (SIGINT, SIGTERM); `program` prefixes
+    // messages. Needs a running QCoreApplication. Returns the exit code.
+    static int run(const MonitorLauncher::Source& source, const char* program);
 
 private:
     void watchConnection();
@@ -37,7 +43,7 @@ private:
     QTimer* connectionTimer_ = nullptr;
     bool wasConnected_ = true;
     int refreshes_ = 0;
-    std::string status_ = "Connecting...";
+    std::string status_ = StatusText::kConnecting;
 };
 
 }  // namespace vantorel

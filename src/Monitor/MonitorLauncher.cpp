@@ -1,5 +1,5 @@
-// MonitorLauncher: the monitor on an embedded or external telephony service (DESIGN.md "Threads": an in-process service runs on its own thread).
-#include "cli/MonitorLauncher.h"
+// MonitorLauncher: the monitor on an embedded or external telephony service; an in-process service runs on a thread of its own so that the model's blocking requests can be answered.
+#include "Monitor/MonitorLauncher.h"
 
 #include "Model/VantorelModel.h"
 #include "Platform/TechnologyNames.h"
@@ -51,8 +51,7 @@ MonitorLauncher::~MonitorLauncher() {
     if (service_) service_->stop();
 }
 
-bool MonitorLauncher::start(const Source& source, ApplicationObject* application, std::string* error,
-                            double timeScale) {
+bool MonitorLauncher::start(const Source& source, ApplicationObject* application, std::string* error) {
     std::string serviceName = source.service;
     if (source.service.empty()) {
         TelephonyServiceOptions options;
@@ -69,7 +68,7 @@ bool MonitorLauncher::start(const Source& source, ApplicationObject* application
     } else {
         description_ = "service " + source.service;
     }
-    model_ = std::make_unique<VantorelModel>(application, serviceName, timeScale);
+    model_ = std::make_unique<VantorelModel>(application, serviceName);
     VantorelModel* model = model_.get();
     QMetaObject::invokeMethod(model, [model] { model->restartMonitor(); }, Qt::QueuedConnection);
     return true;

@@ -1,4 +1,4 @@
-// TreeFormatter: the display as text: the tree as the panes show it (Part 2.3), the display dictionary as JSON or as an XML property list.
+// TreeFormatter: the display as text: the tree as the panes show it, the display dictionary as JSON or as an XML property list.
 #pragma once
 
 #include "Model/VantorelModelNode.h"

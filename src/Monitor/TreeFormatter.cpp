@@ -1,5 +1,5 @@
-// TreeFormatter: text forms of the display (Part 2.3's tree, JSON through QJsonDocument, XML through libplist).
-#include "cli/TreeFormatter.h"
+// TreeFormatter: text forms of the display (the pane tree, JSON through QJsonDocument, XML through libplist).
+#include "Monitor/TreeFormatter.h"
 
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"

@@ -1,10 +1,11 @@
-// TerminalView: the terminal view of the monitor (Parts 1.1 status line and 2.3 tree, as text).
-#include "cli/TerminalView.h"
+// TerminalView: the status line and the display tree as text, reprinted on every refresh.
+#include "Monitor/TerminalView.h"
 
 #include "Model/VantorelModel.h"
-#include "Platform/TechnologyNames.h"
-#include "cli/TreeFormatter.h"
+#include "Platform/QuitOnSignal.h"
+#include "Monitor/TreeFormatter.h"
 
+#include <QCoreApplication>
 #include <QDateTime>
 #include <QTimer>
 
@@ -20,7 +21,7 @@ TerminalView::~TerminalView() = default;
 void TerminalView::setModel(VantorelModel* model) {
     model_ = model;
     if (!connectionTimer_) {
-        // "Connecting..." while the channel is down (Part 1.1's status), said once per loss.
+        // "Connecting..." while the channel is down, said once per loss.
         connectionTimer_ = new QTimer(this);
         connectionTimer_->setInterval(500);
         connect(connectionTimer_, &QTimer::timeout, this, [this] { watchConnection(); });
@@ -32,7 +33,7 @@ void TerminalView::watchConnection() {
     if (!model_) return;
     const bool connected = model_->isConnected();
     if (!connected && wasConnected_) {
-        status_ = "Connecting...";
+        status_ = StatusText::kConnecting;
         std::fprintf(out_, "%s\n", status_.c_str());
         std::fflush(out_);
     }
@@ -43,7 +44,7 @@ std::string TerminalView::screen() const {
     std::string text = "Vantorel";
     if (model_ && model_->logGenerator()) {
         text += " - ";
-        text += model_->isConnected() ? status_ : "Connecting...";
+        text += model_->isConnected() ? status_ : StatusText::kConnecting;
         text += " - " + std::to_string(model_->messagesDecoded()) + " messages decoded";
     }
     text += "\n\n";
@@ -53,7 +54,7 @@ std::string TerminalView::screen() const {
 
 void TerminalView::updateViewControllerFromModel() {
     ++refreshes_;
-    status_ = QDateTime::currentDateTime().toString(QStringLiteral("'Updated' yyyy-MM-dd 'at' HH:mm:ss")).toStdString();
+    status_ = StatusText::updated(QDateTime::currentDateTime());
     std::string text = screen();
     if (interactive_) {
         // Keep the top of the display in view: cut to the window's height.
@@ -74,6 +75,20 @@ void TerminalView::updateViewControllerFromModel() {
     } else
         std::fprintf(out_, "----\n%s", text.c_str());
     std::fflush(out_);
+}
+
+int TerminalView::run(const MonitorLauncher::Source& source, const char* program) {
+    std::string error;
+    TerminalView view;
+    MonitorLauncher launcher;
+    if (!launcher.start(source, &view, &error)) {
+        std::fprintf(stderr, "%s: %s\n", program, error.c_str());
+        return 1;
+    }
+    view.setModel(launcher.model());
+    std::fprintf(stderr, "%s: %s; Ctrl-C ends\n", program, launcher.description().c_str());
+    QuitOnSignal quit;
+    return QCoreApplication::exec();
 }
 
 }  // namespace vantorel

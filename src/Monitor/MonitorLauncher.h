@@ -1,9 +1,10 @@
-// MonitorLauncher: starts the monitor (VantorelModel, Parts 2.1-2.2) on a chosen source: an in-process service running the emulator or a replay, or a running service by name.
+// MonitorLauncher: starts the monitor (VantorelModel) on a chosen source: an in-process service running the emulator or a replay, or a running service by name.
 #pragma once
 
 #include "TelephonyService/TelephonyServiceThread.h"
 
 #include <memory>
+#include <optional>
 #include <string>
 
 class QCommandLineParser;
@@ -36,8 +37,7 @@ public:
     // Starts the in-process service when the source needs one (on its own thread),
     // creates the model for `application` and queues restartMonitor on the event
     // loop. False with *error when the service cannot start.
-    // `timeScale` scales the model's 5 s retry and 2.0 s display interval (tests only).
-    bool start(const Source& source, ApplicationObject* application, std::string* error, double timeScale = 1.0);
+    bool start(const Source& source, ApplicationObject* application, std::string* error);
     VantorelModel* model() const { return model_.get(); }
     // "emulator (utran)", "replay of FILE", "service NAME".
     std::string description() const { return description_; }
