@@ -24,35 +24,26 @@ RecordedLog readCapture(const std::string& name) {
 
 // The five sections these codes reach, created in the order that makes 0x7132 reach
 // Process PS, Process CO, Serving PLMN, then Process CS.
-class CapturedCodesIndex : public ClassIndex {
-public:
-    CapturedCodesIndex() {
-        processPS = createSection<ProcessPS>();
-        processCO = createSection<ProcessCO>();
-        servingPLMN = createSection<ServingPLMN>();
-        equivalentPLMNList = createSection<EquivalentPLMNList>();
-        processCS = createSection<ProcessCS>();
-        processPS->updateSectionRef(Value(ps));
-        processCO->updateSectionRef(Value(co));
-        servingPLMN->updateSectionRef(Value(plmn));
-        equivalentPLMNList->updateSectionRef(Value(eplmns));
-        processCS->updateSectionRef(Value(cs));
-    }
+struct CapturedCodesIndex : ClassIndex {
     void deliver(const RecordedEntry& entry) const {
         if (const SectionList* subscribers = getSubscribers(entry.logCode))
             for (Base* section : *subscribers) section->updateWithData(entry.record, entry.logCode);
     }
+    template <class Section>
+    std::unique_ptr<Section> bound(Value container) {
+        auto section = createSection<Section>();
+        section->updateSectionRef(container);
+        return section;
+    }
 
-    std::unique_ptr<ProcessPS> processPS;
-    std::unique_ptr<ProcessCO> processCO;
-    std::unique_ptr<ServingPLMN> servingPLMN;
-    std::unique_ptr<EquivalentPLMNList> equivalentPLMNList;
-    std::unique_ptr<ProcessCS> processCS;
-    DictionaryRef ps = Dictionary::create();
-    DictionaryRef co = Dictionary::create();
-    DictionaryRef plmn = Dictionary::create();
-    DictionaryRef cs = Dictionary::create();
+    DictionaryRef ps = Dictionary::create(), co = Dictionary::create(), plmn = Dictionary::create(),
+                  cs = Dictionary::create();
     ArrayRef eplmns = Array::create();
+    std::unique_ptr<ProcessPS> processPS = bound<ProcessPS>(Value(ps));
+    std::unique_ptr<ProcessCO> processCO = bound<ProcessCO>(Value(co));
+    std::unique_ptr<ServingPLMN> servingPLMN = bound<ServingPLMN>(Value(plmn));
+    std::unique_ptr<EquivalentPLMNList> equivalentPLMNList = bound<EquivalentPLMNList>(Value(eplmns));
+    std::unique_ptr<ProcessCS> processCS = bound<ProcessCS>(Value(cs));
 };
 
 // The first entry of a code whose payload byte (record offset 13 + n) has the value.

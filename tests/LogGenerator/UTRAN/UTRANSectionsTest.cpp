@@ -109,45 +109,32 @@ Bytes neighbourRecord(std::initializer_list<uint32_t> words, unsigned count, siz
     return b.resize(length).build();
 }
 
-TEST(NeighbourCellListSection, EveryBitFieldOfAnEntryAndEntriesPastTheRecordsEnd) {
+// Run under a locale that writes 0,5: the display always shows 0.500000.
+TEST(NeighbourCellListSection, EveryBitFieldOfAnEntryAndEntriesPastTheRecordsEndWhateverTheLocale) {
+    const std::string previous = std::setlocale(LC_ALL, nullptr);
+    ASSERT_NE(std::setlocale(LC_ALL, "de_DE.UTF-8"), nullptr)
+        << "the de_DE.UTF-8 locale is missing: scripts/install-deps compiles it";
     const Bytes one = neighbourRecord({neighbourWord(10088, 5, 128, 1, 0)}, 1, 184);
-    struct Row {
-        const char* what;
-        std::vector<Bytes> records;
-        const char* expected;
-    };
-    const Row rows[] = {
-        {"one entry", {one}, "[{UARFCN=10088, Cell ID=5, Filter RSCP=0.500000, Status=MSET, inJDCS=FALSE}]"},
-        {"each field at its maximum, the others zero",
-         {neighbourRecord({neighbourWord(0x3FFF, 0, 0, 0, 0), neighbourWord(0, 0x7F, 0, 2, 0),
+    const char* const oneShown = "[{UARFCN=10088, Cell ID=5, Filter RSCP=0.500000, Status=MSET, inJDCS=FALSE}]";
+    const std::pair<std::vector<Bytes>, const char*> rows[] = {
+        {{one}, oneShown},
+        // Each field at its maximum, the others zero.
+        {{neighbourRecord({neighbourWord(0x3FFF, 0, 0, 0, 0), neighbourWord(0, 0x7F, 0, 2, 0),
                            neighbourWord(0, 0, 0xFF, 3, 0), neighbourWord(0, 0, 0, 0, 1)},
                           4, 232)},
          "[{UARFCN=16383, Cell ID=0, Filter RSCP=0.000000, Status=ASET, inJDCS=FALSE}, "
          "{UARFCN=0, Cell ID=127, Filter RSCP=0.000000, Status=DSET, inJDCS=FALSE}, "
          "{UARFCN=0, Cell ID=0, Filter RSCP=0.996094, inJDCS=FALSE}, "
          "{UARFCN=0, Cell ID=0, Filter RSCP=0.000000, Status=ASET, inJDCS=TRUE}]"},
-        {"a count past the record's end stops at the last whole entry",
-         {neighbourRecord({neighbourWord(1, 1, 0, 0, 0), neighbourWord(2, 2, 0, 0, 0)}, 3, 210)},
-         "[{UARFCN=1, Cell ID=1, Filter RSCP=0.000000, Status=ASET, inJDCS=FALSE}, "
-         "{UARFCN=2, Cell ID=2, Filter RSCP=0.000000, Status=ASET, inJDCS=FALSE}]"},
-        {"no entry inside the record", {one, neighbourRecord({}, 1, 183)}, "[]"},
-        {"a 20-byte record leaves the list as it was", {one, neighbourRecord({}, 0, 20)},
-         "[{UARFCN=10088, Cell ID=5, Filter RSCP=0.500000, Status=MSET, inJDCS=FALSE}]"},
+        // A count past the record's end stops at the last whole entry.
+        {{neighbourRecord({neighbourWord(1, 1, 0, 0, 0)}, 3, 199)},
+         "[{UARFCN=1, Cell ID=1, Filter RSCP=0.000000, Status=ASET, inJDCS=FALSE}]"},
+        {{one, neighbourRecord({}, 1, 183)}, "[]"},
+        {{one, neighbourRecord({}, 0, 20)}, oneShown},  // a 20-byte record changes nothing
     };
-    for (const Row& row : rows)
-        EXPECT_EQ(Bound<UTRANNeighbhorMeasurements>(true).feed(row.records, 0xD00A).shown(), row.expected) << row.what;
-}
-
-// The user's locale writes 0,5; the display always shows 0.500000.
-TEST(NeighbourCellListSection, FilterRSCPUsesTheDecimalPointWhateverTheProcessLocale) {
-    const std::string previous = std::setlocale(LC_ALL, nullptr);
-    ASSERT_NE(std::setlocale(LC_ALL, "de_DE.UTF-8"), nullptr)
-        << "the de_DE.UTF-8 locale is missing: scripts/install-deps compiles it";
-    const std::string shown = Bound<UTRANNeighbhorMeasurements>(true)
-                                  .feed(neighbourRecord({neighbourWord(10088, 5, 128, 1, 0)}, 1, 184), 0xD00A)
-                                  .shown();
+    for (const auto& [records, expected] : rows)
+        EXPECT_EQ(Bound<UTRANNeighbhorMeasurements>(true).feed(records, 0xD00A).shown(), expected);
     std::setlocale(LC_ALL, previous.c_str());
-    EXPECT_EQ(shown, "[{UARFCN=10088, Cell ID=5, Filter RSCP=0.500000, Status=MSET, inJDCS=FALSE}]");
 }
 
 // 0xD00C: the u16 at 14 holds the TRCH count t in bits 6-11, byte 15's high nibble the
@@ -218,17 +205,11 @@ TEST(UTRANDecoder, TheFirstTemplateWhoseNameHoldsUTRANInAnyCaseIsUsedAndNoneLeav
     EXPECT_EQ(LogGenerator::generatorFromTechnology(kTSLogChannelTechnology_Morvek_UTRAN2), nullptr);
 }
 
-std::string at(const DictionaryRef& display, std::initializer_list<const char*> path) {
-    Value v(display);
-    for (const char* key : path) {
-        if (DictionaryRef d = v.asDictionary())
-            v = d->get(key);
-        else if (ArrayRef a = v.asArray())
-            v = a->size() > std::stoul(key) ? a->at(std::stoul(key)) : Value();
-        else
-            return "<missing>";
-    }
-    return render(v);
+// What the display shows under group, section and (for a dictionary section) field.
+std::string at(const DictionaryRef& display, const char* group, const char* section, const char* field = nullptr) {
+    const DictionaryRef g = display->get(group).asDictionary();
+    const Value v = g ? g->get(section) : Value();
+    return render(field && v.asDictionary() ? v.asDictionary()->get(field) : v);
 }
 
 TEST(UTRANDecoder, BuiltRecordsReachTheirPlacesInTheDisplayAndNoiseIsShruggedOff) {
@@ -257,16 +238,17 @@ TEST(UTRANDecoder, BuiltRecordsReachTheirPlacesInTheDisplayAndNoiseIsShruggedOff
 
     const DictionaryRef display = g->generateLogUsingState(state);
     ASSERT_TRUE(display);
-    EXPECT_EQ(at(display, {"1;Serving Cell", "RRC Info", "State"}), "Cell DCH");
-    EXPECT_EQ(at(display, {"1;Serving Cell", "Serving Cell Info", "Allowed Access"}), "Emergency Calls Only");
-    EXPECT_EQ(at(display, {"1;Serving Cell", "Serving Cell Info", "Local Area Code"}), "23071");
-    EXPECT_EQ(at(display, {"1;Serving Cell", "Serving Cell Info", "Downlink UARFCN"}), "10055");
-    EXPECT_EQ(at(display, {"2;Neighbours", "Neighbor Cell List", "0", "Filter RSCP"}), "0.500000");
-    EXPECT_EQ(at(display, {"2;Neighbours", "GSM Neighbor Cell List"}), "[]");
-    EXPECT_EQ(at(display, {"3;Link Quality", "TRCH BLER", "0", "TRCH BLER Measurement"}), "9");
-    EXPECT_EQ(at(display, {"3;Link Quality", "CCTRCH SIR", "0", "SIR", "5"}), "15");
-    EXPECT_EQ(at(display, {"4;Packet Data", "PDP Context Info", "0", "APN"}), "cmnet");
-    EXPECT_EQ(at(display, {"5;SIM", "SIM Info", "EF-ICCID"}), "898600");
+    EXPECT_EQ(at(display, "1;Serving Cell", "RRC Info", "State"), "Cell DCH");
+    EXPECT_EQ(at(display, "1;Serving Cell", "Serving Cell Info", "Allowed Access"), "Emergency Calls Only");
+    EXPECT_EQ(at(display, "1;Serving Cell", "Serving Cell Info", "Local Area Code"), "23071");
+    EXPECT_EQ(at(display, "1;Serving Cell", "Serving Cell Info", "Downlink UARFCN"), "10055");
+    EXPECT_EQ(at(display, "2;Neighbours", "Neighbor Cell List"),
+              "[{UARFCN=10088, Cell ID=5, Filter RSCP=0.500000, Status=MSET, inJDCS=FALSE}]");
+    EXPECT_EQ(at(display, "2;Neighbours", "GSM Neighbor Cell List"), "[]");
+    EXPECT_EQ(at(display, "3;Link Quality", "TRCH BLER"), "[{TRCH ID=3, TRCH BLER Measurement=9}]");
+    EXPECT_EQ(at(display, "3;Link Quality", "CCTRCH SIR"), "[{CCTRCH ID=1, TSNUM=2, SIR=[10, 11, 12, 13, 14, 15]}]");
+    EXPECT_EQ(at(display, "4;Packet Data", "PDP Context Info"), "[{APN=cmnet}]");
+    EXPECT_EQ(at(display, "5;SIM", "SIM Info", "EF-ICCID"), "898600");
 }
 
 }  // namespace
