@@ -53,8 +53,25 @@ const RecordedEntry* firstEntry(const RecordedLog& log, uint16_t code, size_t pa
     return nullptr;
 }
 
-TEST(CapturedRecords, EveryCapturedStateRecordShowsATableTextAndNothingIsRejected) {
-    for (const char* file : {"qmdl_example.qmdl", "offline_log_example.mi2log", "cmcc.mi2log", "sprint.mi2log"}) {
+TEST(CapturedRecords, EveryCapturedStateRecordShowsATableTextNothingIsRejectedAndTheLastRecordsWin) {
+    // qmdl_example's last 0x7130: 03 05 00; last 0x7131: 13 06 00; last 0x7132: 01 00 00; 0x7150: count 0.
+    // cmcc's last 0x7135: 14 = 03, 15..17 = 64 F0 00, 18..19 = 11 D6, 20 = 64.
+    const std::pair<const char*, const char*> rows[] = {
+        {"qmdl_example.qmdl",
+         "{MM Service State=REG_STATE_IDLE, MM State=GMM_REGISTERED, MM Sub State=GMM_NO_CELL_AVAILABLE, "
+         "Attach Reject Cause=GMM_GU1_UPDATED} {MM Service State=REG_STATE_IDLE, MM State=MM_IDLE} "
+         "{PLMN Sel Mod=Automatic} {MM Service State=REG_STATE_IDLE, MM State=MM_IDLE, "
+         "MM Sub State=MM_NO_CELL_AVAILABLE, LU Reject Cause=UPDATED} []"},
+        {"offline_log_example.mi2log", nullptr},
+        {"cmcc.mi2log",
+         "{MM State=GMM_REGISTERED, MM Sub State=GMM_NO_CELL_AVAILABLE, Attach Reject Cause=GMM_GU1_UPDATED, "
+         "MM Service State=REG_STATE_IDLE} {MM State=MM_IDLE, MM Service State=REG_STATE_IDLE} {PLMN Sel Mod=Automatic, "
+         "Mobile Country Code=460, Mobile Network Code=00 , Location Area Code=4566, Routing Area Code=100, "
+         "Service Type=CS_PS_SERVICE} {MM State=MM_IDLE, MM Sub State=MM_NO_CELL_AVAILABLE, LU Reject Cause=UPDATED, "
+         "MM Service State=REG_STATE_IDLE} []"},
+        {"sprint.mi2log", nullptr},
+    };
+    for (const auto& [file, finalStates] : rows) {
         const RecordedLog log = readCapture(file);
         ASSERT_TRUE(log.ok() && log.count(0x7130) > 0) << file << log.error;
         CapturedCodesIndex index;
@@ -66,34 +83,16 @@ TEST(CapturedRecords, EveryCapturedStateRecordShowsATableTextAndNothingIsRejecte
                     EXPECT_NE(render(value), "Unknown") << file << ": " << key << " after code " << e.logCode;
         }
         EXPECT_TRUE(sectiontest::errorLines(capture).empty()) << file;
+        if (finalStates)
+            EXPECT_EQ(render(Value(index.ps)) + " " + render(Value(index.co)) + " " + render(Value(index.plmn)) + " " +
+                          render(Value(index.cs)) + " " + render(Value(index.eplmns)),
+                      finalStates);
     }
 }
 
-TEST(CapturedRecords, TheQmdlExampleEndsInTheStatesOfItsLastRecords) {
-    const RecordedLog log = readCapture("qmdl_example.qmdl");
-    ASSERT_TRUE(log.ok()) << log.error;
-    CapturedCodesIndex index;
-    for (const RecordedEntry& e : log.entries) index.deliver(e);
-    // Last 0x7130: 03 05 00; last 0x7131: 13 06 00; last 0x7132: 01 00 00; 0x7150: count 0.
-    EXPECT_EQ(render(Value(index.ps)), "{MM Service State=REG_STATE_IDLE, MM State=GMM_REGISTERED, "
-                                       "MM Sub State=GMM_NO_CELL_AVAILABLE, Attach Reject Cause=GMM_GU1_UPDATED}");
-    EXPECT_EQ(render(Value(index.cs)), "{MM Service State=REG_STATE_IDLE, MM State=MM_IDLE, "
-                                       "MM Sub State=MM_NO_CELL_AVAILABLE, LU Reject Cause=UPDATED}");
-    EXPECT_EQ(render(Value(index.co)), "{MM Service State=REG_STATE_IDLE, MM State=MM_IDLE}");
-    EXPECT_EQ(render(Value(index.plmn)), "{PLMN Sel Mod=Automatic}");
-    EXPECT_TRUE(index.eplmns->empty());
-}
-
-TEST(CapturedRecords, CmccServingPLMNRecordsShowBCDDigitsWithTheirFillers) {
+TEST(CapturedRecords, CmccServingPLMNWithoutServiceShowsEveryBCDNibbleAndTheLACAsFillers) {
     const RecordedLog log = readCapture("cmcc.mi2log");
     ASSERT_TRUE(log.ok()) << log.error;
-    CapturedCodesIndex index;
-    for (const RecordedEntry& e : log.entries) index.deliver(e);
-    // The last 0x7135: 14 = 03, 15..17 = 64 F0 00, 18..19 = 11 D6, 20 = 64.
-    EXPECT_EQ(render(Value(index.plmn)), "{PLMN Sel Mod=Automatic, Mobile Country Code=460, Mobile Network Code=00 , "
-                                         "Location Area Code=4566, Routing Area Code=100, Service Type=CS_PS_SERVICE}");
-
-    // The first 0x7135 without service: every BCD nibble and the LAC a filler.
     const RecordedEntry* noService = firstEntry(log, 0x7135, 1, 0x00);
     ASSERT_NE(noService, nullptr);
     CapturedCodesIndex fresh;
