@@ -86,8 +86,6 @@ TEST(ServingCellInfoSection, TheLastServingUTRANCellOfTheCellMonitorWinsAndItsUA
         {cellMonitor({cell(kTSCellMonitorRadioAccessTechnologyGSM, serving, {{kTSCellMonitorLAC, 1}}),
                       cell(utran, kTSCellMonitorCellTypeNeighbor, {{kTSCellMonitorLAC, 1}})}),
          "{}"},
-        {RecordBuilder::extraPropertyList(1, Value(Dictionary::create())), "{}"},
-        {RecordBuilder::extra(1, 17).bytes(13, {'j', 'u', 'n', 'k'}).build(), "{}"},
     };
     for (const auto& [record, expected] : rows)
         EXPECT_EQ(Bound<UTRANServingCellInfo>().feed(record, 0xFF0001).shown(), expected);
