@@ -31,7 +31,6 @@ protected:
     std::string counter() {
         return render(display()->get("1;Status").asDictionary()->get("Test Values").asDictionary()->get("Counter"));
     }
-    std::string list() { return render(display()->get("2;Lists").asDictionary()->get("Test List")); }
 };
 
 TEST_F(RoutingTest, RecordsAreFramedByPrefixTypeAndCodeBeforeTheyReachTheirSections) {
@@ -70,7 +69,7 @@ TEST_F(RoutingTest, RecordsAreFramedByPrefixTypeAndCodeBeforeTheyReachTheirSecti
     EXPECT_EQ(generator.index().values->lengths.back(), 14u);
     generator.updateState(state, RecordBuilder::ordinary(kSharedCode).bytes(13, {7, 8, 9}).build());
     EXPECT_EQ(counter(), "7");
-    EXPECT_EQ(list(), "[7, 8, 9]");
+    EXPECT_EQ(render(display()->get("2;Lists").asDictionary()->get("Test List")), "[7, 8, 9]");
 }
 
 // A programming fault in a section is not the section's decoding error: it is not swallowed.
@@ -197,12 +196,11 @@ TEST(DLF, TheVersionReportHasEveryFieldAtItsOffsetAndTextsCutToTheirFields) {
     EXPECT_EQ(small, Bytes(161, 0xAA));
 }
 
-void addHistoryEntry(Dictionary& state, Value displayState) {
-    ArrayRef history = state.get("History").asArray();
-    if (!history) state.set("History", Value(history = Array::create()));
+// A history entry holding the display state, or nothing for a null value.
+Value historyEntry(Value displayState) {
     auto entry = Dictionary::create();
     if (!displayState.isNull()) entry->set("DisplayState", displayState);
-    history->append(Value(entry));
+    return Value(entry);
 }
 
 class SnapshotGenerator : public MVKLogGenerator {};
@@ -210,11 +208,10 @@ class SnapshotGenerator : public MVKLogGenerator {};
 TEST(DLF, TheFileIsTheVersionReportThenEachSnapshotsRecordsWithoutTheirFirstByteUnlessOneIsNotBytes) {
     SnapshotGenerator generator;
     Dictionary state;
-    addHistoryEntry(state, Value::data({1, 10, 11, 1, 12}));  // two records: only byte 0 dropped
-    addHistoryEntry(state, Value());
-    addHistoryEntry(state, Value::data({}));
-    addHistoryEntry(state, Value::data({1}));
-    addHistoryEntry(state, Value::data({1, 20}));
+    const ArrayRef history = Array::of({historyEntry(Value::data({1, 10, 11, 1, 12})),  // two records: only byte 0 dropped
+                                        historyEntry(Value()), historyEntry(Value::data({})),
+                                        historyEntry(Value::data({1})), historyEntry(Value::data({1, 20}))});
+    state.set("History", Value(history));
     const auto dlf = generator.generateDlfFromState(state);
     ASSERT_TRUE(dlf);
     EXPECT_EQ(ByteReader(*dlf).u16(2), 0x1FFD);
@@ -225,7 +222,7 @@ TEST(DLF, TheFileIsTheVersionReportThenEachSnapshotsRecordsWithoutTheirFirstByte
     EXPECT_EQ(render(contents->at(5)), "{Description=DLF binary (166 bytes), DLF=<data>}");
 
     // A display state that is not bytes aborts the file; the snapshot then holds the history alone.
-    addHistoryEntry(state, Value("not bytes"));
+    history->append(historyEntry(Value("not bytes")));
     SystemLogCapture capture;
     EXPECT_FALSE(generator.generateDlfFromState(state));
     EXPECT_TRUE(capture.contains(SystemLog::kDlf, "Got wrong class writing history to DLF; aborting writing the DLF file"));

@@ -39,7 +39,6 @@ TEST(Value, NumbersReadAsSigned32BitIntegersByTruncation) {
         {Value::real(2147483648.0), std::nullopt},
         {Value::real(std::numeric_limits<double>::quiet_NaN()), std::nullopt},
         {Value("7"), std::nullopt},
-        {Value::boolean(true), std::nullopt},
     };
     for (const auto& [value, expected] : rows) EXPECT_EQ(value.asInt32(), expected) << value.typeName();
 }
