@@ -1,13 +1,6 @@
-// FrameworkTest: record framing and routing, template binding, start command, snapshot history, the DLF file and the sections' registration.
+// FrameworkTest: record framing and routing, template binding, start command, snapshot history and the DLF file.
 #include "LogGenerator/DLFAddVersionReport.h"
 #include "LogGenerator/MVKLogGenerator2.h"
-#include "LogGenerator/MVK_GSM/CellChangeCounters.h"
-#include "LogGenerator/MVK_GSM/CodingScheme.h"
-#include "LogGenerator/MVK_GSM/EquivalentPLMNList.h"
-#include "LogGenerator/MVK_GSM/ProcessCO.h"
-#include "LogGenerator/MVK_GSM/ProcessCS.h"
-#include "LogGenerator/MVK_GSM/ProcessPS.h"
-#include "LogGenerator/MVK_GSM/ServingPLMN.h"
 #include "LogGenerator/SectionTesting.h"
 #include "LogGenerator/UTRAN/UTRANClassIndex.h"
 #include "Platform/ByteReader.h"
@@ -16,7 +9,6 @@
 #include <gtest/gtest.h>
 
 #include <cstring>
-#include <functional>
 #include <memory>
 #include <stdexcept>
 
@@ -39,7 +31,6 @@ protected:
     std::string counter() {
         return render(display()->get("1;Status").asDictionary()->get("Test Values").asDictionary()->get("Counter"));
     }
-    std::string list() { return render(display()->get("2;Lists").asDictionary()->get("Test List")); }
 };
 
 TEST_F(RoutingTest, RecordsAreFramedByPrefixTypeAndCodeBeforeTheyReachTheirSections) {
@@ -56,18 +47,19 @@ TEST_F(RoutingTest, RecordsAreFramedByPrefixTypeAndCodeBeforeTheyReachTheirSecti
         {"behind the 0x81 prefix, an 11-byte record still has its code",
          RecordBuilder::ordinary(kValueCode).resize(11).buildWithPrefix(), {kValueCode}, {}, nullptr},
         {"12 bytes are dropped silently", RecordBuilder::ordinary(kValueCode).resize(12).build(), {}, {}, nullptr},
-        {"type 255 with code 1 is extra 0xFF0001", RecordBuilder::extra(1, 14).build(), {}, {0xFF0001}, nullptr},
         {"type 2 is invalid", RecordBuilder(2, kValueCode, 14).build(), {}, {}, "Invalid log type: 2. Dropping."},
-        {"type 0 is invalid", RecordBuilder(0, kValueCode, 14).build(), {}, {}, "Invalid log type: 0. Dropping."},
         {"a shared code reaches both, in creation order", RecordBuilder::ordinary(kSharedCode, 14).build(),
          {kSharedCode}, {kSharedCode}, nullptr},
         {"a code nobody subscribes to", RecordBuilder::ordinary(0x4321, 14).build(), {}, {}, nullptr},
+        {"type 255 with code 1 is extra 0xFF0001; a section's own error is logged and the stream goes on",
+         RecordBuilder::extra(1, 14).u8(13, 0xEE).build(), {},
+         {0xFF0001}, " ***** Section \"Test List\" dropped record 0xFF0001: payload byte 13 is 0xEE"},
     };
     for (const Row& row : rows) {
         generator.index().values->calls.clear();
         generator.index().list->calls.clear();
         SystemLogCapture capture;
-        generator.updateState(state, row.buffer);
+        EXPECT_NO_THROW(generator.updateState(state, row.buffer)) << row.what;
         EXPECT_EQ(generator.index().values->calls, row.valueCalls) << row.what;
         EXPECT_EQ(generator.index().list->calls, row.listCalls) << row.what;
         EXPECT_EQ(sectiontest::errorLines(capture),
@@ -77,30 +69,17 @@ TEST_F(RoutingTest, RecordsAreFramedByPrefixTypeAndCodeBeforeTheyReachTheirSecti
     EXPECT_EQ(generator.index().values->lengths.back(), 14u);
     generator.updateState(state, RecordBuilder::ordinary(kSharedCode).bytes(13, {7, 8, 9}).build());
     EXPECT_EQ(counter(), "7");
-    EXPECT_EQ(list(), "[7, 8, 9]");
-}
-
-TEST_F(RoutingTest, ASectionsOwnErrorIsLoggedAndTheStreamGoesOn) {
-    display();
-    SystemLogCapture capture;
-    EXPECT_NO_THROW(generator.updateState(state, RecordBuilder::extra(1, 14).u8(13, 0xEE).build()));
-    EXPECT_TRUE(capture.contains(SystemLog::kError,
-                                 " ***** Section \"Test List\" dropped record 0xFF0001: payload byte 13 is 0xEE"));
-    generator.updateState(state, RecordBuilder::ordinary(kValueCode, 14).u8(13, 5).build());
-    EXPECT_EQ(counter(), "5");
+    EXPECT_EQ(render(display()->get("2;Lists").asDictionary()->get("Test List")), "[7, 8, 9]");
 }
 
 // A programming fault in a section is not the section's decoding error: it is not swallowed.
-class FaultySection : public Base {
-public:
+struct FaultySection : Base {
     std::string getSectionName() const override { return "Faulty"; }
     std::vector<int32_t> getLogCodeArray() const override { return {0x1111}; }
     void updateWithData(ByteView, int32_t) override { throw std::logic_error("bug"); }
 };
-class FaultyIndex : public ClassIndex {
-public:
-    FaultyIndex() { faulty = createSection<FaultySection>(); }
-    std::unique_ptr<FaultySection> faulty;
+struct FaultyIndex : ClassIndex {
+    std::unique_ptr<FaultySection> faulty = createSection<FaultySection>();
 };
 
 TEST(Routing, OtherExceptionsAreNotTakenForTheSectionsError) {
@@ -108,28 +87,24 @@ TEST(Routing, OtherExceptionsAreNotTakenForTheSectionsError) {
     EXPECT_THROW(g.updateWithData(RecordBuilder::ordinary(0x1111, 14).build()), std::logic_error);
 }
 
-TEST_F(RoutingTest, TheDisplayIsACopyOfTheTemplateWithEverySectionBoundToItsContainer) {
+TEST_F(RoutingTest, TheDisplayIsACopyOfTheTemplateBoundToTheSectionsUntilForgotten) {
     EXPECT_EQ(generator.generateLogUsingState(state), nullptr);  // the first call builds it
     const DictionaryRef built = state.get("Display").asDictionary();
     ASSERT_TRUE(built);
-    EXPECT_EQ(generator.generateLogUsingState(state).get(), built.get());
+    EXPECT_EQ(generator.generateLogUsingState(state).get(), built.get());  // the second returns it
     EXPECT_EQ(render(Value(built)),
               "{_sorted=_sorted, 1;Status={Test Values={Counter=none yet}, Label=fixed text}, 2;Lists={Test List=[]}}");
     generator.updateState(state, RecordBuilder::ordinary(kValueCode, 14).u8(13, 42).build());
     EXPECT_EQ(counter(), "42");
-    // The template keeps its text.
     EXPECT_EQ(render(state.get("Template").asDictionary()->get("1;Status")), "{Test Values={Counter=none yet}, Label=fixed text}");
-}
 
-TEST_F(RoutingTest, ForgettingTheDisplayRebindsTheSectionsToANewOneAndKeepsTheHistory) {
-    generator.generateLogUsingState(state);
-    const DictionaryRef old = generator.generateLogUsingState(state);
+    // Forgetting the display rebinds the sections to a new one and keeps the history.
     LogGenerator::forgetDisplay(state);
     EXPECT_FALSE(state.contains("Display") || state.contains("Template") || state.contains("ExtraInfo"));
     EXPECT_EQ(state.get("History").asArray()->size(), 2u);
     generator.updateState(state, RecordBuilder::ordinary(kValueCode, 14).u8(13, 9).build());
     EXPECT_EQ(counter(), "9");
-    EXPECT_NE(display().get(), old.get());
+    EXPECT_NE(display().get(), built.get());
 }
 
 TEST_F(RoutingTest, RawRecordsAreKeptEvenWhenDroppedAndHandedToTheHistoryPerGeneration) {
@@ -156,46 +131,6 @@ TEST(StartCommand, OrdinaryCodesAndExtraCodesOfEverySubscribedSection) {
     EXPECT_EQ(extra, (std::vector<int64_t>{1, 2, 0}));
 }
 
-TEST(Sections, EachRegistersUnderItsNameForItsCodesInCreationOrder) {
-    struct Row {
-        std::function<std::unique_ptr<Base>()> make;
-        const char* name;
-        std::vector<int32_t> codes;
-    };
-    const Row rows[] = {
-        {[] { return std::make_unique<ProcessCS>(); }, "Process CS", {0x7131, 0x7132}},
-        {[] { return std::make_unique<ProcessCO>(); }, "Process CO", {0x7131, 0x7132}},
-        {[] { return std::make_unique<ProcessPS>(); }, "Process PS", {0x7130, 0x7132}},
-        {[] { return std::make_unique<ServingPLMN>(); }, "Serving PLMN", {0x7135, 0x7132, 0xFF0001}},
-        {[] { return std::make_unique<EquivalentPLMNList>(); }, "Equivalent PLMN List", {0x7150}},
-        {[] { return std::make_unique<CellChangeCounters>(); }, "Cell Change Counters", {}},
-        {[] { return std::make_unique<CodingScheme>(); }, "Coding Scheme", {}},
-    };
-    for (const Row& row : rows) {
-        const auto section = row.make();
-        EXPECT_EQ(section->getSectionName(), row.name);
-        EXPECT_EQ(section->getLogCodeArray(), row.codes) << row.name;
-    }
-
-    // The UTRAN index: every section under its name, each code's subscribers in creation order.
-    UTRANClassIndex index;
-    const std::pair<const char*, std::vector<int32_t>> utran[] = {
-        {"RRC Info", {0xD0E0}},          {"Serving Cell Info", {0xD0E2, 0xFF0001}},
-        {"Neighbor Cell List", {0xD00A}}, {"GSM Neighbor Cell List", {0xD00E}},
-        {"TRCH BLER", {0xD00C}},         {"CCTRCH SIR", {0xD00C}},
-        {"PDP Context Info", {0xFF0002}}, {"SIM Info", {0xFF0000}},
-    };
-    for (const auto& [name, codes] : utran) {
-        Base* section = index.getClass(name);
-        ASSERT_TRUE(section) << name;
-        EXPECT_EQ(section->getLogCodeArray(), codes) << name;
-    }
-    const SectionList* d00c = index.getSubscribers(0xD00C);
-    ASSERT_TRUE(d00c);
-    EXPECT_EQ(*d00c, (SectionList{index.getClass("TRCH BLER"), index.getClass("CCTRCH SIR")}));
-    EXPECT_EQ(index.getSubscribers(0x7130), nullptr);
-}
-
 TEST(LookUpECNO, LinearEcNoMapsToWholeDecibelsAtTheThresholds) {
     const std::pair<uint32_t, int32_t> rows[] = {
         {0xFFFFFFFF, 0}, {524288, 0}, {524287, -1}, {417648, -1}, {417647, -2}, {331809, -2},
@@ -204,22 +139,18 @@ TEST(LookUpECNO, LinearEcNoMapsToWholeDecibelsAtTheThresholds) {
     for (auto [linear, db] : rows) EXPECT_EQ(Base::lookUpECNO(linear), db) << linear;
 }
 
-void setDisplayState(Dictionary& state, uint8_t marker) {
-    state.set("DisplayState", Value::data({marker}));
-    state.set("Display", Value(Dictionary::create()));
-    state.set("ExtraInfo", Value(Dictionary::create()));
-}
-
 TEST(History, HoldsTheFiveNewestEntriesEachCutAtTheFirstAbsentValue) {
     Dictionary state;
     for (uint8_t i = 1; i <= 7; ++i) {
-        setDisplayState(state, i);
+        state.set("DisplayState", Value::data({i}));
+        state.set("Display", Value(Dictionary::create()));
+        state.set("ExtraInfo", Value(Dictionary::create()));
         LogGenerator::updateHistoryInState(state);
     }
     const ArrayRef history = state.get("History").asArray();
     ASSERT_EQ(history->size(), 5u);
-    for (size_t i = 0; i < 5; ++i)
-        EXPECT_EQ((*history->at(i).asDictionary()->get("DisplayState").asData())[0], i + 3) << i;
+    EXPECT_EQ(*history->at(0).asDictionary()->get("DisplayState").asData(), Bytes{3});
+    EXPECT_EQ(*history->at(4).asDictionary()->get("DisplayState").asData(), Bytes{7});
     EXPECT_EQ(history->at(4).asDictionary()->keys(),
               (std::vector<std::string>{"DisplayState", "Display", "ExtraInfo", "Date", "Description"}));
 
@@ -265,24 +196,22 @@ TEST(DLF, TheVersionReportHasEveryFieldAtItsOffsetAndTextsCutToTheirFields) {
     EXPECT_EQ(small, Bytes(161, 0xAA));
 }
 
-void addHistoryEntry(Dictionary& state, Value displayState) {
-    ArrayRef history = state.get("History").asArray();
-    if (!history) state.set("History", Value(history = Array::create()));
+// A history entry holding the display state, or nothing for a null value.
+Value historyEntry(Value displayState) {
     auto entry = Dictionary::create();
     if (!displayState.isNull()) entry->set("DisplayState", displayState);
-    history->append(Value(entry));
+    return Value(entry);
 }
 
 class SnapshotGenerator : public MVKLogGenerator {};
 
-TEST(DLF, TheFileIsTheVersionReportThenEachSnapshotsRecordsWithoutTheirFirstByte) {
+TEST(DLF, TheFileIsTheVersionReportThenEachSnapshotsRecordsWithoutTheirFirstByteUnlessOneIsNotBytes) {
     SnapshotGenerator generator;
     Dictionary state;
-    addHistoryEntry(state, Value::data({1, 10, 11, 1, 12}));  // two records: only byte 0 dropped
-    addHistoryEntry(state, Value());
-    addHistoryEntry(state, Value::data({}));
-    addHistoryEntry(state, Value::data({1}));
-    addHistoryEntry(state, Value::data({1, 20}));
+    const ArrayRef history = Array::of({historyEntry(Value::data({1, 10, 11, 1, 12})),  // two records: only byte 0 dropped
+                                        historyEntry(Value()), historyEntry(Value::data({})),
+                                        historyEntry(Value::data({1})), historyEntry(Value::data({1, 20}))});
+    state.set("History", Value(history));
     const auto dlf = generator.generateDlfFromState(state);
     ASSERT_TRUE(dlf);
     EXPECT_EQ(ByteReader(*dlf).u16(2), 0x1FFD);
@@ -291,17 +220,13 @@ TEST(DLF, TheFileIsTheVersionReportThenEachSnapshotsRecordsWithoutTheirFirstByte
     const ArrayRef contents = generator.getSaveContentsFromState(state).asArray();
     ASSERT_EQ(contents->size(), 6u);
     EXPECT_EQ(render(contents->at(5)), "{Description=DLF binary (166 bytes), DLF=<data>}");
-}
 
-TEST(DLF, ADisplayStateThatIsNotBytesAbortsTheFileAndTheSnapshotHoldsTheHistoryAlone) {
-    SnapshotGenerator generator;
-    Dictionary state;
-    addHistoryEntry(state, Value::data({1, 2, 3}));
-    addHistoryEntry(state, Value("not bytes"));
+    // A display state that is not bytes aborts the file; the snapshot then holds the history alone.
+    history->append(historyEntry(Value("not bytes")));
     SystemLogCapture capture;
     EXPECT_FALSE(generator.generateDlfFromState(state));
     EXPECT_TRUE(capture.contains(SystemLog::kDlf, "Got wrong class writing history to DLF; aborting writing the DLF file"));
-    EXPECT_EQ(generator.getSaveContentsFromState(state).asArray()->size(), 2u);
+    EXPECT_EQ(generator.getSaveContentsFromState(state).asArray()->size(), 6u);
 }
 
 }  // namespace

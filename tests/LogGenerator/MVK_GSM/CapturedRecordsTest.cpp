@@ -10,7 +10,6 @@
 
 #include <gtest/gtest.h>
 
-#include <map>
 #include <memory>
 #include <string>
 
@@ -25,38 +24,26 @@ RecordedLog readCapture(const std::string& name) {
 
 // The five sections these codes reach, created in the order that makes 0x7132 reach
 // Process PS, Process CO, Serving PLMN, then Process CS.
-class CapturedCodesIndex : public ClassIndex {
-public:
-    CapturedCodesIndex() {
-        processPS = createSection<ProcessPS>();
-        processCO = createSection<ProcessCO>();
-        servingPLMN = createSection<ServingPLMN>();
-        equivalentPLMNList = createSection<EquivalentPLMNList>();
-        processCS = createSection<ProcessCS>();
-        processPS->updateSectionRef(Value(ps));
-        processCO->updateSectionRef(Value(co));
-        servingPLMN->updateSectionRef(Value(plmn));
-        equivalentPLMNList->updateSectionRef(Value(eplmns));
-        processCS->updateSectionRef(Value(cs));
-    }
+struct CapturedCodesIndex : ClassIndex {
     void deliver(const RecordedEntry& entry) const {
         if (const SectionList* subscribers = getSubscribers(entry.logCode))
             for (Base* section : *subscribers) section->updateWithData(entry.record, entry.logCode);
     }
-    void deliverAll(const RecordedLog& log) const {
-        for (const RecordedEntry& e : log.entries) deliver(e);
+    template <class Section>
+    std::unique_ptr<Section> bound(Value container) {
+        auto section = createSection<Section>();
+        section->updateSectionRef(container);
+        return section;
     }
 
-    std::unique_ptr<ProcessPS> processPS;
-    std::unique_ptr<ProcessCO> processCO;
-    std::unique_ptr<ServingPLMN> servingPLMN;
-    std::unique_ptr<EquivalentPLMNList> equivalentPLMNList;
-    std::unique_ptr<ProcessCS> processCS;
-    DictionaryRef ps = Dictionary::create();
-    DictionaryRef co = Dictionary::create();
-    DictionaryRef plmn = Dictionary::create();
-    DictionaryRef cs = Dictionary::create();
+    DictionaryRef ps = Dictionary::create(), co = Dictionary::create(), plmn = Dictionary::create(),
+                  cs = Dictionary::create();
     ArrayRef eplmns = Array::create();
+    std::unique_ptr<ProcessPS> processPS = bound<ProcessPS>(Value(ps));
+    std::unique_ptr<ProcessCO> processCO = bound<ProcessCO>(Value(co));
+    std::unique_ptr<ServingPLMN> servingPLMN = bound<ServingPLMN>(Value(plmn));
+    std::unique_ptr<EquivalentPLMNList> equivalentPLMNList = bound<EquivalentPLMNList>(Value(eplmns));
+    std::unique_ptr<ProcessCS> processCS = bound<ProcessCS>(Value(cs));
 };
 
 // The first entry of a code whose payload byte (record offset 13 + n) has the value.
@@ -66,17 +53,27 @@ const RecordedEntry* firstEntry(const RecordedLog& log, uint16_t code, size_t pa
     return nullptr;
 }
 
-TEST(CapturedRecords, EveryCapturedStateRecordShowsATableTextAndNothingIsRejected) {
-    const std::map<std::string, std::map<uint16_t, size_t>> expected = {
-        {"qmdl_example.qmdl", {{0x7130, 17}, {0x7131, 11}, {0x7132, 4}, {0x7150, 1}}},
-        {"offline_log_example.mi2log", {{0x7130, 7}, {0x7131, 2}, {0x7132, 2}, {0x7150, 1}}},
-        {"cmcc.mi2log", {{0x7130, 68}, {0x7131, 55}, {0x7132, 8}, {0x7135, 13}, {0x7150, 7}}},
-        {"sprint.mi2log", {{0x7130, 520}, {0x7131, 11}, {0x7132, 18}, {0x7150, 94}}},
+TEST(CapturedRecords, EveryCapturedStateRecordShowsATableTextNothingIsRejectedAndTheLastRecordsWin) {
+    // qmdl_example's last 0x7130: 03 05 00; last 0x7131: 13 06 00; last 0x7132: 01 00 00; 0x7150: count 0.
+    // cmcc's last 0x7135: 14 = 03, 15..17 = 64 F0 00, 18..19 = 11 D6, 20 = 64.
+    const std::pair<const char*, const char*> rows[] = {
+        {"qmdl_example.qmdl",
+         "{MM Service State=REG_STATE_IDLE, MM State=GMM_REGISTERED, MM Sub State=GMM_NO_CELL_AVAILABLE, "
+         "Attach Reject Cause=GMM_GU1_UPDATED} {MM Service State=REG_STATE_IDLE, MM State=MM_IDLE} "
+         "{PLMN Sel Mod=Automatic} {MM Service State=REG_STATE_IDLE, MM State=MM_IDLE, "
+         "MM Sub State=MM_NO_CELL_AVAILABLE, LU Reject Cause=UPDATED} []"},
+        {"offline_log_example.mi2log", nullptr},
+        {"cmcc.mi2log",
+         "{MM State=GMM_REGISTERED, MM Sub State=GMM_NO_CELL_AVAILABLE, Attach Reject Cause=GMM_GU1_UPDATED, "
+         "MM Service State=REG_STATE_IDLE} {MM State=MM_IDLE, MM Service State=REG_STATE_IDLE} {PLMN Sel Mod=Automatic, "
+         "Mobile Country Code=460, Mobile Network Code=00 , Location Area Code=4566, Routing Area Code=100, "
+         "Service Type=CS_PS_SERVICE} {MM State=MM_IDLE, MM Sub State=MM_NO_CELL_AVAILABLE, LU Reject Cause=UPDATED, "
+         "MM Service State=REG_STATE_IDLE} []"},
+        {"sprint.mi2log", nullptr},
     };
-    for (const auto& [file, counts] : expected) {
+    for (const auto& [file, finalStates] : rows) {
         const RecordedLog log = readCapture(file);
-        ASSERT_TRUE(log.ok()) << log.error;
-        for (const auto& [code, n] : counts) EXPECT_EQ(log.count(code), n) << file << " code " << code;
+        ASSERT_TRUE(log.ok() && log.count(0x7130) > 0) << file << log.error;
         CapturedCodesIndex index;
         SystemLogCapture capture;
         for (const RecordedEntry& e : log.entries) {
@@ -86,37 +83,16 @@ TEST(CapturedRecords, EveryCapturedStateRecordShowsATableTextAndNothingIsRejecte
                     EXPECT_NE(render(value), "Unknown") << file << ": " << key << " after code " << e.logCode;
         }
         EXPECT_TRUE(sectiontest::errorLines(capture).empty()) << file;
+        if (finalStates)
+            EXPECT_EQ(render(Value(index.ps)) + " " + render(Value(index.co)) + " " + render(Value(index.plmn)) + " " +
+                          render(Value(index.cs)) + " " + render(Value(index.eplmns)),
+                      finalStates);
     }
 }
 
-TEST(CapturedRecords, TheQmdlExampleEndsInTheStatesOfItsLastRecords) {
-    const RecordedLog log = readCapture("qmdl_example.qmdl");
-    ASSERT_TRUE(log.ok()) << log.error;
-    CapturedCodesIndex index;
-    index.deliverAll(log);
-    // Last 0x7130: 03 05 00; last 0x7131: 13 06 00; last 0x7132: 01 00 00; 0x7150: count 0.
-    EXPECT_EQ(render(Value(index.ps)), "{MM Service State=REG_STATE_IDLE, MM State=GMM_REGISTERED, "
-                                       "MM Sub State=GMM_NO_CELL_AVAILABLE, Attach Reject Cause=GMM_GU1_UPDATED}");
-    EXPECT_EQ(render(Value(index.cs)), "{MM Service State=REG_STATE_IDLE, MM State=MM_IDLE, "
-                                       "MM Sub State=MM_NO_CELL_AVAILABLE, LU Reject Cause=UPDATED}");
-    EXPECT_EQ(render(Value(index.co)), "{MM Service State=REG_STATE_IDLE, MM State=MM_IDLE}");
-    EXPECT_EQ(render(Value(index.plmn)), "{PLMN Sel Mod=Automatic}");
-    EXPECT_TRUE(index.eplmns->empty());
-}
-
-TEST(CapturedRecords, CmccServingPLMNRecordsShowBCDDigitsWithTheirFillers) {
+TEST(CapturedRecords, CmccServingPLMNWithoutServiceShowsEveryBCDNibbleAndTheLACAsFillers) {
     const RecordedLog log = readCapture("cmcc.mi2log");
     ASSERT_TRUE(log.ok()) << log.error;
-    CapturedCodesIndex index;
-    index.deliverAll(log);
-    // The last 0x7135: 14 = 03, 15..17 = 64 F0 00, 18..19 = 11 D6, 20 = 64.
-    EXPECT_EQ(render(index.plmn->get("Mobile Country Code")), "460");
-    EXPECT_EQ(render(index.plmn->get("Mobile Network Code")), "00 ");
-    EXPECT_EQ(render(index.plmn->get("Location Area Code")), "4566");
-    EXPECT_EQ(render(index.plmn->get("Routing Area Code")), "100");
-    EXPECT_EQ(render(index.plmn->get("Service Type")), "CS_PS_SERVICE");
-
-    // The first 0x7135 without service: every BCD nibble and the LAC a filler.
     const RecordedEntry* noService = firstEntry(log, 0x7135, 1, 0x00);
     ASSERT_NE(noService, nullptr);
     CapturedCodesIndex fresh;
