@@ -4,7 +4,6 @@
 #include "App/VantorelCell.h"
 #include "PaneTestSupport.h"
 #include "PropertyList/Array.h"
-#include "PropertyList/Dictionary.h"
 
 #include <QAction>
 #include <QItemSelectionModel>
@@ -19,18 +18,10 @@ using namespace vantorel::panetest;
 
 namespace {
 
-// {"Cell": {"MCC": "310", "Neighbours": ["n0", {"PSC": "12"}]}, "Empty": {}, "Mode": "Idle"}
 Value sampleDisplay() {
-    auto neighbour = Dictionary::create();
-    neighbour->set("PSC", "12");
-    auto cell = Dictionary::create();
-    cell->set("MCC", "310");
-    cell->set("Neighbours", Value(Array::of({"n0", Value(neighbour)})));
-    auto display = Dictionary::create();
-    display->set("Cell", Value(cell));
-    display->set("Empty", Value(Dictionary::create()));
-    display->set("Mode", "Idle");
-    return Value(display);
+    return dict({{"Cell", dict({{"MCC", "310"}, {"Neighbours", Value(Array::of({"n0", dict({{"PSC", "12"}})}))}})},
+                 {"Empty", dict({})},
+                 {"Mode", "Idle"}});
 }
 
 // Records each pane it is told about, marked if it was already on screen.
@@ -98,19 +89,12 @@ TEST(PaneNavigation, RowsDrillDownByClickOrEnterAndBackByButtonBackspaceOrAltLef
 
 TEST(PaneNavigation, ReloadReusesCellsInRowOrderAndAReusedCellKeepsItsKind) {
     FakeApplication application;
-    auto before = Dictionary::create();
-    before->set("Group", Value(Dictionary::create()));
-    before->set("b", "2");
-    before->set("c", "3");
-    VantorelPaneController pane(makeTree(Value(before)), "/", &application);
+    VantorelPaneController pane(makeTree(dict({{"Group", dict({})}, {"b", "2"}, {"c", "3"}})), "/", &application);
     showAt(pane, 400, 600);
     VantorelCell* drillDown = pane.cellAtRow(0);
     VantorelCell* valueRow = pane.cellAtRow(1);
 
-    auto after = Dictionary::create();
-    after->set("Leaf", "42 dBm");
-    after->set("Sub", Value(Dictionary::create()));
-    pane.reloadWithNode(makeTree(Value(after)));
+    pane.reloadWithNode(makeTree(dict({{"Leaf", "42 dBm"}, {"Sub", dict({})}})));
     settle();
     // Deliberate, as the handset's reused cells do: the drill-down cell shows the leaf
     // without its value, the value cell shows a disclosure and no value.

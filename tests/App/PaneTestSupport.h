@@ -4,6 +4,7 @@
 #include "App/PaneApplication.h"
 #include "App/VantorelPaneController.h"
 #include "Model/VantorelModelNode.h"
+#include "PropertyList/Dictionary.h"
 
 #include <QApplication>
 #include <QMouseEvent>
@@ -26,6 +27,13 @@ public:
     int showSaveViewCalls = 0;
     int closeSaveViewCalls = 0;
 };
+
+// A dictionary holding `entries` in order.
+inline Value dict(std::initializer_list<std::pair<const char*, Value>> entries) {
+    auto d = Dictionary::create();
+    for (const auto& [key, value] : entries) d->set(key, value);
+    return Value(d);
+}
 
 inline NodeRef makeTree(const Value& display) {
     PathDictionary paths;

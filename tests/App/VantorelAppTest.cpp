@@ -7,7 +7,6 @@
 #include "Platform/Preferences.h"
 #include "Platform/RecordBuilder.h"
 #include "PropertyList/Array.h"
-#include "PropertyList/Dictionary.h"
 #include "support/EventLoopWait.h"
 #include "support/FakeTelephonyService.h"
 
@@ -33,10 +32,10 @@ protected:
         Preferences::setDirectory("");
         Preferences::setInternalInstallMarker("");
     }
-    std::unique_ptr<VantorelApp> launch(bool allowSave = false) {
+    std::unique_ptr<VantorelApp> launch() {
         VantorelApp::Options options;
         options.source.service = service.name();
-        options.allowSave = allowSave;
+        options.allowSave = true;
         auto app = std::make_unique<VantorelApp>(options);
         std::string error;
         EXPECT_TRUE(app->applicationDidFinishLaunching(&error)) << error;
@@ -52,20 +51,14 @@ protected:
     // Packet Data / PDP Context Info with `contexts` entries, each with a QoS dictionary.
     static Bytes pdpRecord(int contexts) {
         auto list = Array::create();
-        for (int i = 0; i < contexts; ++i) {
-            auto qos = Dictionary::create();
-            qos->set("Traffic Class", "Interactive");
-            auto pdp = Dictionary::create();
-            pdp->set("QoS", Value(qos));
-            list->append(Value(pdp));
-        }
+        for (int i = 0; i < contexts; ++i) list->append(panetest::dict({{"QoS", panetest::dict({{"Traffic Class", "Interactive"}})}}));
         return RecordBuilder::extraPropertyList(2, Value(list));
     }
 };
 
 }  // namespace
 
-TEST_F(VantorelAppTest, TheRootReadsConnectingUntilTheFirstUpdateAndConnectingDotsWhenTheChannelIsDown) {
+TEST_F(VantorelAppTest, TheRootReadsConnectingUntilTheFirstUpdateThenConnectingDotsWhenTheChannelIsDownAndTheSaveScreenOpensOnce) {
     auto app = launch();
     VantorelPaneController* root = app->navigationController()->topPane();
     EXPECT_EQ(root->status(), "Connecting");
@@ -76,6 +69,14 @@ TEST_F(VantorelAppTest, TheRootReadsConnectingUntilTheFirstUpdateAndConnectingDo
     app->updateViewControllerFromModel();
     EXPECT_EQ(root->status(), "Connecting...");
     EXPECT_TRUE(root->isLoading());
+
+    app->showSaveView();  // the save screen opens once
+    VantorelSaveViewController* first = app->saveViewController();
+    ASSERT_TRUE(first);
+    app->showSaveView();
+    EXPECT_EQ(app->saveViewController(), first);
+    app->closeSaveView();
+    EXPECT_EQ(app->saveViewController(), nullptr);
 }
 
 TEST_F(VantorelAppTest, WhenADeeperPanesBranchVanishesTheStackPopsToThePaneBelowIt) {
@@ -92,7 +93,9 @@ TEST_F(VantorelAppTest, WhenADeeperPanesBranchVanishesTheStackPopsToThePaneBelow
     ASSERT_TRUE(waitUntil([&] { return nav.panes().size() == 3; }, 3000));
     EXPECT_EQ(nav.topPane()->path(), "/Packet Data/PDP Context Info");
     EXPECT_EQ(nav.topPane()->node()->childNodes()->size(), 1u);  // reloaded
-    if (qos) EXPECT_EQ(qos->node(), qosNode);  // not reloaded before it went
+    if (qos) {
+        EXPECT_EQ(qos->node(), qosNode);  // not reloaded before it went
+    }
 }
 
 TEST_F(VantorelAppTest, TheShellShowsTheRSSIWhileRunningUnlessTheUserAlreadyChoseTo) {
@@ -105,15 +108,4 @@ TEST_F(VantorelAppTest, TheShellShowsTheRSSIWhileRunningUnlessTheUserAlreadyChos
         app->applicationWillTerminate();
         EXPECT_EQ(Preferences::shellBool(Preferences::kShowGSMRSSI), chosen ? std::nullopt : std::optional(false));
     }
-}
-
-TEST_F(VantorelAppTest, TheSaveScreenOpensOnceAndCloses) {
-    auto app = launch(true);
-    app->showSaveView();
-    VantorelSaveViewController* first = app->saveViewController();
-    ASSERT_TRUE(first);
-    app->showSaveView();
-    EXPECT_EQ(app->saveViewController(), first);
-    app->closeSaveView();
-    EXPECT_EQ(app->saveViewController(), nullptr);
 }

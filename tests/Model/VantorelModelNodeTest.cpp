@@ -16,30 +16,24 @@ std::string childNames(const NodeRef& node) {
     return names;
 }
 
+Value dict(std::initializer_list<std::pair<const char*, Value>> entries) {
+    auto d = Dictionary::create();
+    for (const auto& [key, value] : entries) d->set(key, value);
+    return Value(d);
+}
+
 }  // namespace
 
 TEST(VantorelModelNode, TheDisplayDictionaryBecomesRowsIndexedByPath) {
-    auto cell = Dictionary::create();
-    cell->set("UARFCN", "10054");
-    cell->set("Count", Value::integer(3));
-    auto slashed = Dictionary::create();
-    slashed->set("Rx", "-70");
-    auto unordered = Dictionary::create();
-    unordered->set("02;y", "1");
-    unordered->set("01;x", "2");
-    auto display = Dictionary::create();
-    display->set("_sorted", "_sorted");
-    display->set("3;b", "second");
-    display->set("1;x", "first");
-    display->set("2;a;b", "two semicolons");
-    display->set("4;Cell", "later");
-    display->set("0;Cell", "earlier");
-    display->set("5;Lists", Value(Array::of({Value(cell), Value(Array::of({"deep", Value::real(1.5)}))})));
-    display->set("6;UL/DL", Value(slashed));
-    display->set("7;Plain", Value(unordered));
-    display->set("8;Empty", Value(Array::create()));
+    const Value cell = dict({{"UARFCN", "10054"}, {"Count", Value::integer(3)}});
+    const Value display = dict({{"_sorted", "_sorted"}, {"3;b", "second"}, {"1;x", "first"}, {"2;a;b", "two semicolons"},
+                                {"4;Cell", "later"}, {"0;Cell", "earlier"},
+                                {"5;Lists", Value(Array::of({cell, Value(Array::of({"deep", Value::real(1.5)}))}))},
+                                {"6;UL/DL", dict({{"Rx", "-70"}})},
+                                {"7;Plain", dict({{"02;y", "1"}, {"01;x", "2"}})},
+                                {"8;Empty", Value(Array::create())}});
     PathDictionary paths;
-    NodeRef root = VantorelModelNode::makeTreeFromObject(Value(display), paths);
+    NodeRef root = VantorelModelNode::makeTreeFromObject(display, paths);
     ASSERT_EQ(paths.at("/"), root);
     EXPECT_EQ(root->displayName(), "Vantorel");
 
