@@ -39,6 +39,7 @@ protected:
     std::unique_ptr<VantorelSaveViewController> makeScreen(const Value& contents) {
         auto screen = std::make_unique<VantorelSaveViewController>(contents, &app, &window);
         screen->show();
+        QApplication::setActiveWindow(screen.get());
         settle();
         return screen;
     }
@@ -101,7 +102,6 @@ TEST_F(VantorelSaveViewControllerTest, AFailedWriteLeavesTheFileErrorAlertUpAfte
 TEST_F(VantorelSaveViewControllerTest, CancelEscapeAndReturnWriteNothing) {
     auto screen = makeScreen(Value());
     QLineEdit* field = screen->saveDescription();
-    QApplication::setActiveWindow(screen.get());
     field->setFocus();
     field->setText("typed");
     pressKey(field, Qt::Key_Return);  // only dismisses the keyboard
@@ -111,7 +111,6 @@ TEST_F(VantorelSaveViewControllerTest, CancelEscapeAndReturnWriteNothing) {
     settle();
     EXPECT_EQ(app.closeSaveViewCalls, 1);
     auto again = makeScreen(Value());
-    QApplication::setActiveWindow(again.get());
     pressKey(again.get(), Qt::Key_Escape);
     again->reject();  // the application's own dismissal coming back: no second request
     settle();
