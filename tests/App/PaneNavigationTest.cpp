@@ -1,11 +1,9 @@
-// Tests for panes inside the navigation stack: drilling down by click and keyboard, child paths, going back, the delegate, cell reuse and the toolbar.
+// Tests for panes inside the navigation stack: drilling down by click and keyboard, going back, the delegate, cell reuse and the toolbar.
 #include "App/NavigationController.h"
 #include "App/NavigationControllerDelegate.h"
 #include "App/VantorelCell.h"
-#include "App/VantorelPaneController.h"
 #include "PaneTestSupport.h"
 #include "PropertyList/Array.h"
-#include "PropertyList/Dictionary.h"
 
 #include <QAction>
 #include <QItemSelectionModel>
@@ -20,21 +18,13 @@ using namespace vantorel::panetest;
 
 namespace {
 
-// {"Cell": {"MCC": "310", "Neighbours": ["n0", {"PSC": "12"}]}, "Empty": {}, "Mode": "Idle"}
 Value sampleDisplay() {
-    auto neighbour = Dictionary::create();
-    neighbour->set("PSC", "12");
-    auto cell = Dictionary::create();
-    cell->set("MCC", "310");
-    cell->set("Neighbours", Value(Array::of({"n0", Value(neighbour)})));
-    auto display = Dictionary::create();
-    display->set("Cell", Value(cell));
-    display->set("Empty", Value(Dictionary::create()));
-    display->set("Mode", "Idle");
-    return Value(display);
+    return dict({{"Cell", dict({{"MCC", "310"}, {"Neighbours", Value(Array::of({"n0", dict({{"PSC", "12"}})}))}})},
+                 {"Empty", dict({})},
+                 {"Mode", "Idle"}});
 }
 
-// Remembers, for each pane it is told about, whether it was already on screen.
+// Records each pane it is told about, marked if it was already on screen.
 class RecordingDelegate : public NavigationControllerDelegate {
 public:
     void navigationControllerWillShow(NavigationController&, VantorelPaneController& pane) override {
@@ -51,15 +41,9 @@ struct Stack {
         showAt(navigation, 400, 600);
     }
     VantorelPaneController& top() { return *navigation.topPane(); }
-    int row(const std::string& name) {
-        const auto* children = top().node()->childNodes();
-        for (std::size_t i = 0; i < children->size(); ++i)
-            if ((*children)[i]->displayName() == name) return int(i);
-        return -1;
-    }
     void clickRow(const std::string& name) {
         QTableWidget* table = top().tableView();
-        click(table->viewport(), table->visualRect(table->model()->index(row(name), 0)).center());
+        click(table->viewport(), table->visualRect(table->model()->index(rowOf(top(), name), 0)).center());
     }
     FakeApplication application;
     RecordingDelegate delegate;
@@ -77,22 +61,16 @@ TEST(PaneNavigation, RowsDrillDownByClickOrEnterAndBackByButtonBackspaceOrAltLef
     EXPECT_TRUE(s.top().tableView()->selectionModel()->selectedRows().empty());
 
     s.clickRow("Cell");
-    EXPECT_EQ(s.top().path(), "/Cell");
     EXPECT_EQ(s.top().status(), "Updated 2016-06-28 at 22:01:10");  // the parent's status
-    EXPECT_FALSE(s.top().isLoading());
-    s.top().tableView()->setCurrentCell(s.row("Neighbours"), 0);
+    s.top().tableView()->setCurrentCell(rowOf(s.top(), "Neighbours"), 0);
     pressKey(s.top().tableView(), Qt::Key_Return);
-    EXPECT_EQ(s.top().path(), "/Cell/Neighbours");
     s.clickRow("1");
     EXPECT_EQ(s.top().path(), "/Cell/Neighbours/1");
-    EXPECT_EQ(s.navigation.titleLabel()->text(), "1");
     EXPECT_EQ(s.navigation.backButton()->text(), "\u2039 Neighbours");
-    // Told before each pane shows, the root included.
     EXPECT_EQ(s.delegate.told, (std::vector<std::string>{"/", "/Cell", "/Cell/Neighbours", "/Cell/Neighbours/1"}));
 
     s.navigation.backButton()->click();
     settle();
-    EXPECT_EQ(s.top().path(), "/Cell/Neighbours");
     pressKey(s.top().tableView(), Qt::Key_Backspace);
     EXPECT_EQ(s.top().path(), "/Cell");
     pressKey(s.top().tableView(), Qt::Key_Left, Qt::AltModifier);
@@ -102,7 +80,6 @@ TEST(PaneNavigation, RowsDrillDownByClickOrEnterAndBackByButtonBackspaceOrAltLef
 
     s.clickRow("Empty");  // a tree node without children still drills down
     EXPECT_EQ(s.top().path(), "/Empty");
-    EXPECT_EQ(s.top().numberOfRowsInSection(), 0);
     QPointer<VantorelPaneController> empty = &s.top();
     EXPECT_TRUE(s.navigation.popTo(0));
     settle();
@@ -112,27 +89,18 @@ TEST(PaneNavigation, RowsDrillDownByClickOrEnterAndBackByButtonBackspaceOrAltLef
 
 TEST(PaneNavigation, ReloadReusesCellsInRowOrderAndAReusedCellKeepsItsKind) {
     FakeApplication application;
-    auto before = Dictionary::create();
-    before->set("Group", Value(Dictionary::create()));
-    before->set("b", "2");
-    before->set("c", "3");
-    VantorelPaneController pane(makeTree(Value(before)), "/", &application);
+    VantorelPaneController pane(makeTree(dict({{"Group", dict({})}, {"b", "2"}, {"c", "3"}})), "/", &application);
     showAt(pane, 400, 600);
     VantorelCell* drillDown = pane.cellAtRow(0);
     VantorelCell* valueRow = pane.cellAtRow(1);
-    ASSERT_EQ(drillDown->kind(), VantorelCell::Kind::DrillDown);
 
-    auto after = Dictionary::create();
-    after->set("Leaf", "42 dBm");
-    after->set("Sub", Value(Dictionary::create()));
-    pane.reloadWithNode(makeTree(Value(after)));
+    pane.reloadWithNode(makeTree(dict({{"Leaf", "42 dBm"}, {"Sub", dict({})}})));
     settle();
-    // The drill-down row now shows a leaf without its value (deliberate: the
-    // handset's reused cells do so); the value row shows a disclosure and no value.
+    // Deliberate, as the handset's reused cells do: the drill-down cell shows the leaf
+    // without its value, the value cell shows a disclosure and no value.
     ASSERT_EQ(pane.cellAtRow(0), drillDown);
     EXPECT_EQ(drillDown->key()->text(), "Leaf");
     EXPECT_EQ(drillDown->value(), nullptr);
-    EXPECT_FALSE(drillDown->accessoryView()->isVisible());
     ASSERT_EQ(pane.cellAtRow(1), valueRow);
     EXPECT_EQ(valueRow->value()->text(), "");
     EXPECT_EQ(valueRow->accessoryType(), VantorelCell::AccessoryType::DisclosureIndicator);
@@ -145,11 +113,8 @@ TEST(PaneNavigation, TheToolbarShowsTheIndicatorWhileLoadingAndTheSaveButtonOnly
         EXPECT_TRUE(s.top().activityIndicatorItem()->isVisible());
         s.top().setStatus("Updated", false);
         EXPECT_FALSE(s.top().activityIndicatorItem()->isVisible());
-        EXPECT_EQ(s.top().statusLabel()->text(), "Updated");
         ASSERT_EQ(s.top().saveItem() != nullptr, allowSave);
-        if (allowSave) {
-            s.top().saveItem()->trigger();
-            EXPECT_EQ(s.application.showSaveViewCalls, 1);
-        }
+        if (allowSave) s.top().saveItem()->trigger();
+        EXPECT_EQ(s.application.showSaveViewCalls, allowSave ? 1 : 0);
     }
 }

@@ -1,12 +1,13 @@
-// PaneTestSupport: a fake application object, tree building and input helpers for the pane, cell and navigation tests.
+// PaneTestSupport: a fake application object, tree building, row lookup and input helpers for the window tests.
 #pragma once
 
 #include "App/PaneApplication.h"
+#include "App/VantorelPaneController.h"
 #include "Model/VantorelModelNode.h"
+#include "PropertyList/Dictionary.h"
 
 #include <QApplication>
 #include <QMouseEvent>
-#include <QWidget>
 #include <QWindow>
 
 // Exported by QtGui for its own test library: delivers a key event as the platform
@@ -27,9 +28,24 @@ public:
     int closeSaveViewCalls = 0;
 };
 
+// A dictionary holding `entries` in order.
+inline Value dict(std::initializer_list<std::pair<const char*, Value>> entries) {
+    auto d = Dictionary::create();
+    for (const auto& [key, value] : entries) d->set(key, value);
+    return Value(d);
+}
+
 inline NodeRef makeTree(const Value& display) {
     PathDictionary paths;
     return VantorelModelNode::makeTreeFromObject(display, paths);
+}
+
+// The row of `pane` showing `name`, or -1.
+inline int rowOf(const VantorelPaneController& pane, const std::string& name) {
+    const auto* children = pane.node()->childNodes();
+    for (std::size_t i = 0; children && i < children->size(); ++i)
+        if ((*children)[i]->displayName() == name) return int(i);
+    return -1;
 }
 
 inline void settle() {
@@ -39,10 +55,8 @@ inline void settle() {
 
 // A left click at `pos` of `widget`, delivered to the deepest child there.
 inline void click(QWidget* widget, QPoint pos) {
-    QWidget* target = widget->childAt(pos);
-    if (!target) target = widget;
-    const QPointF local = target->mapFrom(widget, QPointF(pos));
-    const QPointF global = widget->mapToGlobal(QPointF(pos));
+    QWidget* target = widget->childAt(pos) ? widget->childAt(pos) : widget;
+    const QPointF local = target->mapFrom(widget, QPointF(pos)), global = widget->mapToGlobal(QPointF(pos));
     QMouseEvent press(QEvent::MouseButtonPress, local, global, Qt::LeftButton, Qt::LeftButton, Qt::NoModifier);
     QApplication::sendEvent(target, &press);
     QMouseEvent release(QEvent::MouseButtonRelease, local, global, Qt::LeftButton, Qt::NoButton, Qt::NoModifier);
@@ -61,7 +75,6 @@ inline void pressKey(QWidget* widget, int key, Qt::KeyboardModifiers modifiers =
 inline void showAt(QWidget& widget, int width, int height) {
     widget.resize(width, height);
     widget.show();
-    widget.activateWindow();
     QApplication::setActiveWindow(&widget);
     settle();
 }

@@ -1,8 +1,7 @@
 // Screenshots (PNG) of the window for a person to look at: the root pane and a drilled-down pane on the emulator's UTRAN data, under build/<dir>/screenshots/.
 #include "App/NavigationController.h"
 #include "App/VantorelApp.h"
-#include "App/VantorelPaneController.h"
-#include "Model/VantorelModel.h"
+#include "PaneTestSupport.h"
 #include "Platform/Preferences.h"
 #include "support/EventLoopWait.h"
 
@@ -30,11 +29,8 @@ TEST(Screenshots, RootPaneAndADrilledDownPane) {
     const QDir dir(VANTOREL_SCREENSHOT_DIR);
     spin(300);
     EXPECT_TRUE(app.window()->grab().save(dir.filePath("root-pane.png"), "PNG"));
-    for (const char* name : {"Serving Cell", "Serving Cell Info"}) {
-        const auto* children = nav.topPane()->node()->childNodes();
-        for (size_t row = 0; row < children->size(); ++row)
-            if ((*children)[row]->displayName() == name) nav.topPane()->didSelectRowAtIndexPath(int(row));
-    }
+    for (const char* name : {"Serving Cell", "Serving Cell Info"})
+        nav.topPane()->didSelectRowAtIndexPath(panetest::rowOf(*nav.topPane(), name));
     ASSERT_EQ(nav.topPane()->path(), "/Serving Cell/Serving Cell Info");
     spin(300);
     EXPECT_TRUE(app.window()->grab().save(dir.filePath("serving-cell-info-pane.png"), "PNG"));

@@ -1,9 +1,8 @@
-// Tests for VantorelCell's value row: where the value goes beside its key, the scroll extent, and the separator showing below the scroll view.
+// Tests for VantorelCell's value row: where the value goes beside its key, the scroll extent, and the layout following the row's width.
 #include "App/VantorelCell.h"
 
 #include "PaneTestSupport.h"
 
-#include <QImage>
 #include <QLabel>
 #include <QScrollArea>
 #include <QScrollBar>
@@ -29,21 +28,20 @@ std::unique_ptr<VantorelCell> valueRow(const QString& key, const QString& value,
 
 }  // namespace
 
-TEST(VantorelCell, AValueFitsFlushRightOrStarts50RightOfItsKeyAndScrolls) {
+TEST(VantorelCell, AValueFitsFlushRightOrStarts50RightOfItsKeyAndScrollsAndFollowsTheRowsWidth) {
     const QString longValue = "A value far too long to fit beside its key in one row of four hundred points";
     const int kw = VantorelCell::measure("Band").width();
     const int fill = 10 + kw + 50 + VantorelCell::measure("GSM 1900").width();
-    struct Row {
+    const struct {
         QString key, value;
         int width;
         bool fits;  // 10 + key + 50 + value < width, both measured in the bold font
-    };
-    const Row rows[] = {
+    } rows[] = {
         {"MCC", "310", 400, true},
         {"Cell Identity", longValue, 400, false},
         {"Band", "GSM 1900", fill, false},  // exactly filling: not less, so placed after the key
     };
-    for (const Row& row : rows) {
+    for (const auto& row : rows) {
         SCOPED_TRACE(row.value.toStdString());
         auto cell = valueRow(row.key, row.value, row.width);
         const QSize k = VantorelCell::measure(row.key);
@@ -54,16 +52,8 @@ TEST(VantorelCell, AValueFitsFlushRightOrStarts50RightOfItsKeyAndScrolls) {
         EXPECT_EQ(cell->scrollExtent().width(), extent);
         EXPECT_EQ(cell->view()->horizontalScrollBar()->maximum(), extent - row.width);
     }
-}
-
-TEST(VantorelCell, TheLayoutFollowsTheRowsWidthAndTheSeparatorShowsBelowTheScrollView) {
-    auto cell = valueRow("RSSI", "-71 dBm", 400);
+    auto cell = valueRow("RSSI", "-71 dBm", 400);  // a narrower row lays out again
     cell->resize(300, VantorelCell::kRowHeight);
     settle();
     EXPECT_EQ(cell->value()->x(), 300 - VantorelCell::measure("-71 dBm").width());
-    const QImage row = cell->grab().toImage();
-    const int bottom = row.height() - 1;
-    EXPECT_EQ(QColor(row.pixel(VantorelCell::kKeyInset + 2, bottom)), QColor(200, 199, 204));
-    EXPECT_EQ(QColor(row.pixel(298, bottom)), QColor(200, 199, 204));
-    EXPECT_NE(QColor(row.pixel(2, bottom)), QColor(200, 199, 204));  // inset like the key
 }

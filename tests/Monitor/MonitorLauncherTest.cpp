@@ -43,25 +43,16 @@ TEST(MonitorLauncher, AReplayedCaptureReachesTheTerminalViewThroughServiceModelA
     MonitorLauncher launcher;
     ASSERT_TRUE(launcher.start(*source, &view, &error)) << error;
     view.setModel(launcher.model());
-    EXPECT_EQ(launcher.description(), "replay of " + path);
-    ASSERT_TRUE(waitUntil(
-        [&] {
-            NodeRef lac = launcher.model()->nodeAtPath("/Serving Cell/Serving Cell Info/Local Area Code");
-            return view.refreshes() >= 1 && lac && *lac->value() == "23071";
-        },
-        10000));
+    ASSERT_TRUE(waitUntil([&] { return view.refreshes() >= 1 && view.screen().find("\n    Local Area Code: 23071\n") != std::string::npos; }, 10000));
     const std::string screen = view.screen();
     EXPECT_EQ(screen.rfind("Vantorel - Updated ", 0), 0u) << screen;
     EXPECT_NE(screen.find(" messages decoded\n\nTechnology: UTRAN (TD-SCDMA)\n"), std::string::npos) << screen;
-    EXPECT_NE(screen.find("\n    Local Area Code: 23071\n"), std::string::npos) << screen;
     std::fclose(out);
 }
 
 TEST(MonitorLauncher, TheEmbeddedDefaultIsTheUTRANEmulatorAndBadSourcesAreClearErrors) {
     std::string error;
-    auto source = parse({}, &error);
-    ASSERT_TRUE(source);
-    EXPECT_EQ(source->emulate, "utran");
+    EXPECT_EQ(parse({}, &error)->emulate, "utran");
     EXPECT_FALSE(parse({"--emulate", "utran", "--service", "x"}, &error));
     EXPECT_EQ(error, "choose one of --emulate, --replay and --service");
     EXPECT_FALSE(parse({"--speed", "fast"}, &error));
@@ -71,19 +62,17 @@ TEST(MonitorLauncher, TheEmbeddedDefaultIsTheUTRANEmulatorAndBadSourcesAreClearE
 }
 
 TEST(TerminalView, ListsOfValuesShowOneLinePerEntryAndEmptyNodesSaySo) {
-    auto entry = Dictionary::create();
-    entry->set("UARFCN", "10096");
-    entry->set("Cell ID", "120");
-    auto sir = Dictionary::create();
-    sir->set("CCTRCH ID", "1");
-    sir->set("SIR", Value(Array::of({"13", "16"})));
-    auto root = Dictionary::create();
-    root->set("Neighbor Cell List", Value(Array::of({Value(entry)})));
-    root->set("CCTRCH SIR", Value(Array::of({Value(sir)})));
-    root->set("RRC Info", Value(Dictionary::create()));
-    root->set("Count", Value::integer(3));
+    auto dict = [](std::initializer_list<std::pair<const char*, Value>> entries) {
+        auto d = Dictionary::create();
+        for (const auto& [key, value] : entries) d->set(key, value);
+        return Value(d);
+    };
+    const Value root = dict({{"Neighbor Cell List", Value(Array::of({dict({{"UARFCN", "10096"}, {"Cell ID", "120"}})}))},
+                             {"CCTRCH SIR", Value(Array::of({dict({{"CCTRCH ID", "1"}, {"SIR", Value(Array::of({"13", "16"}))}})}))},
+                             {"RRC Info", dict({})},
+                             {"Count", Value::integer(3)}});
     PathDictionary paths;
-    const NodeRef tree = VantorelModelNode::makeTreeFromObject(Value(root), paths);
+    const NodeRef tree = VantorelModelNode::makeTreeFromObject(root, paths);
     EXPECT_EQ(TreeFormatter::compactTree(tree),
               "Neighbor Cell List\n"
               "  0: UARFCN 10096 | Cell ID 120\n"
@@ -93,5 +82,4 @@ TEST(TerminalView, ListsOfValuesShowOneLinePerEntryAndEmptyNodesSaySo) {
               "    SIR: 13 16\n"
               "RRC Info (empty)\n"
               "Count: (unknown)\n");
-    EXPECT_EQ(TreeFormatter::tree(tree).rfind("Neighbor Cell List\n  0\n    UARFCN: 10096\n    Cell ID: 120\n", 0), 0u);
 }

@@ -44,18 +44,17 @@ TEST(DecodeCommand, RealCapturesAndBadUse) {
     EXPECT_EQ(real.code, 0) << real.err;
     EXPECT_NE(real.err.find("5483 messages read, 0 skipped (message id not 0), 1 bad frames"), std::string::npos)
         << real.err;
-    struct Row {
+    const struct {
         QStringList args;
         int code;
         const char* says;
-    };
-    const Row rows[] = {
+    } rows[] = {
         {{VANTOREL_CAPTURES_DIR "/qmdl_example.qmdl"}, 1, "does not say its technology: add --technology (ifx, gsm, cdma, lte, utran)"},
         {{"--format", "yaml", "x"}, 2, "unknown --format 'yaml'"},
         {{"--technology", "wimax", "x"}, 2, "unknown technology 'wimax'"},
         {{"--technology", "utran", "/nonexistent/file.qmdl"}, 1, "/nonexistent/file.qmdl"},
     };
-    for (const Row& row : rows) {
+    for (const auto& row : rows) {
         CommandOutput r = decode(row.args);
         EXPECT_EQ(r.code, row.code) << row.says;
         EXPECT_NE(r.err.find(row.says), std::string::npos) << r.err;
