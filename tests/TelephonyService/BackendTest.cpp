@@ -5,7 +5,6 @@
 
 #include "Platform/RecordBuilder.h"
 #include "Platform/TelephonyIdentifiers.h"
-#include "TelephonyService/Emulator/UTRANScenario.h"
 #include "TelephonyService/ServiceTestSupport.h"
 
 #include <QElapsedTimer>
@@ -16,6 +15,7 @@
 namespace vantorel {
 namespace {
 
+using servicetest::FastUTRANScenario;
 using servicetest::spin;
 using servicetest::streamOf;
 using servicetest::waitUntil;
@@ -84,17 +84,10 @@ TEST(ReplayBackend, ALoopingReplayWaitsWhilePausedAndStartsOverAtItsEnd) {
     backend.stop();
     EXPECT_EQ(backend.state(), State::Idle);
 
-    ReplayBackend empty(streamOf({}), 0, true);
+    ReplayBackend empty(streamOf({}), 0, true);  // an empty loop must not spin
     empty.start();
     ASSERT_TRUE(waitUntil([&] { return empty.state() == State::Finished; }));
 }
-
-// The UTRAN modem ticking every 20 ms.
-class FastUTRANScenario : public UTRANScenario {
-public:
-    explicit FastUTRANScenario(uint64_t seed) : UTRANScenario(seed) {}
-    std::chrono::milliseconds tickInterval() const override { return std::chrono::milliseconds(20); }
-};
 
 TEST(EmulatorBackend, TicksComeAtOnceThenEveryIntervalAndGoOnCountingAfterAStop) {
     EmulatorBackend backend(std::make_unique<FastUTRANScenario>(7));
@@ -126,14 +119,14 @@ TEST(EmulatorBackend, TicksComeAtOnceThenEveryIntervalAndGoOnCountingAfterAStop)
 }
 
 TEST(LogMask, AStartCommandForwardsItsCodesAndAlwaysTheJunk) {
-    const Bytes ordinary = RecordBuilder::ordinary(0x7130).build();
     const Bytes prefixed = RecordBuilder::ordinary(0x7130).buildWithPrefix();
-    const Bytes otherCode = RecordBuilder::ordinary(0x7131).build();
     const Bytes extra1 = RecordBuilder::extra(1).build();
-    const Bytes extraAsOrdinary = RecordBuilder::ordinary(1).build();  // code 1, but ordinary
-    const Bytes wrongType = RecordBuilder(2, 0x7130).build();
-    const Bytes shortRecord{0x01, 0x10, 0x00, 0x30};  // no room for the code
-    const std::vector<Bytes> messages = {ordinary, prefixed, otherCode, extra1, extraAsOrdinary, wrongType, shortRecord};
+    const std::vector<Bytes> messages = {
+        RecordBuilder::ordinary(0x7130).build(), prefixed, RecordBuilder::ordinary(0x7131).build(), extra1,
+        RecordBuilder::ordinary(1).build(),  // code 1, but ordinary
+        RecordBuilder(2, 0x7130).build(),     // wrong type: junk
+        Bytes{0x01, 0x10, 0x00, 0x30},        // no room for the code: junk
+    };
 
     auto command = [](std::optional<std::vector<Value>> ordinaryCodes, std::optional<std::vector<Value>> extraCodes) {
         auto dict = Dictionary::create();

@@ -15,8 +15,7 @@ Bytes xml(const DictionaryRef& d) { return *PropertyListSerialization::write(Val
 }  // namespace
 
 // Lives on the service thread; owns the ports there.
-class FakeServiceWorker : public QObject {
-public:
+struct FakeServiceWorker : QObject {
     explicit FakeServiceWorker(FakeTelephonyService* owner) : owner_(owner) {}
 
     void start() {
@@ -60,7 +59,6 @@ public:
             owner_->startCommands_.push_back(Value(command));
             return std::nullopt;
         }
-        ++owner_->queries_;
         const FakeTelephonyService::Behaviour b = owner_->behaviour();
         if (!b.answerGetTechnology) {
             QThread::msleep(1500);  // longer than any receive timeout in the tests
@@ -72,11 +70,8 @@ public:
         return xml(answer);
     }
 
-    LocalMessagePort* lastChannel() { return channels_.empty() ? nullptr : channels_.back().get(); }
     RemoteMessagePort* lastClient() { return clients_.empty() ? nullptr : clients_.back().get(); }
-    LocalMessagePort* server() { return server_.get(); }
 
-private:
     FakeTelephonyService* owner_;
     std::unique_ptr<LocalMessagePort> server_;
     std::vector<std::unique_ptr<LocalMessagePort>> channels_;
@@ -118,7 +113,7 @@ bool FakeTelephonyService::send(const Bytes& data, int32_t messageId) {
 }
 
 void FakeTelephonyService::closeChannelPort() {
-    onServiceThread([](FakeServiceWorker& w) { if (w.lastChannel()) w.lastChannel()->invalidate(); });
+    onServiceThread([](FakeServiceWorker& w) { if (!w.channels_.empty()) w.channels_.back()->invalidate(); });
 }
 
 void FakeTelephonyService::dropClient() {
@@ -131,7 +126,7 @@ void FakeTelephonyService::notify(const std::string& name) {
     auto notification = Dictionary::create();
     notification->set("Name", name);
     notification->set("Info", Value(info));
-    onServiceThread([&](FakeServiceWorker& w) { if (w.server()) w.server()->broadcastNotification(0, xml(notification)); });
+    onServiceThread([&](FakeServiceWorker& w) { if (w.server_) w.server_->broadcastNotification(0, xml(notification)); });
 }
 
 std::vector<Value> FakeTelephonyService::startCommands() const {

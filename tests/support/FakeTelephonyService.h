@@ -16,7 +16,7 @@
 
 namespace vantorel::testing {
 
-class FakeServiceWorker;
+struct FakeServiceWorker;
 
 struct FakeServiceBehaviour {
     std::string technology = kTSLogChannelTechnology_Morvek_UTRAN2;
@@ -48,13 +48,12 @@ public:
     void notify(const std::string& name);
 
     int channelsCreated() const { return channels_.load(); }
-    int getTechnologyRequests() const { return queries_.load(); }
     // The start commands received, as parsed dictionaries.
     std::vector<Value> startCommands() const;
     std::vector<std::string> clientPortNames() const;
 
 private:
-    friend class FakeServiceWorker;
+    friend struct FakeServiceWorker;
     Behaviour behaviour() const;
     // Runs fn on the service thread and waits for it.
     void onServiceThread(const std::function<void(FakeServiceWorker&)>& fn);
@@ -67,8 +66,6 @@ private:
     std::vector<Value> startCommands_;
     std::vector<std::string> clientPorts_;
     std::atomic<int> channels_{0};
-    std::atomic<int> queries_{0};
 };
-
 
 }  // namespace vantorel::testing
