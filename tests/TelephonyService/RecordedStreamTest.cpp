@@ -71,23 +71,16 @@ TEST(DiagPacket, BodiesAreClassifiedAndLogPacketsSplit) {
     const Bytes good = logPacketBody(0x7130, 0x1122, {0xA1, 0xA2});
     Bytes wrapped{0x98, 0x01, 0x00, 0x00, 0x07, 0x00, 0x00, 0x00};
     append(wrapped, good);
-    // The good packet with its outer (byte 2) and inner (byte 4) lengths set.
-    auto lengths = [&](uint8_t outer, uint8_t inner) {
+    // The good packet with its outer (byte 2) and inner (byte 4) lengths set, and maybe a byte over.
+    auto lengths = [&](uint8_t outer, uint8_t inner, bool byteOver = false) {
         Bytes b = good;
         b[2] = outer;
         b[4] = inner;
+        if (byteOver) b.push_back(0xEE);
         return b;
     };
-    Bytes over = good;
-    over.push_back(0xEE);
     using K = DiagPacket::Kind;
-    struct Row {
-        const char* name;
-        Bytes body;
-        K kind;
-        std::string error;
-        std::optional<uint32_t> subscription;
-    };
+    struct Row { const char* name; Bytes body; K kind; std::string error; std::optional<uint32_t> subscription; };
     const std::vector<Row> rows = {
         {"log packet", good, K::LogPacket, "", {}},
         {"dual-SIM wrapped log packet", wrapped, K::LogPacket, "", 7},
@@ -95,7 +88,7 @@ TEST(DiagPacket, BodiesAreClassifiedAndLogPacketsSplit) {
         {"other 0x98 body", {0x98, 0x02, 0x00, 0x00, 0x07, 0, 0, 0, 0x10}, K::NotLogPacket, "", {}},
         {"lengths differ", lengths(32, 14), K::Malformed, "log packet lengths differ: outer 32, inner 14", {}},
         {"length past the body", lengths(15, 15), K::Malformed, "log packet length 15 runs past the body (14 bytes after the command header)", {}},
-        {"bytes over", over, K::Malformed, "log packet length 14 leaves 1 bytes over at the end of the body", {}},
+        {"bytes over", lengths(14, 14, true), K::Malformed, "log packet length 14 leaves 1 bytes over at the end of the body", {}},
         {"length below the header", lengths(11, 11), K::Malformed, "log packet length 11 is below the 12-byte log header", {}},
         {"cut header", Bytes(good.begin(), good.begin() + 15), K::Malformed, "log packet of 15 bytes, shorter than its 16-byte header", {}},
         {"text message", {0x79, 0x00, 0x01, 0x02}, K::NotLogPacket, "", {}},

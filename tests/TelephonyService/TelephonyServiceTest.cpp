@@ -37,21 +37,18 @@ const Bytes kPrefixedA = RecordBuilder::ordinary(0xD00A, 20).u8(13, 5).buildWith
 const Bytes kJunk = Bytes{0x02, 0x00, 0x01};
 const std::vector<Bytes> kMixed = {kCodeA, kCodeB, kExtra1, kExtra2, kPrefixedA, kJunk};
 
-// A service on a fresh port replaying the records as fast as the client takes them.
-TelephonyServiceOptions replayOptions(std::vector<Bytes> records, bool loop = false) {
-    TelephonyServiceOptions options;
-    options.portName = uniquePortName("service");
-    options.backendFactory = [records = std::move(records), loop] {
-        return std::make_unique<ReplayBackend>(streamOf(records), 0, loop, "test");
-    };
-    return options;
+// A service on a fresh port with that backend; a replay runs as fast as the client takes it.
+TelephonyServiceOptions options(std::function<std::unique_ptr<ModemBackend>()> backend = {}) {
+    TelephonyServiceOptions o;
+    o.portName = uniquePortName("service");
+    o.backendFactory = std::move(backend);
+    return o;
 }
-
+TelephonyServiceOptions replayOptions(std::vector<Bytes> records, bool loop = false) {
+    return options([=] { return std::make_unique<ReplayBackend>(streamOf(records), 0, loop, "test"); });
+}
 TelephonyServiceOptions emulatorOptions() {
-    TelephonyServiceOptions options;
-    options.portName = uniquePortName("service");
-    options.backendFactory = [] { return std::make_unique<EmulatorBackend>(std::make_unique<servicetest::FastUTRANScenario>()); };
-    return options;
+    return options([] { return std::make_unique<EmulatorBackend>(std::make_unique<servicetest::FastUTRANScenario>()); });
 }
 
 bool waitForCounters(const TelephonyServiceThread& service, const std::function<bool(const Counters&)>& done) {
@@ -208,12 +205,11 @@ TEST(TelephonyService, RecordingWritesEveryMessageSentAsACapture) {
     const Capture capture = CaptureReader::readFile(path);
     ASSERT_TRUE(capture.ok()) << capture.report.error;
     EXPECT_EQ(capture.technology, kTSLogChannelTechnology_Morvek_UTRAN2);
-    std::vector<Bytes> recorded;
-    for (const TimedMessage& m : capture.messages) {
-        recorded.push_back(m.data);
-        EXPECT_GT(m.timeMicros, 1700000000LL * 1000000);
+    ASSERT_EQ(capture.messages.size(), expected.size());
+    for (size_t i = 0; i < expected.size(); ++i) {
+        EXPECT_EQ(capture.messages[i].data, expected[i]);
+        EXPECT_GT(capture.messages[i].timeMicros, 1700000000LL * 1000000);
     }
-    EXPECT_EQ(recorded, expected);
 }
 
 TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
@@ -233,23 +229,20 @@ TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
                                        ", backend replay of qmdl_example.qmdl (QMDL, 336 messages, speed 1), technology " +
                                        kTSLogChannelTechnology_Morvek_GSM);
 
-    auto options = [](auto change) {
-        TelephonyServiceOptions o;
-        o.portName = uniquePortName("service");
+    auto with = [](auto change) {
+        TelephonyServiceOptions o = options();
         change(o);
         return o;
     };
     const std::vector<std::pair<TelephonyServiceOptions, std::string>> failures = {  // options, start of the error
         {running, "cannot listen on port " + running.portName + ": the name is in use (is another service running?)"},
-        {options([](auto& o) { o.emulate = "wimax"; }), "unknown technology \"wimax\" (names: ifx, gsm, cdma, lte, utran"},
-        {options([](auto& o) { o.emulate = "gsm"; }), "no emulator scenario for gsm yet (available: utran)"},
-        {options([](auto&) {}), "give exactly one of --emulate TECH and --replay FILE"},
-        {options([](auto& o) { o.replay = "/nonexistent-vantorel.qmdl"; }), "/nonexistent-vantorel.qmdl: No such file or directory"},
-        {options([&](auto& o) { o.replay = qmdl; }),
-         qmdl + " is a QMDL file, which does not say which modem recorded it: --technology TECH is needed (names: "
-                "ifx, gsm, cdma, lte, utran)"},
-        {options([](auto& o) { o.replay = "x"; o.speed = -1; }), "speed -1: give 0"},
-        {options([](auto& o) { o.emulate = "utran"; o.record = "/nonexistent-dir-of-vantorel/x.vcap"; }),
+        {with([](auto& o) { o.emulate = "wimax"; }), "unknown technology \"wimax\" (names: ifx, gsm, cdma, lte, utran"},
+        {with([](auto& o) { o.emulate = "gsm"; }), "no emulator scenario for gsm yet (available: utran)"},
+        {with([](auto&) {}), "give exactly one of --emulate TECH and --replay FILE"},
+        {with([](auto& o) { o.replay = "/nonexistent-vantorel.qmdl"; }), "/nonexistent-vantorel.qmdl: No such file or directory"},
+        {with([&](auto& o) { o.replay = qmdl; }), qmdl + " is a QMDL file, which does not say which modem recorded it"},
+        {with([](auto& o) { o.replay = "x"; o.speed = -1; }), "speed -1: give 0"},
+        {with([](auto& o) { o.emulate = "utran"; o.record = "/nonexistent-dir-of-vantorel/x.vcap"; }),
          "/nonexistent-dir-of-vantorel/x.vcap: "},
     };
     for (const auto& [failing, why] : failures) {
@@ -257,9 +250,8 @@ TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
         EXPECT_FALSE(service.start(&error));
         EXPECT_EQ(error.rfind(why, 0), 0u) << error;
         EXPECT_FALSE(service.isRunning());
-        if (failing.portName != running.portName) {  // nothing is left listening after a failed start
+        if (failing.portName != running.portName)  // nothing is left listening after a failed start
             EXPECT_EQ(RemoteMessagePort::lookup(failing.portName, 100), nullptr);
-        }
     }
 
     TestClient client;
