@@ -39,12 +39,7 @@ std::vector<Bytes> numberedRecords(size_t n) {
 }
 
 TEST(ReplayBackend, ThePaceFollowsTheRecordedGapsDividedByTheSpeed) {
-    struct Row {
-        const char* name;
-        std::vector<int64_t> times;  // microseconds
-        double speed;
-        int minMs, maxMs;
-    };
+    struct Row { const char* name; std::vector<int64_t> timesMicros; double speed; int minMs, maxMs; };
     std::vector<int64_t> minuteApart;
     for (size_t i = 0; i < 3 * ReplayBackend::kBatch + 7; ++i) minuteApart.push_back(int64_t(i) * 60000000);
     const std::vector<Row> rows = {
@@ -56,8 +51,8 @@ TEST(ReplayBackend, ThePaceFollowsTheRecordedGapsDividedByTheSpeed) {
     };
     for (const Row& row : rows) {
         SCOPED_TRACE(row.name);
-        const std::vector<Bytes> records = numberedRecords(row.times.size());
-        ReplayBackend backend(streamOf(records, row.times), row.speed, false);
+        const std::vector<Bytes> records = numberedRecords(row.timesMicros.size());
+        ReplayBackend backend(streamOf(records, row.timesMicros), row.speed, false);
         Collector c(backend);
         QElapsedTimer clock;
         clock.start();
@@ -94,20 +89,17 @@ TEST(EmulatorBackend, TicksComeAtOnceThenEveryIntervalAndGoOnCountingAfterAStop)
     FastUTRANScenario reference(7);
     std::vector<std::vector<Bytes>> ticks;
     for (uint64_t t = 0; t < 200; ++t) ticks.push_back(reference.recordsForTick(t));
-    auto recordsOf = [&](size_t from, size_t to) {
-        std::vector<Bytes> out;
-        for (size_t t = from; t < to; ++t) out.insert(out.end(), ticks[t].begin(), ticks[t].end());
-        return out;
-    };
     Collector c(backend);
     backend.setPaused(true);  // a live modem does not wait for its listener
     backend.start();
-    ASSERT_TRUE(waitUntil([&] { return c.messages.size() >= recordsOf(0, 4).size(); }));
+    ASSERT_TRUE(waitUntil([&] { return c.messages.size() >= 4 * ticks[0].size(); }));
     backend.stop();
     // A tick's records are emitted together: the stream holds whole ticks 0..n-1.
-    size_t n = 0, count = 0;
-    while (count < c.messages.size()) count += ticks[n++].size();
-    EXPECT_EQ(c.messages, recordsOf(0, n));
+    std::vector<Bytes> whole;
+    size_t n = 0;
+    for (; whole.size() < c.messages.size(); ++n) whole.insert(whole.end(), ticks[n].begin(), ticks[n].end());
+    EXPECT_EQ(c.messages, whole);
+    const size_t count = whole.size();
     spin(60);
     EXPECT_EQ(c.messages.size(), count) << "nothing after stop";
 
@@ -135,12 +127,7 @@ TEST(LogMask, AStartCommandForwardsItsCodesAndAlwaysTheJunk) {
         if (extraCodes) dict->set("SetTsExtraCodes", Value(Array::of(*extraCodes)));
         return dict;
     };
-    struct Row {
-        const char* name;
-        DictionaryRef command;
-        std::vector<bool> forwards;  // per message above
-        std::string problem;
-    };
+    struct Row { const char* name; DictionaryRef command; std::vector<bool> forwardsEach; std::string problem; };
     const std::vector<Row> rows = {
         {"no lists: all", command({}, {}), {1, 1, 1, 1, 1, 1, 1}, ""},
         {"one ordinary code", command(std::vector<Value>{Value::integer(0x7130)}, {}), {1, 1, 0, 0, 0, 1, 1}, ""},
@@ -155,7 +142,7 @@ TEST(LogMask, AStartCommandForwardsItsCodesAndAlwaysTheJunk) {
         std::string problem = "untouched";
         const LogMask mask = LogMask::fromStartCommand(*row.command, &problem);
         EXPECT_EQ(problem, row.problem);
-        for (size_t i = 0; i < messages.size(); ++i) EXPECT_EQ(mask.forwards(messages[i]), row.forwards[i]) << i;
+        for (size_t i = 0; i < messages.size(); ++i) EXPECT_EQ(mask.forwards(messages[i]), row.forwardsEach[i]) << i;
     }
     EXPECT_EQ(LogMask::classify(extra1)->effectiveCode(), LogCode::kCellMonitor);
     EXPECT_EQ(LogMask::classify(prefixed)->effectiveCode(), 0x7130);

@@ -199,11 +199,7 @@ TEST(RecordedStream, FormatIsDetectedFromTheContent) {
     unsigned written = 0;
     ASSERT_EQ(DLFAddVersionReport(versionFirst.data(), kDLFVersionReportLength, &written, 1, 1, "(none)", "X",
                                   "Jun 28 2016 22:01", 1467151270, -210, 0), 0);
-    struct Row {
-        const char* name;
-        Bytes data;
-        RecordedStream::Format format;
-    };
+    struct Row { const char* name; Bytes data; RecordedStream::Format format; };
     const std::vector<Row> rows = {
         {"capture", CaptureWriter::headerBytes("x"), RecordedStream::Format::Capture},
         {"two chained DLF records", chain, RecordedStream::Format::Dlf},
