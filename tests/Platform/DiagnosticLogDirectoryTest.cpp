@@ -30,10 +30,7 @@ private:
 };
 
 TEST(DiagnosticLogDirectory, TheFirstUsableSourceWins) {
-    struct Row {
-        Env variable, override_, stateHome, home;
-        std::string path;
-    };
+    struct Row { Env variable, override_, stateHome, home; std::string path; };
     const std::vector<Row> rows = {
         {{}, {}, "/srv/state", "/home/u", "/srv/state/vantorel/DiagnosticLogs"},
         {{}, {}, "/srv/state//", "/home/u", "/srv/state/vantorel/DiagnosticLogs"},

@@ -5,7 +5,6 @@
 
 #include "Platform/RecordBuilder.h"
 #include "Platform/TelephonyIdentifiers.h"
-#include "TelephonyService/Emulator/UTRANScenario.h"
 #include "TelephonyService/ServiceTestSupport.h"
 
 #include <QElapsedTimer>
@@ -16,6 +15,7 @@
 namespace vantorel {
 namespace {
 
+using servicetest::FastUTRANScenario;
 using servicetest::spin;
 using servicetest::streamOf;
 using servicetest::waitUntil;
@@ -39,12 +39,7 @@ std::vector<Bytes> numberedRecords(size_t n) {
 }
 
 TEST(ReplayBackend, ThePaceFollowsTheRecordedGapsDividedByTheSpeed) {
-    struct Row {
-        const char* name;
-        std::vector<int64_t> times;  // microseconds
-        double speed;
-        int minMs, maxMs;
-    };
+    struct Row { const char* name; std::vector<int64_t> timesMicros; double speed; int minMs, maxMs; };
     std::vector<int64_t> minuteApart;
     for (size_t i = 0; i < 3 * ReplayBackend::kBatch + 7; ++i) minuteApart.push_back(int64_t(i) * 60000000);
     const std::vector<Row> rows = {
@@ -56,8 +51,8 @@ TEST(ReplayBackend, ThePaceFollowsTheRecordedGapsDividedByTheSpeed) {
     };
     for (const Row& row : rows) {
         SCOPED_TRACE(row.name);
-        const std::vector<Bytes> records = numberedRecords(row.times.size());
-        ReplayBackend backend(streamOf(records, row.times), row.speed, false);
+        const std::vector<Bytes> records = numberedRecords(row.timesMicros.size());
+        ReplayBackend backend(streamOf(records, row.timesMicros), row.speed, false);
         Collector c(backend);
         QElapsedTimer clock;
         clock.start();
@@ -84,37 +79,27 @@ TEST(ReplayBackend, ALoopingReplayWaitsWhilePausedAndStartsOverAtItsEnd) {
     backend.stop();
     EXPECT_EQ(backend.state(), State::Idle);
 
-    ReplayBackend empty(streamOf({}), 0, true);
+    ReplayBackend empty(streamOf({}), 0, true);  // an empty loop must not spin
     empty.start();
     ASSERT_TRUE(waitUntil([&] { return empty.state() == State::Finished; }));
 }
-
-// The UTRAN modem ticking every 20 ms.
-class FastUTRANScenario : public UTRANScenario {
-public:
-    explicit FastUTRANScenario(uint64_t seed) : UTRANScenario(seed) {}
-    std::chrono::milliseconds tickInterval() const override { return std::chrono::milliseconds(20); }
-};
 
 TEST(EmulatorBackend, TicksComeAtOnceThenEveryIntervalAndGoOnCountingAfterAStop) {
     EmulatorBackend backend(std::make_unique<FastUTRANScenario>(7));
     FastUTRANScenario reference(7);
     std::vector<std::vector<Bytes>> ticks;
     for (uint64_t t = 0; t < 200; ++t) ticks.push_back(reference.recordsForTick(t));
-    auto recordsOf = [&](size_t from, size_t to) {
-        std::vector<Bytes> out;
-        for (size_t t = from; t < to; ++t) out.insert(out.end(), ticks[t].begin(), ticks[t].end());
-        return out;
-    };
     Collector c(backend);
     backend.setPaused(true);  // a live modem does not wait for its listener
     backend.start();
-    ASSERT_TRUE(waitUntil([&] { return c.messages.size() >= recordsOf(0, 4).size(); }));
+    ASSERT_TRUE(waitUntil([&] { return c.messages.size() >= 4 * ticks[0].size(); }));
     backend.stop();
     // A tick's records are emitted together: the stream holds whole ticks 0..n-1.
-    size_t n = 0, count = 0;
-    while (count < c.messages.size()) count += ticks[n++].size();
-    EXPECT_EQ(c.messages, recordsOf(0, n));
+    std::vector<Bytes> whole;
+    size_t n = 0;
+    for (; whole.size() < c.messages.size(); ++n) whole.insert(whole.end(), ticks[n].begin(), ticks[n].end());
+    EXPECT_EQ(c.messages, whole);
+    const size_t count = whole.size();
     spin(60);
     EXPECT_EQ(c.messages.size(), count) << "nothing after stop";
 
@@ -126,14 +111,14 @@ TEST(EmulatorBackend, TicksComeAtOnceThenEveryIntervalAndGoOnCountingAfterAStop)
 }
 
 TEST(LogMask, AStartCommandForwardsItsCodesAndAlwaysTheJunk) {
-    const Bytes ordinary = RecordBuilder::ordinary(0x7130).build();
     const Bytes prefixed = RecordBuilder::ordinary(0x7130).buildWithPrefix();
-    const Bytes otherCode = RecordBuilder::ordinary(0x7131).build();
     const Bytes extra1 = RecordBuilder::extra(1).build();
-    const Bytes extraAsOrdinary = RecordBuilder::ordinary(1).build();  // code 1, but ordinary
-    const Bytes wrongType = RecordBuilder(2, 0x7130).build();
-    const Bytes shortRecord{0x01, 0x10, 0x00, 0x30};  // no room for the code
-    const std::vector<Bytes> messages = {ordinary, prefixed, otherCode, extra1, extraAsOrdinary, wrongType, shortRecord};
+    const std::vector<Bytes> messages = {
+        RecordBuilder::ordinary(0x7130).build(), prefixed, RecordBuilder::ordinary(0x7131).build(), extra1,
+        RecordBuilder::ordinary(1).build(),  // code 1, but ordinary
+        RecordBuilder(2, 0x7130).build(),     // wrong type: junk
+        Bytes{0x01, 0x10, 0x00, 0x30},        // no room for the code: junk
+    };
 
     auto command = [](std::optional<std::vector<Value>> ordinaryCodes, std::optional<std::vector<Value>> extraCodes) {
         auto dict = Dictionary::create();
@@ -142,12 +127,7 @@ TEST(LogMask, AStartCommandForwardsItsCodesAndAlwaysTheJunk) {
         if (extraCodes) dict->set("SetTsExtraCodes", Value(Array::of(*extraCodes)));
         return dict;
     };
-    struct Row {
-        const char* name;
-        DictionaryRef command;
-        std::vector<bool> forwards;  // per message above
-        std::string problem;
-    };
+    struct Row { const char* name; DictionaryRef command; std::vector<bool> forwardsEach; std::string problem; };
     const std::vector<Row> rows = {
         {"no lists: all", command({}, {}), {1, 1, 1, 1, 1, 1, 1}, ""},
         {"one ordinary code", command(std::vector<Value>{Value::integer(0x7130)}, {}), {1, 1, 0, 0, 0, 1, 1}, ""},
@@ -162,7 +142,7 @@ TEST(LogMask, AStartCommandForwardsItsCodesAndAlwaysTheJunk) {
         std::string problem = "untouched";
         const LogMask mask = LogMask::fromStartCommand(*row.command, &problem);
         EXPECT_EQ(problem, row.problem);
-        for (size_t i = 0; i < messages.size(); ++i) EXPECT_EQ(mask.forwards(messages[i]), row.forwards[i]) << i;
+        for (size_t i = 0; i < messages.size(); ++i) EXPECT_EQ(mask.forwards(messages[i]), row.forwardsEach[i]) << i;
     }
     EXPECT_EQ(LogMask::classify(extra1)->effectiveCode(), LogCode::kCellMonitor);
     EXPECT_EQ(LogMask::classify(prefixed)->effectiveCode(), 0x7130);

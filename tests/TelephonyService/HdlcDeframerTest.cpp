@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include <string>
+#include <tuple>
 #include <vector>
 
 namespace vantorel {
@@ -51,12 +52,7 @@ TEST(HdlcDeframer, StreamsGiveTheSameFramesHoweverTheyAreChunked) {
         crcEscaped[2] = static_cast<uint8_t>(i);
     }
     ASSERT_EQ(HdlcDeframer::crc16(crcEscaped), 0x7D7E);  // both CRC bytes escaped
-    struct Row {
-        const char* name;
-        Bytes stream;
-        Result expected;
-    };
-    const std::vector<Row> rows = {
+    const std::vector<std::tuple<const char*, Bytes, Result>> rows = {
         {"plain frame", hdlcFrame(plain), {{plain}}},
         {"flag and escape bytes", hdlcFrame(specials), {{specials}}},
         {"escaped CRC byte", hdlcFrame(crcEscaped), {{crcEscaped}}},
@@ -68,26 +64,25 @@ TEST(HdlcDeframer, StreamsGiveTheSameFramesHoweverTheyAreChunked) {
         {"escape at the end of the stream", {0x10, 0x7D}, {{}, 0, 0, 1}},
         {"nothing", {}, {}},
     };
-    for (const Row& row : rows) {
-        SCOPED_TRACE(row.name);
-        const ByteView all(row.stream);
-        EXPECT_EQ(deframe({all}), row.expected);
-        for (size_t cut = 1; cut < all.size(); ++cut)
-            ASSERT_EQ(deframe({all.first(cut), all.subspan(cut)}), row.expected) << "cut at " << cut;
+    for (const auto& [name, stream, expected] : rows) {
+        SCOPED_TRACE(name);
+        const ByteView all(stream);
+        EXPECT_EQ(deframe({all}), expected);
         std::vector<ByteView> bytes;
-        for (size_t i = 0; i < all.size(); ++i) bytes.push_back(all.subspan(i, 1));
-        EXPECT_EQ(deframe(bytes), row.expected);
+        for (size_t cut = 1; cut < all.size(); ++cut) {
+            ASSERT_EQ(deframe({all.first(cut), all.subspan(cut)}), expected) << "cut at " << cut;
+            bytes.push_back(all.subspan(cut - 1, 1));
+        }
+        if (!all.empty()) bytes.push_back(all.last(1));
+        EXPECT_EQ(deframe(bytes), expected);
     }
 }
 
 TEST(HdlcDeframer, OversizeFrameIsDroppedOnceAndTheStreamGoesOnAtTheNextFlag) {
     const Bytes plain{0x10, 0x00, 0x41};
     Bytes huge(HdlcDeframer::kMaxFrameLength + 10, 0x55);
-    Result r = deframe({huge, concat({{0x7E}, hdlcFrame(plain)})});
-    EXPECT_EQ(r, (Result{{plain}, 0, 1, 0}));
-    // Unclosed at the end: counted as malformed, not again as truncated.
-    r = deframe({huge});
-    EXPECT_EQ(r, (Result{{}, 0, 1, 0}));
+    EXPECT_EQ(deframe({huge, concat({{0x7E}, hdlcFrame(plain)})}), (Result{{plain}, 0, 1, 0}));
+    EXPECT_EQ(deframe({huge}), (Result{{}, 0, 1, 0}));  // unclosed: malformed, not again truncated
 }
 
 TEST(HdlcDeframer, FinishEndsOneStreamAndProblemsNameTheFrameOffset) {

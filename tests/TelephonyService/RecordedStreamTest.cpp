@@ -32,17 +32,14 @@ struct CaptureRow {
     const char* file;
     size_t frames, logPackets, otherPackets, badCrc;
     std::map<uint16_t, size_t> codes;
-    std::map<uint16_t, uint8_t> versions;  // first payload byte of every packet of that code
 };
 
 TEST(RecordedStream, RealCapturesReadAsTheirReadmeCounts) {
     const std::vector<CaptureRow> rows = {
-        {"qmdl_example.qmdl", 345, 336, 9, 0, {{0x7130, 17}, {0x7131, 11}, {0x7132, 4}, {0x7150, 1}, {0xB0C1, 2}, {0xB0C2, 12}},
-         {{0xB0C1, 1}, {0xB0C2, 2}}},
-        {"offline_log_example.mi2log", 16485, 1127, 15358, 0,
-         {{0x134F, 5}, {0x4116, 1}, {0x7130, 7}, {0xB179, 11}, {0xB17F, 1}}, {{0xB179, 4}, {0xB17F, 5}}},
-        {"cmcc.mi2log", 5500, 5483, 17, 1, {{0x7130, 68}, {0x7135, 13}, {0x7150, 7}, {0xB0C1, 97}}, {{0xB0C1, 2}}},
-        {"sprint.mi2log", 47106, 47087, 19, 1, {{0x4116, 14011}, {0x7150, 94}, {0xB0C2, 840}}, {{0xB0C2, 3}}},
+        {"qmdl_example.qmdl", 345, 336, 9, 0, {{0x7130, 17}, {0x7131, 11}, {0x7132, 4}, {0x7150, 1}, {0xB0C1, 2}, {0xB0C2, 12}}},
+        {"offline_log_example.mi2log", 16485, 1127, 15358, 0, {{0x134F, 5}, {0x4116, 1}, {0x7130, 7}, {0xB179, 11}, {0xB17F, 1}}},
+        {"cmcc.mi2log", 5500, 5483, 17, 1, {{0x7130, 68}, {0x7135, 13}, {0x7150, 7}, {0xB0C1, 97}}},
+        {"sprint.mi2log", 47106, 47087, 19, 1, {{0x4116, 14011}, {0x7150, 94}, {0xB0C2, 840}}},
     };
     for (const CaptureRow& row : rows) {
         SCOPED_TRACE(row.file);
@@ -63,10 +60,6 @@ TEST(RecordedStream, RealCapturesReadAsTheirReadmeCounts) {
             ASSERT_TRUE(r.has(0, 13));
             ASSERT_EQ(r.u8(0).value_or(0), LogCode::kOrdinaryType);
             ASSERT_EQ(r.u16(1).value_or(0), m.data.size() - 1);  // the DLF length
-            const auto version = row.versions.find(r.u16(3).value_or(0));
-            if (version != row.versions.end()) {
-                ASSERT_EQ(r.u8(13).value_or(0xFF), version->second);
-            }
         }
         // Recorded in 2015 and 2016.
         EXPECT_GE(stream.messages().front().timeMicros, 1420070400ll * 1000000);
@@ -78,23 +71,16 @@ TEST(DiagPacket, BodiesAreClassifiedAndLogPacketsSplit) {
     const Bytes good = logPacketBody(0x7130, 0x1122, {0xA1, 0xA2});
     Bytes wrapped{0x98, 0x01, 0x00, 0x00, 0x07, 0x00, 0x00, 0x00};
     append(wrapped, good);
-    // The good packet with its outer (byte 2) and inner (byte 4) lengths set.
-    auto lengths = [&](uint8_t outer, uint8_t inner) {
+    // The good packet with its outer (byte 2) and inner (byte 4) lengths set, and maybe a byte over.
+    auto lengths = [&](uint8_t outer, uint8_t inner, bool byteOver = false) {
         Bytes b = good;
         b[2] = outer;
         b[4] = inner;
+        if (byteOver) b.push_back(0xEE);
         return b;
     };
-    Bytes over = good;
-    over.push_back(0xEE);
     using K = DiagPacket::Kind;
-    struct Row {
-        const char* name;
-        Bytes body;
-        K kind;
-        std::string error;
-        std::optional<uint32_t> subscription;
-    };
+    struct Row { const char* name; Bytes body; K kind; std::string error; std::optional<uint32_t> subscription; };
     const std::vector<Row> rows = {
         {"log packet", good, K::LogPacket, "", {}},
         {"dual-SIM wrapped log packet", wrapped, K::LogPacket, "", 7},
@@ -102,11 +88,10 @@ TEST(DiagPacket, BodiesAreClassifiedAndLogPacketsSplit) {
         {"other 0x98 body", {0x98, 0x02, 0x00, 0x00, 0x07, 0, 0, 0, 0x10}, K::NotLogPacket, "", {}},
         {"lengths differ", lengths(32, 14), K::Malformed, "log packet lengths differ: outer 32, inner 14", {}},
         {"length past the body", lengths(15, 15), K::Malformed, "log packet length 15 runs past the body (14 bytes after the command header)", {}},
-        {"bytes over", over, K::Malformed, "log packet length 14 leaves 1 bytes over at the end of the body", {}},
+        {"bytes over", lengths(14, 14, true), K::Malformed, "log packet length 14 leaves 1 bytes over at the end of the body", {}},
         {"length below the header", lengths(11, 11), K::Malformed, "log packet length 11 is below the 12-byte log header", {}},
         {"cut header", Bytes(good.begin(), good.begin() + 15), K::Malformed, "log packet of 15 bytes, shorter than its 16-byte header", {}},
         {"text message", {0x79, 0x00, 0x01, 0x02}, K::NotLogPacket, "", {}},
-        {"recording tool's record", {0xEE, 0xEE, 0x01}, K::NotLogPacket, "", {}},
         {"empty", {}, K::NotLogPacket, "", {}},
     };
     for (const Row& row : rows) {
@@ -156,7 +141,6 @@ TEST(QmdlReader, ASyntheticStreamCountsEveryKindOfFrame) {
     EXPECT_EQ(log.problems.size(), 3u);
 }
 
-// A DLF record is a Morvek record without its type byte.
 Bytes dlfOf(const Bytes& morvek) { return Bytes(morvek.begin() + 1, morvek.end()); }
 
 TEST(DlfReader, RecordsAreReadUpToTheFirstCutOrMalformedOne) {
@@ -192,25 +176,19 @@ TEST(DlfReader, RecordsAreReadUpToTheFirstCutOrMalformedOne) {
 }
 
 TEST(DlfReader, TheMonitorsOwnDlfReadsBackAndIsDetectedAsDlf) {
-    const std::vector<Bytes> records = {morvekRecord(0x7130, 1000, {0x01}), morvekRecord(0xD0E0, 3000, {1, 3})};
-    auto history = Array::create();
-    for (const Bytes& r : records) {
-        auto entry = Dictionary::create();
-        entry->set("DisplayState", Value::data(r));
-        history->append(Value(entry));
-    }
+    const Bytes record = morvekRecord(0xD0E0, 3000, {1, 3});
+    auto entry = Dictionary::create();
+    entry->set("DisplayState", Value::data(record));
     Dictionary state;
-    state.set("History", Value(history));
-    MVKLogGenerator generator;
-    const auto dlf = generator.generateDlfFromState(state);
+    state.set("History", Value(Array::of({Value(entry)})));
+    const auto dlf = MVKLogGenerator().generateDlfFromState(state);
     ASSERT_TRUE(dlf);
     const RecordedStream stream = RecordedStream::fromBytes(*dlf, kTSLogChannelTechnology_Morvek_UTRAN2);
     EXPECT_EQ(stream.format(), RecordedStream::Format::Dlf);
-    ASSERT_EQ(stream.messages().size(), 3u);
+    ASSERT_EQ(stream.messages().size(), 2u);
     EXPECT_EQ(ByteReader(stream.messages()[0].data).u16(3), LogCode::kDlfVersionReport);
-    EXPECT_EQ(stream.messages()[1].data, records[0]);
-    EXPECT_EQ(stream.messages()[2].data, records[1]);
-    EXPECT_EQ(stream.messages()[2].timeMicros, DiagPacket::microsecondsSince1970(3000));
+    EXPECT_EQ(stream.messages()[1].data, record);
+    EXPECT_EQ(stream.messages()[1].timeMicros, DiagPacket::microsecondsSince1970(3000));
 }
 
 TEST(RecordedStream, FormatIsDetectedFromTheContent) {
@@ -221,11 +199,7 @@ TEST(RecordedStream, FormatIsDetectedFromTheContent) {
     unsigned written = 0;
     ASSERT_EQ(DLFAddVersionReport(versionFirst.data(), kDLFVersionReportLength, &written, 1, 1, "(none)", "X",
                                   "Jun 28 2016 22:01", 1467151270, -210, 0), 0);
-    struct Row {
-        const char* name;
-        Bytes data;
-        RecordedStream::Format format;
-    };
+    struct Row { const char* name; Bytes data; RecordedStream::Format format; };
     const std::vector<Row> rows = {
         {"capture", CaptureWriter::headerBytes("x"), RecordedStream::Format::Capture},
         {"two chained DLF records", chain, RecordedStream::Format::Dlf},
@@ -246,7 +220,7 @@ TEST(CaptureReader, MessagesRoundTripAndACutLastMessageIsReportedAndDropped) {
     const Bytes whole = file;
     const size_t lastOffset = file.size();
     append(file, CaptureWriter::messageBytes(1700000000000003, 0, Bytes(10, 0x42)));
-    for (size_t cut : {size_t(0), size_t(1), size_t(7), size_t(20)}) {
+    for (size_t cut : {size_t(0), size_t(1), size_t(20)}) {
         SCOPED_TRACE(cut);
         const Capture capture = CaptureReader::readBytes(
             cut == 0 ? ByteView(whole) : ByteView(file).first(file.size() - cut));
@@ -258,9 +232,8 @@ TEST(CaptureReader, MessagesRoundTripAndACutLastMessageIsReportedAndDropped) {
         EXPECT_EQ(capture.report.count(0xD00A), 1u);
         EXPECT_EQ(capture.report.otherPackets, 1u);
         EXPECT_EQ(capture.report.truncated, cut == 0 ? 0u : 1u);
-        if (cut != 0) {
+        if (cut != 0)
             EXPECT_EQ(capture.report.problems.at(0).rfind("truncated message at byte " + std::to_string(lastOffset), 0), 0u);
-        }
     }
 }
 

@@ -1,4 +1,4 @@
-// ServiceTestSupport: test-side helpers for the telephony service tests: HDLC frames and DIAG log packets, in-memory streams, start commands and a model-like client.
+// ServiceTestSupport: test-side helpers for the telephony service tests: HDLC frames, DIAG log packets, in-memory streams, start commands, a fast UTRAN modem and a model-like client.
 #pragma once
 
 #include "Platform/LocalMessagePort.h"
@@ -9,6 +9,7 @@
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
 #include "PropertyList/PropertyListSerialization.h"
+#include "TelephonyService/Emulator/UTRANScenario.h"
 #include "TelephonyService/Replay/CaptureWriter.h"
 #include "TelephonyService/Replay/HdlcDeframer.h"
 #include "TelephonyService/Replay/RecordedStream.h"
@@ -45,13 +46,11 @@ inline Bytes hdlcFrame(ByteView body, uint16_t crcXor = 0) {
     return out;
 }
 
-// The Morvek record of an ordinary log record with that code, time stamp and payload.
 inline Bytes morvekRecord(uint16_t code, uint64_t timeStamp, std::initializer_list<uint8_t> payload) {
     return RecordBuilder::ordinary(code).timestamp(timeStamp).bytes(13, ByteView(payload.begin(), payload.size())).build();
 }
 
-// A DIAG log packet 10 00 <len> followed by the DLF record (the Morvek record without
-// its type byte), len = 12 + payload.
+// A DIAG log packet: 10 00 <len LE>, then the Morvek record without its type byte.
 inline Bytes logPacketBody(uint16_t code, uint64_t timeStamp, std::initializer_list<uint8_t> payload) {
     const Bytes morvek = morvekRecord(code, timeStamp, payload);
     Bytes body{0x10, 0x00};
@@ -60,8 +59,7 @@ inline Bytes logPacketBody(uint16_t code, uint64_t timeStamp, std::initializer_l
     return body;
 }
 
-// An in-memory UTRAN capture of the messages at the given times in microseconds (1 ms
-// apart when none are given), as a RecordedStream.
+// An in-memory UTRAN capture of the messages at the given times (1 ms apart when none are given).
 inline RecordedStream streamOf(const std::vector<Bytes>& messages, const std::vector<int64_t>& times = {}) {
     Bytes file = CaptureWriter::headerBytes(kTSLogChannelTechnology_Morvek_UTRAN2);
     for (size_t i = 0; i < messages.size(); ++i)
@@ -80,56 +78,52 @@ inline DictionaryRef startCommand(std::initializer_list<int64_t> ordinary, std::
     auto dict = Dictionary::create();
     dict->set("SetState", Value("Streaming"));
     if (!withLists) return dict;
-    auto codes = Array::create();
+    auto codes = Array::create(), extras = Array::create();
     for (int64_t c : ordinary) codes->append(Value::integer(c));
-    auto extras = Array::create();
     for (int64_t c : extra) extras->append(Value::integer(c));
     dict->set("SetMorvekLogCodes", Value(codes));
     dict->set("SetTsExtraCodes", Value(extras));
     return dict;
 }
 
-// The model's side of a log channel: a receive port, the service connection, the
-// channel's send port; every message with id 0 is kept.
+// The UTRAN modem ticking every 20 ms, so the tests need not wait.
+class FastUTRANScenario : public UTRANScenario {
+public:
+    explicit FastUTRANScenario(uint64_t seed = 1) : UTRANScenario(seed) {}
+    std::chrono::milliseconds tickInterval() const override { return std::chrono::milliseconds(20); }
+};
+
+// The model's side of a log channel: a receive port keeping every message with id 0,
+// the service connection, the channel's send port.
 class TestClient {
 public:
-    struct Notification {
-        std::string name;
-        Value info;
-    };
-
     std::vector<Bytes> received;
-    std::vector<Notification> notifications;
+    std::vector<std::pair<std::string, Value>> notifications;
     TelephonyServiceConnection::LogChannelResult channel;
 
-    // True when the channel's port was found. keepConnection: keep the server
-    // connection (for notifications) instead of releasing it as the model does.
+    // keepConnection: keep the server connection (for notifications) instead of releasing it as the model does.
     bool connect(const std::string& serviceName, bool keepConnection = false) {
         const std::string recvName = uniquePortName("client");
         recv_ = LocalMessagePort::create(recvName, [this](int32_t id, const Bytes& data) -> std::optional<Bytes> {
             if (id == 0) received.push_back(data);
             return std::nullopt;
         });
-        if (!recv_) return false;
         connection_ = TelephonyServiceConnection::open(
-            [this](const std::string& name, const Value& info) { notifications.push_back({name, info}); }, serviceName);
-        if (!connection_) return false;
+            [this](const std::string& name, const Value& info) { notifications.emplace_back(name, info); }, serviceName);
+        if (!recv_ || !connection_) return false;
         channel = connection_->createLogChannel(recvName);
         if (!keepConnection) connection_.reset();
-        if (channel.errorCode != 0 || channel.portName.empty()) return false;
         send_ = RemoteMessagePort::lookup(channel.portName);
-        return send_ != nullptr;
+        return channel.errorCode == 0 && send_ != nullptr;
     }
 
     std::optional<std::string> getTechnology() {
         auto query = Dictionary::create();
         query->set("GetTechnology", Value("GetTechnology"));
         std::optional<Bytes> reply;
-        if (send_->sendRequest(0, xmlOf(query), 1.0, 1.0, &reply) != RemoteMessagePort::Success || !reply)
-            return std::nullopt;
+        if (send_->sendRequest(0, xmlOf(query), 1.0, 1.0, &reply) != RemoteMessagePort::Success || !reply) return {};
         PropertyListResult parsed = PropertyListSerialization::readDictionary(*reply);
-        if (!parsed) return std::nullopt;
-        const std::string* tech = parsed.value->asDictionary()->get("GetTechnology").asString();
+        const std::string* tech = parsed ? parsed.value->asDictionary()->get("GetTechnology").asString() : nullptr;
         return tech ? std::optional<std::string>(*tech) : std::nullopt;
     }
 
@@ -139,16 +133,16 @@ public:
 
     // Closes both ports, as the model does when it lets go of the channel.
     void close() {
-        if (recv_) recv_->invalidate();
-        if (send_) send_->invalidate();
+        recv_->invalidate();
+        send_->invalidate();
     }
 
     // The states of the BackendStateChanged notifications heard so far.
     std::vector<std::string> backendStates() const {
         std::vector<std::string> states;
-        for (const Notification& n : notifications)
-            if (const DictionaryRef info = n.info.asDictionary(); info && n.name == "BackendStateChanged")
-                states.push_back(info->get("State").asString() ? *info->get("State").asString() : "?");
+        for (const auto& [name, info] : notifications)
+            if (const DictionaryRef d = info.asDictionary(); d && name == "BackendStateChanged")
+                states.push_back(d->get("State").asString() ? *d->get("State").asString() : "?");
         return states;
     }
 

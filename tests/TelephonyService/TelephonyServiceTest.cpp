@@ -1,26 +1,21 @@
 // Tests the telephony service end to end over local sockets, the service on its own thread and a model-like client on the test thread: channels, GetTechnology, log masks, clients leaving, bad requests, flow control, notifications, recording and start-up failures.
 #include "TelephonyService/TelephonyService.h"
 
-#include "Platform/LogCodes.h"
 #include "Platform/RecordBuilder.h"
 #include "Platform/TelephonyIdentifiers.h"
 #include "TelephonyService/EmulatorBackend.h"
-#include "TelephonyService/Emulator/UTRANScenario.h"
-#include "TelephonyService/LogMask.h"
 #include "TelephonyService/ReplayBackend.h"
 #include "TelephonyService/Replay/CaptureReader.h"
 #include "TelephonyService/ServiceTestSupport.h"
 #include "TelephonyService/TelephonyServiceThread.h"
 
 #include <QCoreApplication>
-#include <QLocalSocket>
 #include <QTemporaryDir>
 #include <QThread>
 #include <gtest/gtest.h>
 
 #include <atomic>
 #include <memory>
-#include <set>
 #include <string>
 #include <vector>
 
@@ -42,27 +37,18 @@ const Bytes kPrefixedA = RecordBuilder::ordinary(0xD00A, 20).u8(13, 5).buildWith
 const Bytes kJunk = Bytes{0x02, 0x00, 0x01};
 const std::vector<Bytes> kMixed = {kCodeA, kCodeB, kExtra1, kExtra2, kPrefixedA, kJunk};
 
-// A service on a fresh port replaying the records as fast as the client takes them.
-TelephonyServiceOptions replayOptions(std::vector<Bytes> records, bool loop = false) {
-    TelephonyServiceOptions options;
-    options.portName = uniquePortName("service");
-    options.backendFactory = [records = std::move(records), loop] {
-        return std::make_unique<ReplayBackend>(streamOf(records), 0, loop, "test");
-    };
-    return options;
+// A service on a fresh port with that backend; a replay runs as fast as the client takes it.
+TelephonyServiceOptions options(std::function<std::unique_ptr<ModemBackend>()> backend = {}) {
+    TelephonyServiceOptions o;
+    o.portName = uniquePortName("service");
+    o.backendFactory = std::move(backend);
+    return o;
 }
-
-// The UTRAN modem with ticks 25 times as often, so the tests need not wait.
-class FastUTRANScenario : public UTRANScenario {
-public:
-    std::chrono::milliseconds tickInterval() const override { return std::chrono::milliseconds(20); }
-};
-
+TelephonyServiceOptions replayOptions(std::vector<Bytes> records, bool loop = false) {
+    return options([=] { return std::make_unique<ReplayBackend>(streamOf(records), 0, loop, "test"); });
+}
 TelephonyServiceOptions emulatorOptions() {
-    TelephonyServiceOptions options;
-    options.portName = uniquePortName("service");
-    options.backendFactory = [] { return std::make_unique<EmulatorBackend>(std::make_unique<FastUTRANScenario>()); };
-    return options;
+    return options([] { return std::make_unique<EmulatorBackend>(std::make_unique<servicetest::FastUTRANScenario>()); });
 }
 
 bool waitForCounters(const TelephonyServiceThread& service, const std::function<bool(const Counters&)>& done) {
@@ -81,13 +67,11 @@ TEST(TelephonyService, AChannelAnswersGetTechnologyAndSendsNothingBeforeTheStart
     ASSERT_TRUE(service.start(&error)) << error;
     TestClient client;
     ASSERT_TRUE(client.connect(service.portName()));
-    EXPECT_EQ(client.channel.errorDomain, 0);
     const std::string prefix = service.portName() + ".channel." + std::to_string(QCoreApplication::applicationPid()) + ".";
     EXPECT_EQ(client.channel.portName.rfind(prefix, 0), 0u) << client.channel.portName;
     EXPECT_EQ(client.getTechnology(), std::optional<std::string>(kTSLogChannelTechnology_Morvek_UTRAN2));
     servicetest::spin(100);  // five emulator ticks
     EXPECT_TRUE(client.received.empty());
-    EXPECT_EQ(service.counters().openChannels, 1u);
     EXPECT_EQ(service.counters().messagesSent, 0u);
 }
 
@@ -102,21 +86,6 @@ TEST(TelephonyService, TwoClientsGetTheirOwnMasks) {
     ASSERT_TRUE(waitUntil([&] { return a.received.size() >= 10 && b.received.size() >= 10; }));
     for (const Bytes& m : a.received) EXPECT_TRUE(m == kCodeA || m == kPrefixedA || m == kJunk);
     for (const Bytes& m : b.received) EXPECT_TRUE(m == kExtra2 || m == kJunk);
-}
-
-TEST(TelephonyService, TheEmulatorStreamsOnlyTheSubscribedCodesOfItsTicks) {
-    TelephonyServiceThread service(emulatorOptions());
-    ASSERT_TRUE(service.start());
-    TestClient client;
-    ASSERT_TRUE(client.connect(service.portName()));
-    ASSERT_TRUE(client.send(startCommand({LogCode::kUTRANRRCState}, {LogCode::kCellMonitor & 0xFFFF})));
-    std::set<int32_t> seen;
-    ASSERT_TRUE(waitUntil([&] {
-        for (const Bytes& m : client.received)
-            if (const auto c = LogMask::classify(m)) seen.insert(c->effectiveCode());
-        return seen.size() >= 2;
-    }));
-    EXPECT_EQ(seen, (std::set<int32_t>{LogCode::kUTRANRRCState, LogCode::kCellMonitor}));
 }
 
 TEST(TelephonyService, ClientsThatGoAwayFreeTheirChannelsAndTheLastOneStopsTheBackend) {
@@ -146,16 +115,9 @@ TEST(TelephonyService, ClientsThatGoAwayFreeTheirChannelsAndTheLastOneStopsTheBa
     EXPECT_EQ(service.counters().channelsServed, 3u);
 }
 
-TEST(TelephonyService, BadFramesAndRequestsAreAnsweredOrCountedAndServingGoesOn) {
+TEST(TelephonyService, BadChannelRequestsAreAnsweredWithAnErrorAndServingGoesOn) {
     TelephonyServiceThread service(emulatorOptions());
     ASSERT_TRUE(service.start());
-    QLocalSocket raw;
-    raw.connectToServer(QString::fromStdString(service.portName()));
-    ASSERT_TRUE(raw.waitForConnected(1000));
-    raw.write(QByteArray("\x09\x01\x00\x00\x00\x00\x00\x00\x04\x00\x00\x00junk", 16));  // kind 9
-    ASSERT_TRUE(raw.waitForBytesWritten(1000));
-    ASSERT_TRUE(waitForCounters(service, [](const Counters& c) { return c.malformedFrames == 1; }));
-
     auto port = RemoteMessagePort::lookup(service.portName());
     ASSERT_TRUE(port);
     auto request = [](std::optional<std::string> portName) {
@@ -181,10 +143,8 @@ TEST(TelephonyService, BadFramesAndRequestsAreAnsweredOrCountedAndServingGoesOn)
     }
     TestClient client;
     ASSERT_TRUE(client.connect(service.portName()));
-    const Counters c = service.counters();
-    EXPECT_EQ(c.malformedFrames, 1u);
-    EXPECT_EQ(c.malformedRequests, 2u);
-    EXPECT_EQ(c.openChannels, 1u);
+    EXPECT_EQ(service.counters().malformedRequests, 2u);
+    EXPECT_EQ(service.counters().openChannels, 1u);
 }
 
 TEST(TelephonyService, AFinishedReplayIsNotifiedAndStartsOverForTheNextClient) {
@@ -198,7 +158,7 @@ TEST(TelephonyService, AFinishedReplayIsNotifiedAndStartsOverForTheNextClient) {
         ASSERT_TRUE(waitUntil([&] { return client.backendStates().size() >= 2; }));
         EXPECT_EQ(client.backendStates(), (std::vector<std::string>{"Streaming", "Finished"}));
         EXPECT_EQ(client.received, (std::vector<Bytes>{kCodeA, kCodeB}));
-        EXPECT_EQ(*client.notifications[0].info.asDictionary()->get("Technology").asString(),
+        EXPECT_EQ(*client.notifications[0].second.asDictionary()->get("Technology").asString(),
                   kTSLogChannelTechnology_Morvek_UTRAN2);
         client.close();
         ASSERT_TRUE(waitForCounters(service, [](const Counters& c) { return c.openChannels == 0; }));
@@ -245,12 +205,11 @@ TEST(TelephonyService, RecordingWritesEveryMessageSentAsACapture) {
     const Capture capture = CaptureReader::readFile(path);
     ASSERT_TRUE(capture.ok()) << capture.report.error;
     EXPECT_EQ(capture.technology, kTSLogChannelTechnology_Morvek_UTRAN2);
-    std::vector<Bytes> recorded;
-    for (const TimedMessage& m : capture.messages) {
-        recorded.push_back(m.data);
-        EXPECT_GT(m.timeMicros, 1700000000LL * 1000000);
+    ASSERT_EQ(capture.messages.size(), expected.size());
+    for (size_t i = 0; i < expected.size(); ++i) {
+        EXPECT_EQ(capture.messages[i].data, expected[i]);
+        EXPECT_GT(capture.messages[i].timeMicros, 1700000000LL * 1000000);
     }
-    EXPECT_EQ(recorded, expected);
 }
 
 TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
@@ -270,24 +229,20 @@ TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
                                        ", backend replay of qmdl_example.qmdl (QMDL, 336 messages, speed 1), technology " +
                                        kTSLogChannelTechnology_Morvek_GSM);
 
-    auto options = [](auto change) {
-        TelephonyServiceOptions o;
-        o.portName = uniquePortName("service");
+    auto with = [](auto change) {
+        TelephonyServiceOptions o = options();
         change(o);
         return o;
     };
     const std::vector<std::pair<TelephonyServiceOptions, std::string>> failures = {  // options, start of the error
         {running, "cannot listen on port " + running.portName + ": the name is in use (is another service running?)"},
-        {options([](auto& o) { o.emulate = "wimax"; }), "unknown technology \"wimax\" (names: ifx, gsm, cdma, lte, utran"},
-        {options([](auto& o) { o.emulate = "gsm"; }), "no emulator scenario for gsm yet (available: utran)"},
-        {options([](auto&) {}), "give exactly one of --emulate TECH and --replay FILE"},
-        {options([&](auto& o) { o.emulate = "utran"; o.replay = qmdl; }), "give exactly one of --emulate TECH and --replay FILE"},
-        {options([](auto& o) { o.replay = "/nonexistent-vantorel.qmdl"; }), "/nonexistent-vantorel.qmdl: No such file or directory"},
-        {options([&](auto& o) { o.replay = qmdl; }),
-         qmdl + " is a QMDL file, which does not say which modem recorded it: --technology TECH is needed (names: "
-                "ifx, gsm, cdma, lte, utran)"},
-        {options([](auto& o) { o.replay = "x"; o.speed = -1; }), "speed -1: give 0"},
-        {options([](auto& o) { o.emulate = "utran"; o.record = "/nonexistent-dir-of-vantorel/x.vcap"; }),
+        {with([](auto& o) { o.emulate = "wimax"; }), "unknown technology \"wimax\" (names: ifx, gsm, cdma, lte, utran"},
+        {with([](auto& o) { o.emulate = "gsm"; }), "no emulator scenario for gsm yet (available: utran)"},
+        {with([](auto&) {}), "give exactly one of --emulate TECH and --replay FILE"},
+        {with([](auto& o) { o.replay = "/nonexistent-vantorel.qmdl"; }), "/nonexistent-vantorel.qmdl: No such file or directory"},
+        {with([&](auto& o) { o.replay = qmdl; }), qmdl + " is a QMDL file, which does not say which modem recorded it"},
+        {with([](auto& o) { o.replay = "x"; o.speed = -1; }), "speed -1: give 0"},
+        {with([](auto& o) { o.emulate = "utran"; o.record = "/nonexistent-dir-of-vantorel/x.vcap"; }),
          "/nonexistent-dir-of-vantorel/x.vcap: "},
     };
     for (const auto& [failing, why] : failures) {
@@ -295,9 +250,8 @@ TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
         EXPECT_FALSE(service.start(&error));
         EXPECT_EQ(error.rfind(why, 0), 0u) << error;
         EXPECT_FALSE(service.isRunning());
-        if (failing.portName != running.portName) {  // nothing is left listening after a failed start
+        if (failing.portName != running.portName)  // nothing is left listening after a failed start
             EXPECT_EQ(RemoteMessagePort::lookup(failing.portName, 100), nullptr);
-        }
     }
 
     TestClient client;

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <QStringList>
+#include <gtest/gtest.h>
 
 #include <string>
 
@@ -14,6 +15,12 @@ struct CommandOutput {
 };
 
 // `command` is a command's run function (DecodeCommand::run, SnapshotCommand::run, ...).
-CommandOutput runCommand(int (*command)(const QStringList&), const QStringList& args);
+inline CommandOutput runCommand(int (*command)(const QStringList&), const QStringList& args) {
+    ::testing::internal::CaptureStdout();
+    ::testing::internal::CaptureStderr();
+    const int code = command(args);
+    std::string out = ::testing::internal::GetCapturedStdout();
+    return {code, std::move(out), ::testing::internal::GetCapturedStderr()};
+}
 
 }  // namespace vantorel::testing

@@ -11,12 +11,16 @@
 #include <functional>
 #include <memory>
 #include <mutex>
+#include <optional>
 #include <string>
 #include <vector>
 
-namespace vantorel::testing {
+namespace vantorel {
+class LocalMessagePort;
+class RemoteMessagePort;
+}  // namespace vantorel
 
-class FakeServiceWorker;
+namespace vantorel::testing {
 
 struct FakeServiceBehaviour {
     std::string technology = kTSLogChannelTechnology_Morvek_UTRAN2;
@@ -37,7 +41,7 @@ public:
     const std::string& name() const { return name_; }
     void setBehaviour(const Behaviour& behaviour);
 
-    // On the service thread: sends one message to the newest channel's client port.
+    // Sends one message to the newest channel's client port.
     bool send(const Bytes& data, int32_t messageId = 0);
     // Closes the newest channel's own port (the model's send port dies).
     void closeChannelPort();
@@ -47,28 +51,29 @@ public:
     // Pushes a notification to every server connection.
     void notify(const std::string& name);
 
-    int channelsCreated() const { return channels_.load(); }
-    int getTechnologyRequests() const { return queries_.load(); }
+    int channelsCreated() const { return channelCount_.load(); }
     // The start commands received, as parsed dictionaries.
     std::vector<Value> startCommands() const;
     std::vector<std::string> clientPortNames() const;
 
 private:
-    friend class FakeServiceWorker;
     Behaviour behaviour() const;
-    // Runs fn on the service thread and waits for it.
-    void onServiceThread(const std::function<void(FakeServiceWorker&)>& fn);
+    // Runs fn on the service thread, where the ports live, and waits for it.
+    void onServiceThread(const std::function<void()>& fn);
+    std::optional<Bytes> createLogChannel(const Bytes& data);
+    std::optional<Bytes> command(const Bytes& data);
 
     std::string name_;
     QThread thread_;
-    FakeServiceWorker* worker_ = nullptr;
+    std::unique_ptr<QObject> context_;
+    std::unique_ptr<LocalMessagePort> server_;
+    std::vector<std::unique_ptr<LocalMessagePort>> channels_;
+    std::vector<std::unique_ptr<RemoteMessagePort>> clients_;
     mutable std::mutex mutex_;
     Behaviour behaviour_;
     std::vector<Value> startCommands_;
     std::vector<std::string> clientPorts_;
-    std::atomic<int> channels_{0};
-    std::atomic<int> queries_{0};
+    std::atomic<int> channelCount_{0};
 };
-
 
 }  // namespace vantorel::testing

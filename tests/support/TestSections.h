@@ -15,8 +15,7 @@ inline constexpr uint16_t kValueCode = 0x1234;     // TestValueSection's ordinar
 inline constexpr uint16_t kSharedCode = 0x5678;    // both sections
 inline constexpr int32_t kListExtraCode = 0xFF0001;  // TestListSection's extra code
 
-// "Test Values": writes "Counter" = "%d" of payload byte 13 for kValueCode and
-// kSharedCode; records every call.
+// "Test Values": "Counter" = payload byte 13 for kValueCode and kSharedCode; records every call.
 class TestValueSection : public Base {
 public:
     std::string getSectionName() const override { return "Test Values"; }
@@ -27,8 +26,7 @@ public:
     std::vector<size_t> lengths;
 };
 
-// "Test List": for kSharedCode, one entry per payload byte; for the extra code,
-// the record raises SectionError when its payload byte 13 is 0xEE.
+// "Test List": one entry per payload byte of kSharedCode; the extra code throws when its byte 13 is 0xEE.
 class TestListSection : public Base {
 public:
     std::string getSectionName() const override { return "Test List"; }
