@@ -97,15 +97,3 @@ TEST_F(VantorelAppTest, WhenADeeperPanesBranchVanishesTheStackPopsToThePaneBelow
         EXPECT_EQ(qos->node(), qosNode);  // not reloaded before it went
     }
 }
-
-TEST_F(VantorelAppTest, TheShellShowsTheRSSIWhileRunningUnlessTheUserAlreadyChoseTo) {
-    for (bool chosen : {false, true}) {
-        QTemporaryDir fresh;
-        Preferences::setDirectory(fresh.path().toStdString());
-        if (chosen) Preferences::setOwnBool(Preferences::kShowGSMRSSI, true);
-        auto app = launch();
-        EXPECT_EQ(Preferences::shellBool(Preferences::kShowGSMRSSI), chosen ? std::nullopt : std::optional(true));
-        app->applicationWillTerminate();
-        EXPECT_EQ(Preferences::shellBool(Preferences::kShowGSMRSSI), chosen ? std::nullopt : std::optional(false));
-    }
-}

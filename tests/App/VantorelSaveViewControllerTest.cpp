@@ -98,22 +98,3 @@ TEST_F(VantorelSaveViewControllerTest, AFailedWriteLeavesTheFileErrorAlertUpAfte
     settle();
     EXPECT_TRUE(alert.isNull());
 }
-
-TEST_F(VantorelSaveViewControllerTest, CancelEscapeAndReturnWriteNothing) {
-    auto screen = makeScreen(Value());
-    QLineEdit* field = screen->saveDescription();
-    field->setFocus();
-    field->setText("typed");
-    pressKey(field, Qt::Key_Return);  // only dismisses the keyboard
-    EXPECT_NE(screen->focusWidget(), field);
-
-    screen->cancelButton()->click();
-    settle();
-    EXPECT_EQ(app.closeSaveViewCalls, 1);
-    auto again = makeScreen(Value());
-    pressKey(again.get(), Qt::Key_Escape);
-    again->reject();  // the application's own dismissal coming back: no second request
-    settle();
-    EXPECT_EQ(app.closeSaveViewCalls, 2);
-    EXPECT_FALSE(QDir(QString::fromStdString(logDir)).exists());  // not even the directory
-}

@@ -60,26 +60,3 @@ TEST(MonitorLauncher, TheEmbeddedDefaultIsTheUTRANEmulatorAndBadSourcesAreClearE
     EXPECT_FALSE(launcher.start(*parse({"--emulate", "lte"}, &error), nullptr, &error));
     EXPECT_NE(error.find("no emulator scenario for lte yet (available: utran)"), std::string::npos) << error;
 }
-
-TEST(TerminalView, ListsOfValuesShowOneLinePerEntryAndEmptyNodesSaySo) {
-    auto dict = [](std::initializer_list<std::pair<const char*, Value>> entries) {
-        auto d = Dictionary::create();
-        for (const auto& [key, value] : entries) d->set(key, value);
-        return Value(d);
-    };
-    const Value root = dict({{"Neighbor Cell List", Value(Array::of({dict({{"UARFCN", "10096"}, {"Cell ID", "120"}})}))},
-                             {"CCTRCH SIR", Value(Array::of({dict({{"CCTRCH ID", "1"}, {"SIR", Value(Array::of({"13", "16"}))}})}))},
-                             {"RRC Info", dict({})},
-                             {"Count", Value::integer(3)}});
-    PathDictionary paths;
-    const NodeRef tree = VantorelModelNode::makeTreeFromObject(root, paths);
-    EXPECT_EQ(TreeFormatter::compactTree(tree),
-              "Neighbor Cell List\n"
-              "  0: UARFCN 10096 | Cell ID 120\n"
-              "CCTRCH SIR\n"
-              "  0\n"
-              "    CCTRCH ID: 1\n"
-              "    SIR: 13 16\n"
-              "RRC Info (empty)\n"
-              "Count: (unknown)\n");
-}

@@ -51,24 +51,5 @@ TEST(DiagnosticLogDirectory, TheFirstUsableSourceWins) {
     DiagnosticLogDirectory::setOverride("");
 }
 
-TEST(DiagnosticLogDirectory, EnsureExistsMakesTheParentsAndFailsUnderAFile) {
-    ScopedEnvironment variable(DiagnosticLogDirectory::kEnvironmentVariable, std::nullopt);
-    QTemporaryDir tmp;
-    QFile(tmp.filePath("plain")).open(QIODevice::WriteOnly);
-    const std::vector<std::pair<QString, std::string>> rows = {  // directory, error ("" for success)
-        {"a/b/logs", ""},
-        {"a/b/logs", ""},  // it exists now
-        {"plain/logs", "cannot create directory " + tmp.filePath("plain/logs").toStdString()},
-        {"plain", "not a directory: " + tmp.filePath("plain").toStdString()},
-    };
-    for (const auto& [dir, why] : rows) {
-        DiagnosticLogDirectory::setOverride(tmp.filePath(dir).toStdString());
-        std::string error;
-        EXPECT_EQ(DiagnosticLogDirectory::ensureExists(&error), why.empty());
-        EXPECT_EQ(error, why);
-    }
-    DiagnosticLogDirectory::setOverride("");
-}
-
 }  // namespace
 }  // namespace vantorel

@@ -75,7 +75,7 @@ TEST(MessagePortFrame, StreamsDecodeTheSameHoweverTheyAreSplit) {
                             frames[i].data == row.frames[i].data) << i;
             ASSERT_EQ(decoder.error(), row.error) << "cut at " << cut;
             EXPECT_EQ(decoder.buffered(), row.buffered);
-            if (decoder.failed()) EXPECT_TRUE(decoder.feed(request.encode()).empty());
+            if (decoder.failed()) { EXPECT_TRUE(decoder.feed(request.encode()).empty()); }
         }
     }
 }

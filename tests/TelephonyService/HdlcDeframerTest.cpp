@@ -37,11 +37,6 @@ Bytes concat(std::initializer_list<Bytes> parts) {
     return out;
 }
 
-TEST(HdlcDeframer, CrcIsX25WithItsCheckValue) {
-    EXPECT_EQ(HdlcDeframer::crc16(Bytes{0x01, 0x02, 0x03, 0x04}), 0x3991);
-    EXPECT_EQ(HdlcDeframer::crc16(Bytes{'1', '2', '3', '4', '5', '6', '7', '8', '9'}), 0x906E);
-}
-
 TEST(HdlcDeframer, StreamsGiveTheSameFramesHoweverTheyAreChunked) {
     const Bytes plain{0x10, 0x00, 0x41};
     const Bytes specials{0x7E, 0x7D, 0x20, 0x5E, 0x5D};  // flag and escape inside the body

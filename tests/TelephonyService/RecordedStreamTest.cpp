@@ -61,9 +61,6 @@ TEST(RecordedStream, RealCapturesReadAsTheirReadmeCounts) {
             ASSERT_EQ(r.u8(0).value_or(0), LogCode::kOrdinaryType);
             ASSERT_EQ(r.u16(1).value_or(0), m.data.size() - 1);  // the DLF length
         }
-        // Recorded in 2015 and 2016.
-        EXPECT_GE(stream.messages().front().timeMicros, 1420070400ll * 1000000);
-        EXPECT_LT(stream.messages().front().timeMicros, 1483228800ll * 1000000);
     }
 }
 
@@ -232,8 +229,9 @@ TEST(CaptureReader, MessagesRoundTripAndACutLastMessageIsReportedAndDropped) {
         EXPECT_EQ(capture.report.count(0xD00A), 1u);
         EXPECT_EQ(capture.report.otherPackets, 1u);
         EXPECT_EQ(capture.report.truncated, cut == 0 ? 0u : 1u);
-        if (cut != 0)
+        if (cut != 0) {
             EXPECT_EQ(capture.report.problems.at(0).rfind("truncated message at byte " + std::to_string(lastOffset), 0), 0u);
+        }
     }
 }
 

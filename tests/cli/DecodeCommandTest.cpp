@@ -39,11 +39,7 @@ TEST(DecodeCommand, ACaptureDecodesToTheDisplayAsTreeOrJsonWithOnlyDataOnStandar
     EXPECT_EQ(serving["Serving Cell Info"].toObject()["Local Area Code"].toString(), "23071") << json.out;
 }
 
-TEST(DecodeCommand, RealCapturesAndBadUse) {
-    CommandOutput real = decode({"--technology", "utran", VANTOREL_CAPTURES_DIR "/cmcc.mi2log"});
-    EXPECT_EQ(real.code, 0) << real.err;
-    EXPECT_NE(real.err.find("5483 messages read, 0 skipped (message id not 0), 1 bad frames"), std::string::npos)
-        << real.err;
+TEST(DecodeCommand, BadUseIsAClearError) {
     const struct {
         QStringList args;
         int code;
@@ -63,12 +59,12 @@ TEST(DecodeCommand, RealCapturesAndBadUse) {
 
 TEST(InfoCommand, AccountsForEveryFrameOfTheRealCaptures) {
     CommandOutput r = vantorel::testing::runCommand(
-        &InfoCommand::run, {VANTOREL_CAPTURES_DIR "/qmdl_example.qmdl", VANTOREL_CAPTURES_DIR "/sprint.mi2log"});
+        &InfoCommand::run, {VANTOREL_CAPTURES_DIR "/qmdl_example.qmdl", VANTOREL_CAPTURES_DIR "/cmcc.mi2log"});
     EXPECT_EQ(r.code, 0) << r.err;
     EXPECT_NE(r.out.find("QMDL, technology unknown, 336 messages"), std::string::npos) << r.out;
     EXPECT_NE(r.out.find("frames 345, log packets 336, other packets 9, bad CRC 0, malformed 0, truncated 0"),
               std::string::npos);
     EXPECT_NE(r.out.find("0x7130  17"), std::string::npos);
-    EXPECT_NE(r.out.find("QMDL, technology unknown, 47087 messages"), std::string::npos);
+    EXPECT_NE(r.out.find("QMDL, technology unknown, 5483 messages"), std::string::npos);
     EXPECT_NE(r.out.find("bad CRC 1"), std::string::npos);
 }

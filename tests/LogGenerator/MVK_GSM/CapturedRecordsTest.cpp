@@ -83,10 +83,11 @@ TEST(CapturedRecords, EveryCapturedStateRecordShowsATableTextNothingIsRejectedAn
                     EXPECT_NE(render(value), "Unknown") << file << ": " << key << " after code " << e.logCode;
         }
         EXPECT_TRUE(sectiontest::errorLines(capture).empty()) << file;
-        if (finalStates)
+        if (finalStates) {
             EXPECT_EQ(render(Value(index.ps)) + " " + render(Value(index.co)) + " " + render(Value(index.plmn)) + " " +
                           render(Value(index.cs)) + " " + render(Value(index.eplmns)),
                       finalStates);
+        }
     }
 }
 

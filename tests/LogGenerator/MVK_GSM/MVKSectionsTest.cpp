@@ -60,12 +60,6 @@ TEST(MMStateSections, StateRecordsShowTheTableTextsOfTheirBytes) {
         EXPECT_EQ(row.show(stateRecord(row.code, row.b13, row.b14, row.b15, row.length), row.code), row.expected);
 }
 
-TEST(MMStateSections, AForeignCodeIsLoggedAndChangesNothing) {
-    SystemLogCapture capture;
-    EXPECT_EQ(showState<ProcessPS>(stateRecord(0x7131, 1, 1, 1), 0x7131), "{}");
-    EXPECT_EQ(errorLines(capture), std::vector<std::string>{"Received an unknown log message: 28977"});
-}
-
 // 0x7135: 14 service type, 15..17 BCD PLMN, 18..19 LAC big-endian, 20 RAC; 28 bytes.
 Bytes plmnRecord(std::initializer_list<uint8_t> bytes14to20, size_t length = 28) {
     return RecordBuilder::ordinary(0x7135, 28).bytes(14, bytes14to20).resize(length).build();
@@ -118,17 +112,6 @@ TEST(ServingPLMNSection, TheFirstServingGSMOrUMTSCellOfTheCellMonitorGivesPlainN
     for (const auto& [record, expected] : rows) EXPECT_EQ(showState<ServingPLMN>(record, 0xFF0001), expected);
 }
 
-TEST(ServingPLMNSection, WhicheverSourceCameLastIsShown) {
-    Bound<ServingPLMN> plmn;
-    plmn.feed(plmnRecord({3, 0x13, 0xF0, 0x01, 0x12, 0x34, 5}), 0x7135);
-    plmn.feed(cellMonitor({cell(kTSCellMonitorRadioAccessTechnologyGSM, kTSCellMonitorCellTypeServing,
-                                {{kTSCellMonitorMCC, 262}, {kTSCellMonitorMNC, 1}, {kTSCellMonitorLAC, 77}})}),
-              0xFF0001);
-    EXPECT_EQ(plmn.shown(),
-              "{Mobile Country Code=262, Mobile Network Code=1, Location Area Code=77, Routing Area Code=5, "
-              "Service Type=CS_PS_SERVICE}");
-}
-
 // 0x7150: 16 count, entry i at 17 + 3i, six single-digit bytes (entries overlap by three).
 Bytes plmnListRecord(uint8_t count, std::initializer_list<uint8_t> from17, size_t length) {
     return RecordBuilder::ordinary(0x7150, length).u8(16, count).bytes(17, from17).resize(length).build();
@@ -147,16 +130,6 @@ TEST(EquivalentPLMNListSection, EntriesOverlapStopAtTheRecordsEndAndEachRecordRe
     };
     for (const auto& [records, expected] : rows)
         EXPECT_EQ(Bound<EquivalentPLMNList>(true).feed(records, 0x7150).shown(), expected);
-}
-
-TEST(EquivalentPLMNListSection, ACountOf255ReadsEveryEntry) {
-    Bytes record = RecordBuilder::ordinary(0x7150, 17 + 3 * 254 + 6).u8(16, 255).build();
-    record[17 + 3 * 254 + 5] = 7;  // the last entry's MNC units
-    Bound<EquivalentPLMNList> list(true);
-    list.feed(record, 0x7150);
-    ASSERT_EQ(list.list->size(), 255u);
-    EXPECT_EQ(render(list.list->at(254)), "{Mobile Country Code=0, Mobile Network Code=7}");
-    EXPECT_EQ(ArrayLock::counter(), 0);
 }
 
 Bytes pdpRecord(Value root) { return RecordBuilder::extraPropertyList(2, root); }
