@@ -1,4 +1,4 @@
-// NavigationController: the stack of drill-down panes with its top bar (title, back button), standing in for the handset's navigation controller.
+// NavigationController: the stack of drill-down panes with its top bar (title, back button).
 #include "App/NavigationController.h"
 
 #include "App/NavigationControllerDelegate.h"

@@ -45,8 +45,8 @@ bool VantorelApp::applicationDidFinishLaunching(std::string* error) {
     _window->raise();
     _window->activateWindow();
     // The delegate is set once the root is on screen: the first pane keeps reading
-    // "Connecting" until the first update, as on the handset (deliberate: the root is
-    // not told "Connecting..." when it first appears).
+    // "Connecting" until the first update (deliberate: the root is not told
+    // "Connecting..." when it first appears, so the first screen reads without dots).
     navigation->setDelegate(this);
 
     // Creates the model and queues restartMonitor on the main queue: connecting
@@ -77,7 +77,7 @@ void VantorelApp::getRSSIPref() {
 }
 
 void VantorelApp::getSaveButtonPref() {
-    // The internal-install marker, as on the handset; our own setting and
+    // The internal-install marker file; our own setting and
     // --allow-save also enable it, since desktop installs have no such marker.
     _allowSaveButton = Preferences::internalInstallMarkerExists() ||
                        Preferences::ownBool(Preferences::kAllowSaveButton).value_or(false) || options_.allowSave;

@@ -126,7 +126,8 @@ void VantorelCell::setLayoutValue() {
     key_->setGeometry(content.x() + kKeyInset, centred(content.height(), k.height()), k.width(), k.height());
 
     // A drill-down row reused for a leaf has no value label: its value counts as
-    // the measure of nothing (deliberate: the handset's reused cells behave so).
+    // the measure of nothing (deliberate: reuse keeps the cell's kind, see
+    // VantorelPaneController::cellForRow).
     const QSize v = value_ ? measure(value_->text()) : QSize(0, 0);
     const int needed = kKeyInset + k.width() + kValueGap + v.width();
     if (value_) {

@@ -1,4 +1,4 @@
-// VantorelCell: one row of a pane, a drill-down row or a value row, laid out as the handset's rows: key at the left, value flush right or scrolled.
+// VantorelCell: one row of a pane, a drill-down row or a value row, key at the left, value flush right or scrolled.
 #pragma once
 
 #include <QWidget>

@@ -180,8 +180,8 @@ VantorelCell* VantorelPaneController::cellForRowAtIndexPath(int row) {
         cell->key()->setText(name);
         cell->setAccessoryType(VantorelCell::AccessoryType::None);
         // A drill-down row reused for a leaf has no value label: the value is not
-        // shown until the table makes a new cell (deliberate: the handset's reused
-        // cells behave so).
+        // shown until the table makes a new cell (deliberate: a reused cell keeps the
+        // kind it was made with).
         const std::string* value = child->value();
         if (cell->value()) cell->value()->setText(value ? QString::fromStdString(*value) : QString());
         cell->setLayoutValue();

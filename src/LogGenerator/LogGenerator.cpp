@@ -50,8 +50,8 @@ void LogGenerator::updateHistoryInState(Dictionary& state) {
     }
 
     // The entry is built from these pairs in order and stops at the first absent
-    // value (deliberate, as the modem's own tool does: no "DisplayState" gives an
-    // empty entry).
+    // value (deliberate: no "DisplayState" gives an empty entry, and the history
+    // still counts it).
     auto entry = Dictionary::create();
     const std::string date = DateDescription::now();
     const std::string description = StringFormat::format("Snapshot (%s)", DateDescription::now().c_str());

@@ -51,7 +51,7 @@ std::optional<Bytes> MVKLogGenerator::generateDlfFromState(Dictionary& state) {
                 return std::nullopt;
             }
             // Only the first byte of each buffer is dropped, however many records it
-            // holds: deliberate, the DLF readers of the modem's tools expect it so.
+            // holds: deliberate, so our DLFs keep the byte layout of the ones saved before.
             if (bytes->size() >= 2) dlf.insert(dlf.end(), bytes->begin() + 1, bytes->end());
         }
     }

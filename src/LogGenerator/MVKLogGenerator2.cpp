@@ -26,7 +26,8 @@ MVKLogGenerator2::MVKLogGenerator2(std::string pListName_, std::unique_ptr<Class
 }
 
 MVKLogGenerator2::~MVKLogGenerator2() {
-    // The one class name for every subclass, on purpose: the modem's own tool logs it so.
+    // The one class name for every subclass, on purpose: log filters written for this
+    // line match every decoder.
     SystemLog::log(SystemLog::kWarning, "MVK_GSMLogGenerator is destructed %p", static_cast<void*>(this));
 }
 

@@ -5,7 +5,7 @@
 
 namespace vantorel {
 
-// The product runs on the system clock with the modem tool's fixed waits. A program
+// The product runs on the system clock with fixed waits. A program
 // that needs another pace (a test driving the retry path in milliseconds, a frozen
 // wall clock for snapshot names) installs its own clock once, before it creates a
 // model or a save screen; nothing else changes the waits.

@@ -79,7 +79,7 @@ private:
     PathDictionary _nodesByPath;
 
     // Kept while the channel is open so that the service's notifications reach
-    // `refresh` (on the handset the run loop keeps the connection alive).
+    // `refresh`.
     std::unique_ptr<TelephonyServiceConnection> serverConnection_;
     ApplicationObject* application_;
     std::string serviceName_;

@@ -9,8 +9,8 @@ namespace vantorel {
 
 class StatusText {
 public:
-    // The root pane's text from launch until the first update reaches it (no dots:
-    // the modem tool's first screen reads so).
+    // The root pane's text from launch until the first update reaches it (no dots,
+    // on purpose: the first screen is told apart from a lost channel).
     static constexpr const char* kFirstConnecting = "Connecting";
     // Whenever the channel is down.
     static constexpr const char* kConnecting = "Connecting...";

@@ -9,7 +9,7 @@ namespace vantorel {
 class SystemLog {
 public:
     // The priorities the monitor logs with. Dlf is the DLF writer's value 16 (user
-    // facility, emergency level), passed to syslog as it stands, as the handset's tool does.
+    // facility, emergency level), passed to syslog as it stands.
     static constexpr int kError = 3;
     static constexpr int kWarning = 4;
     static constexpr int kNotice = 5;

@@ -20,7 +20,7 @@ namespace vantorel {
 // Ordinary codes are matched against "SetMorvekLogCodes", extra codes (without the
 // 0xFF0000) against "SetTsExtraCodes". A message that cannot be classified (fewer than
 // 5 bytes after the prefix, or another type byte) is forwarded whatever the mask says,
-// so the decoders meet the modem's junk as they would on the handset.
+// so the decoders meet the modem's junk as they would on a real link.
 class LogMask {
 public:
     static constexpr uint8_t kPrefixByte = 0x81;

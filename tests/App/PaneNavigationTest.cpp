@@ -96,7 +96,7 @@ TEST(PaneNavigation, ReloadReusesCellsInRowOrderAndAReusedCellKeepsItsKind) {
 
     pane.reloadWithNode(makeTree(dict({{"Leaf", "42 dBm"}, {"Sub", dict({})}})));
     settle();
-    // Deliberate, as the handset's reused cells do: the drill-down cell shows the leaf
+    // Deliberate, a reused cell keeps its kind: the drill-down cell shows the leaf
     // without its value, the value cell shows a disclosure and no value.
     ASSERT_EQ(pane.cellAtRow(0), drillDown);
     EXPECT_EQ(drillDown->key()->text(), "Leaf");

@@ -10,7 +10,7 @@ std::string CodingScheme::getSectionName() const { return "Coding Scheme"; }
 std::vector<int32_t> CodingScheme::getLogCodeArray() const { return {}; }
 
 // Nothing is routed here; a direct call only logs the entry line, which is
-// deliberately the same text as Cell Change Counters' (the modem's own tool logs it so).
+// deliberately the same text as Cell Change Counters' (one log filter finds both).
 void CodingScheme::updateWithData(ByteView /*data*/, int32_t /*logCode*/) {
     SystemLog::log(SystemLog::kWarning, "%s", "CellChangeCounters");
 }

@@ -18,7 +18,7 @@ std::vector<int32_t> EquivalentPLMNList::getLogCodeArray() const { return {LogCo
 //   17 + 3 * i   entry i: six single-digit bytes e0..e5,
 //                MCC = e0 e2 e4, MNC = e1 e3 e5 (hundreds, tens, units)
 // The stride is 3 while an entry is 6 bytes wide, so consecutive entries overlap by
-// three bytes: deliberate, it reproduces the lists the modem's own tool shows. The
+// three bytes: deliberate, it keeps the lists users already compare against. The
 // list ends at the first entry whose six bytes do not all lie inside the record.
 void EquivalentPLMNList::updateWithData(ByteView data, int32_t logCode) {
     SystemLog::log(SystemLog::kWarning, "%s", "Equivalent PLMN List");

@@ -13,8 +13,8 @@ std::string ProcessCO::getSectionName() const { return "Process CO"; }
 std::vector<int32_t> ProcessCO::getLogCodeArray() const { return {LogCode::kMMState, LogCode::kRegistrationState}; }
 
 void ProcessCO::updateWithData(ByteView data, int32_t logCode) {
-    // Deliberate: Process CO logs the same entry text as Process CS, as the modem's
-    // own tool does.
+    // Deliberate: Process CO logs the same entry text as Process CS, so a log
+    // filtered on "ProcessCS" shows both sections' records.
     SystemLog::log(SystemLog::kWarning, "%s", "ProcessCS");
     const ByteReader r(data);
     switch (logCode) {

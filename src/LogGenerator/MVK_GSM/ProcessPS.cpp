@@ -20,7 +20,7 @@ const char* const kGMMStateTable[] = {
     "GMM_SERVICE_REQUEST_INITIATED",
 };
 
-// Row 9 is spelled "ATTEMPING" on purpose: the modem's own tool shows it so.
+// Row 9 is spelled "ATTEMPING" on purpose: saved snapshots and log filters use that text.
 const char* const kGMMSubStateTable[] = {
     "GMM_NORMAL_SERVICE",        // 0
     "GMM_LIMITED_SERVICE",       // 1

@@ -19,8 +19,8 @@ namespace {
 //     0                 "CCTRCH ID"
 //     1                 "TSNUM"
 //     2..7              six SIR values, "SIR" in this order
-// The 34 bytes per TRCH (where a TRCH entry takes 2) are deliberate: that is where
-// the modem's own tool looks for the CCTRCH entries.
+// The 34 bytes per TRCH (where a TRCH entry takes 2) are deliberate: the emulator
+// and recorded streams place the CCTRCH entries there.
 constexpr size_t kMinLength = 17;
 constexpr size_t kTRCHCountOffset = 14;
 constexpr size_t kCCTRCHCountOffset = 15;

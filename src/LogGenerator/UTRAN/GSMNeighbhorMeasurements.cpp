@@ -52,8 +52,8 @@ void GSMNeighbhorMeasurements::updateWithData(ByteView data, int32_t logCode) {
             entry->set("RSSI", Value(decimal(e.s16(6).value_or(0))));
             return Value(entry);
         });
-        // Deliberate: the rows are decoded but never shown, so after the first record
-        // the list stays empty, as in the modem's own tool.
+        // Deliberate: the rows are decoded (and their bounds checked) but never shown,
+        // so after the first record the list stays empty.
         return ArrayRef();
     });
 }

@@ -57,7 +57,7 @@ void RRC_State::updateWithData(ByteView data, int32_t logCode) {
     if (logCode != LogCode::kUTRANRRCState) return;
 
     const ByteReader reader(data);
-    // A short record is reported, then decoded all the same, as the modem's tool does.
+    // A short record is reported, then decoded all the same.
     if (reader.size() < kExpectedLength)
         SystemLog::log(SystemLog::kWarning, "LogCode_0xD0E0 is length is %ld expected size %ld",
                        static_cast<long>(reader.size()), static_cast<long>(kExpectedLength));

@@ -444,7 +444,7 @@ Bytes UTRANScenario::blerSIRRecord(uint64_t tick) {
     }
     const size_t t = trchs_.size();
     const size_t c = cctrchTimeslots_.size();
-    // The CCTRCH entries start at 289 + 34*t (the decoder's stride of 34 per TRCH, kept as the modem's tool reads it), beyond the TRCH entries.
+    // The CCTRCH entries start at 289 + 34*t (the decoder's stride of 34 per TRCH), beyond the TRCH entries.
     RecordBuilder b = RecordBuilder::ordinary(LogCode::kUTRANBLERAndSIR, 289 + 34 * t + 8 * c);
     b.timestamp(timestampForTick(tick));
     // 14-15 as one 16-bit value: bits 6-11 TRCH count t, bits 12-15 (byte 15 bits 4-7) CCTRCH count c.

@@ -1,4 +1,4 @@
-// CapturedRecordsTest: replays the real captures' GSM/UMTS registration records through their sections, in the modem tool's routing order.
+// CapturedRecordsTest: replays the real captures' GSM/UMTS registration records through their sections, in the decoder's routing order.
 #include "LogGenerator/ClassIndex.h"
 #include "LogGenerator/MVK_GSM/EquivalentPLMNList.h"
 #include "LogGenerator/MVK_GSM/ProcessCO.h"
@@ -102,8 +102,8 @@ TEST(CapturedRecords, CmccServingPLMNWithoutServiceShowsEveryBCDNibbleAndTheLACA
                                          "Routing Area Code=100, Service Type=NO_SERVICE}");
 }
 
-// The captured 0x7150 records carry BCD PLMNs; the single-digit reading, kept as the
-// modem's own tool shows it, makes these numbers of them.
+// The captured 0x7150 records carry BCD PLMNs; the single-digit reading, kept on
+// purpose, makes these numbers of them.
 TEST(CapturedRecords, EquivalentPLMNRecordsDecodeWithTheSingleDigitReading) {
     const RecordedLog cmcc = readCapture("cmcc.mi2log");
     const RecordedLog sprint = readCapture("sprint.mi2log");
