@@ -3,9 +3,6 @@
 
 #include "Model/VantorelModel.h"
 #include "Monitor/TerminalView.h"
-#include "Monitor/TreeFormatter.h"
-#include "PropertyList/Array.h"
-#include "PropertyList/Dictionary.h"
 #include "support/EventLoopWait.h"
 #include "support/FastMonitorClock.h"
 #include "support/ScenarioCapture.h"

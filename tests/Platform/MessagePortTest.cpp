@@ -119,6 +119,7 @@ TEST(MessagePort, APortTakesOverAStaleSocketFileAnswersRequestsAndClosesAGarbage
     ASSERT_NE(port, nullptr);
     EXPECT_EQ(LocalMessagePort::create(name, {}), nullptr);  // but not a live port
     EXPECT_EQ(LocalMessagePort::create("", {}), nullptr);
+    EXPECT_EQ(LocalMessagePort::create("/nonexistent-vantorel-dir/port", {}), nullptr);  // cannot listen
     auto remote = RemoteMessagePort::lookup(name);
     ASSERT_NE(remote, nullptr);
     std::optional<Bytes> reply;

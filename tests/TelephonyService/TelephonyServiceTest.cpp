@@ -160,6 +160,13 @@ TEST(TelephonyService, AFinishedReplayIsNotifiedAndStartsOverForTheNextClient) {
         EXPECT_EQ(client.received, (std::vector<Bytes>{kCodeA, kCodeB}));
         EXPECT_EQ(*client.notifications[0].second.asDictionary()->get("Technology").asString(),
                   kTSLogChannelTechnology_Morvek_UTRAN2);
+        TestClient late;  // comes while the first still watches the finished replay: no restart under it
+        ASSERT_TRUE(late.connect(service.portName()));
+        ASSERT_TRUE(late.send(startCommand({}, {}, false)));
+        servicetest::spin(100);
+        EXPECT_TRUE(late.received.empty());
+        EXPECT_EQ(backendState(service), ModemBackend::State::Finished);
+        late.close();
         client.close();
         ASSERT_TRUE(waitForCounters(service, [](const Counters& c) { return c.openChannels == 0; }));
     }
@@ -225,6 +232,7 @@ TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
     });
     std::string error;
     ASSERT_TRUE(first.start(&error)) << error;
+    EXPECT_TRUE(first.start(&error));  // already running: nothing more to do
     EXPECT_EQ(first.startupLine(), "listening on " + running.portName +
                                        ", backend replay of qmdl_example.qmdl (QMDL, 336 messages, speed 1), technology " +
                                        kTSLogChannelTechnology_Morvek_GSM);

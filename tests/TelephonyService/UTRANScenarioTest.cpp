@@ -2,7 +2,6 @@
 #include "TelephonyService/Emulator/UTRANScenario.h"
 
 #include "LogGenerator/LogGenerator.h"
-#include "Model/VantorelModelNode.h"
 #include "Platform/ByteReader.h"
 #include "Platform/LogCodes.h"
 #include "Platform/SystemLogCapture.h"
@@ -84,21 +83,6 @@ TEST(UTRANScenario, TheDecodersAcceptEveryRecordButTheDeliberatelyMalformedOnes)
                          LogCode::kPDPContexts})
         EXPECT_TRUE(latest.count(code)) << std::hex << code << " never sent";
 
-    DictionaryRef display = generator->generateLogUsingState(state);
-    ASSERT_TRUE(display);
-    PathDictionary paths;
-    VantorelModelNode::makeTreeFromObject(Value(display), paths);
-    auto at = [&](const std::string& p) -> std::string {
-        auto it = paths.find(p);
-        return it != paths.end() && it->second->value() ? *it->second->value() : "<missing " + p + ">";
-    };
-    // Fields the decoders read back from the scenario's last records.
-    const ByteReader sir(latest[LogCode::kUTRANBLERAndSIR]);
-    const size_t trchs = (sir.u16(14).value_or(0) >> 6) & 0x3F;
-    EXPECT_EQ(at("/Link Quality/TRCH BLER/0/TRCH BLER Measurement"), std::to_string(sir.u8(18).value_or(0)));
-    EXPECT_EQ(at("/Link Quality/CCTRCH SIR/0/TSNUM"), std::to_string(sir.u8(289 + 34 * trchs + 1).value_or(0)));
-    EXPECT_EQ(at("/Serving Cell/Serving Cell Info/Local Area Code"), "23071");  // 0x5A1F
-    EXPECT_EQ(at("/Technology"), "UTRAN (TD-SCDMA)");
 }
 
 }  // namespace

@@ -41,15 +41,12 @@ TEST(MMStateSections, StateRecordsShowTheTableTextsOfTheirBytes) {
         {CS, 0x7131, 19, 8, 0, 16, "{MM State=MM_IDLE, MM Sub State=MM_NORMAL_SERVICE, LU Reject Cause=UPDATED}"},
         // 4 is a gap in the MM state table; 9 and 4 lie past the other two.
         {CS, 0x7131, 4, 9, 4, 16, "{MM State=Unknown, MM Sub State=Unknown, LU Reject Cause=Unknown}"},
-        {CS, 0x7131, 26, 1, 1, 16, "{MM State=Unknown, MM Sub State=MM_NO_IMSI, LU Reject Cause=NOT_UPDATED}"},
         {CS, 0x7131, 19, 8, 0, 15, "{}"},
         {CS, 0x7131, 3, 8, 1, 40, "{MM State=MM_LOCATION_UPDATE_INITIATED, MM Sub State=MM_NORMAL_SERVICE, "
                                   "LU Reject Cause=NOT_UPDATED}"},
         {CS, 0x7132, 6, 0, 0, 16, "{MM Service State=REG_STATE_OFFLINE}"},
-        {CS, 0x7132, 7, 0, 0, 16, "{MM Service State=Unknown}"},
         {CO, 0x7131, 19, 8, 0, 16, "{MM State=MM_IDLE}"},
         {CO, 0x7132, 0, 0, 0, 16, "{MM Service State=REG_STATE_INACTIVE}"},
-        {CO, 0x7132, 0, 0, 0, 15, "{}"},
         {PS, 0x7130, 3, 9, 3, 16, "{MM State=GMM_REGISTERED, MM Sub State=GMM_ATTEMPING_TO_UPDATE, "
                                   "Attach Reject Cause=GMM_GU3_ROUTING_AREA_NOT_ALLOWED}"},
         {PS, 0x7130, 7, 13, 4, 16, "{MM State=Unknown, MM Sub State=Unknown, Attach Reject Cause=Unknown}"},
