@@ -44,6 +44,7 @@ TEST(MonitorLauncher, AReplayedCaptureReachesTheTerminalViewThroughServiceModelA
     const std::string screen = view.screen();
     EXPECT_EQ(screen.rfind("Vantorel - Updated ", 0), 0u) << screen;
     EXPECT_NE(screen.find(" messages decoded\n\nTechnology: UTRAN (TD-SCDMA)\n"), std::string::npos) << screen;
+    EXPECT_NE(screen.find("\n    0: UARFCN "), std::string::npos) << screen;  // a list entry on one line, named fields
     std::fclose(out);
 }
 

@@ -126,6 +126,7 @@ TEST(NeighbourCellListSection, EveryBitFieldOfAnEntryAndEntriesPastTheRecordsEnd
          "[{UARFCN=1, Cell ID=1, Filter RSCP=0.000000, Status=ASET, inJDCS=FALSE}]"},
         {{one, neighbourRecord({}, 1, 183)}, "[]"},
         {{one, neighbourRecord({}, 0, 20)}, oneShown},  // a 20-byte record changes nothing
+        {{one, neighbourRecord({}, 0, 21)}, "[]"},       // 21 bytes is the shortest that rebuilds
     };
     for (const auto& [records, expected] : rows)
         EXPECT_EQ(Bound<UTRANNeighbhorMeasurements>(true).feed(records, 0xD00A).shown(), expected);
