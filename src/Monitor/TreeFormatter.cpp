@@ -3,6 +3,7 @@
 
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
+#include "Platform/TerminalText.h"
 #include "PropertyList/PropertyListSerialization.h"
 
 #include <QDateTime>
@@ -27,7 +28,8 @@ std::string oneLine(const NodeRef& node, bool withNames) {
     std::string line;
     for (const NodeRef& c : *node->childNodes()) {
         if (!line.empty()) line += withNames ? " | " : " ";
-        line += withNames ? c->displayName() + " " + *c->value() : *c->value();
+        line += withNames ? TerminalText::visible(c->displayName()) + " " + TerminalText::visible(*c->value())
+                          : TerminalText::visible(*c->value());
     }
     return line;
 }
@@ -39,9 +41,10 @@ void appendRows(const NodeRef& node, int depth, bool compact, std::string& out) 
     const bool isList = !children->empty() && (*children)[0]->displayName() == "0";
     for (const NodeRef& child : *children) {
         out.append(static_cast<size_t>(depth) * 2, ' ');
-        out += child->displayName();
+        // Names and values come from the modem or a file: printed on a terminal.
+        out += TerminalText::visible(child->displayName());
         if (const std::string* v = child->value()) {
-            out += ": " + *v + "\n";
+            out += ": " + TerminalText::visible(*v) + "\n";
         } else if (child->childNodes()->empty()) {
             out += " (empty)\n";
         } else if (compact && onlyLeaves(child) && (isList || (*child->childNodes())[0]->displayName() == "0")) {

@@ -2,6 +2,7 @@
 #include "Platform/SystemLog.h"
 
 #include "Platform/StringFormat.h"
+#include "Platform/TerminalText.h"
 
 #include <atomic>
 #include <cstdarg>
@@ -38,7 +39,14 @@ void SystemLog::write(int priority, const std::string& line) {
         });
         if (gHaveSyslog) syslog(priority, "%s", line.c_str());
     }
-    if (gMirror.load()) std::fprintf(stderr, "vantorel[%d]: %s\n", priority, line.c_str());
+    if (gMirror.load()) {
+        // Log lines quote what the modem sent and the mirror is usually a terminal:
+        // controls are shown, not obeyed. A line's own final newline is dropped, as
+        // syslog drops it.
+        std::string_view text(line);
+        while (!text.empty() && text.back() == '\n') text.remove_suffix(1);
+        std::fprintf(stderr, "vantorel[%d]: %s\n", priority, TerminalText::visible(text).c_str());
+    }
     std::lock_guard<std::mutex> lock(gObserverMutex);
     if (gObserver) gObserver(priority, line);
 }

@@ -1,6 +1,7 @@
 // SnapshotCommand: `vantorel-cli snapshot`: reads a VantorelSnapshot-*.vantorel file with libplist, lists it and writes out its DLF.
 #include "cli/SnapshotCommand.h"
 
+#include "Platform/TerminalText.h"
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
 #include "PropertyList/PropertyListSerialization.h"
@@ -72,8 +73,9 @@ void printEntry(size_t index, const Value& element) {
         return;
     }
     const std::string* description = entry->get("Description").asString();
-    std::printf("  %zu  %s\n", index, description ? description->c_str() : "(no description)");
-    if (const std::string* date = entry->get("Date").asString()) std::printf("      Date: %s\n", date->c_str());
+    std::printf("  %zu  %s\n", index, description ? TerminalText::visible(*description).c_str() : "(no description)");
+    if (const std::string* date = entry->get("Date").asString())
+        std::printf("      Date: %s\n", TerminalText::visible(*date).c_str());
     if (const Value* dlf = entry->find("DLF")) {
         if (const Bytes* bytes = dlf->asData())
             std::printf("      DLF: %zu bytes\n", bytes->size());
@@ -159,8 +161,9 @@ int SnapshotCommand::run(const QStringList& args) {
     }
 
     const Array& data = *root.get("Data").asArray();
-    std::printf("Timestamp: %s\n", root.get("Timestamp").asString()->c_str());
-    std::printf("Description: %s\n", root.get("Description").asString()->c_str());
+    // The snapshot's texts are the file's: printed with their control characters visible.
+    std::printf("Timestamp: %s\n", TerminalText::visible(*root.get("Timestamp").asString()).c_str());
+    std::printf("Description: %s\n", TerminalText::visible(*root.get("Description").asString()).c_str());
     std::printf("Data: %zu %s\n", data.size(), data.size() == 1 ? "entry" : "entries");
     for (size_t index = 0; index < data.size(); ++index) printEntry(index, data.at(index));
     std::fflush(stdout);

@@ -1,6 +1,9 @@
 // Tests for `vantorel-cli decode` and `vantorel-cli info` on a capture of the emulator's UTRAN stream and on real captures.
 #include "cli/DecodeCommand.h"
 
+#include "Platform/RecordBuilder.h"
+#include "PropertyList/Array.h"
+#include "PropertyList/Dictionary.h"
 #include "support/CommandOutput.h"
 #include "support/ScenarioCapture.h"
 
@@ -37,6 +40,23 @@ TEST(DecodeCommand, ACaptureDecodesToTheDisplayAsTreeOrJsonWithOnlyDataOnStandar
     CommandOutput json = decode({"--format", "json", path});
     const QJsonObject serving = QJsonDocument::fromJson(QByteArray::fromStdString(json.out)).object()["1;Serving Cell"].toObject();
     EXPECT_EQ(serving["Serving Cell Info"].toObject()["Local Area Code"].toString(), "23071") << json.out;
+}
+
+TEST(DecodeCommand, TextFromTheModemIsShownNotObeyedInTheTreeAndKeptExactInJson) {
+    QTemporaryDir dir;
+    const std::string path = dir.filePath("pdp.vcap").toStdString();
+    std::string error;
+    auto writer = CaptureWriter::create(path, kTSLogChannelTechnology_Morvek_UTRAN2, &error);
+    ASSERT_TRUE(writer) << error;
+    auto context = Dictionary::create();
+    context->set("APN", "\x1b]0;owned\x07net\x1b[2J");
+    writer->write(1, 0, RecordBuilder::extraPropertyList(2, Value(Array::of({Value(context)})), true));
+    ASSERT_TRUE(writer->flush());
+    CommandOutput tree = decode({QString::fromStdString(path)});
+    EXPECT_NE(tree.out.find("      APN: \\x1b]0;owned\\x07net\\x1b[2J\n"), std::string::npos) << tree.out;
+    EXPECT_EQ(tree.out.find('\x1b'), std::string::npos);
+    CommandOutput json = decode({"--format", "json", QString::fromStdString(path)});
+    EXPECT_NE(json.out.find("\"APN\": \"\\u001b]0;owned\\u0007net\\u001b[2J\""), std::string::npos) << json.out;
 }
 
 TEST(VantorelCli, CommandsAreDispatchedInfoAccountsForEveryFrameAndBadUseIsAClearError) {

@@ -39,7 +39,7 @@ protected:
     static Value snapshotOf(const Value& contents) {
         auto snapshot = entry("Timestamp", "2016-06-28 18:31:10 -0330").asDictionary();
         snapshot->set("Data", contents);
-        snapshot->set("Description", "cell edge, walking");
+        snapshot->set("Description", "cell edge\x1b]0;owned\x07, walking\x1b[2J");
         return Value(snapshot);
     }
     CommandOutput run(const QStringList& args) { return vantorel::testing::runCommand(&SnapshotCommand::run, args); }
@@ -65,7 +65,8 @@ TEST_F(SnapshotCommandTest, ListsEveryEntryAndWritesOutTheDlfOfARealDecoderInEit
         CommandOutput r = run({path("s.vantorel"), "--dlf", path("out.dlf")});
         ASSERT_EQ(r.code, 0) << r.err;
         EXPECT_EQ(r.out.substr(0, r.out.find("  1  ")),
-                  "Timestamp: 2016-06-28 18:31:10 -0330\nDescription: cell edge, walking\nData: 5 entries\n  0  " +
+                  "Timestamp: 2016-06-28 18:31:10 -0330\nDescription: cell edge\\x1b]0;owned\\x07, walking\\x1b[2J\n"
+                  "Data: 5 entries\n  0  " +
                       first + "\n      Date: " + date + "\n");
         const std::string size = std::to_string(dlf.size());
         EXPECT_NE(r.out.find("  2  DLF binary (" + size + " bytes)\n      DLF: " + size + " bytes\n"
