@@ -2,6 +2,7 @@
 #include "Platform/LocalMessagePort.h"
 
 #include "Platform/MessagePortFrame.h"
+#include "Platform/StringFormat.h"
 #include "Platform/SystemLog.h"
 
 #include <QLocalServer>
@@ -21,11 +22,6 @@ constexpr int kProbeTimeoutMs = 500;
 
 ByteView viewOf(const QByteArray& bytes) {
     return ByteView(reinterpret_cast<const uint8_t*>(bytes.constData()), static_cast<size_t>(bytes.size()));
-}
-
-void writeFrame(QLocalSocket* socket, const Bytes& frame) {
-    socket->write(reinterpret_cast<const char*>(frame.data()), static_cast<qint64>(frame.size()));
-    socket->flush();  // non-blocking: writes what the socket takes now, the event loop the rest
 }
 
 }  // namespace
@@ -88,12 +84,24 @@ bool LocalMessagePort::listen() {
 
 void LocalMessagePort::setInvalidationCallback(InvalidationCallback callback) { invalidation_ = std::move(callback); }
 
+std::string LocalMessagePort::socketPath() const { return server_ ? server_->fullServerName().toStdString() : ""; }
 
 void LocalMessagePort::acceptPeers() {
     while (server_ && server_->hasPendingConnections()) {
         QLocalSocket* socket = server_->nextPendingConnection();
         if (!socket) break;
         socket->setParent(this);
+        if (static_cast<int>(peers_.size()) >= maxPeers_) {
+            ++refused_;
+            SystemLog::log(SystemLog::kWarning, "Message port %s: %d peers connected already; a new connection refused",
+                           name_.c_str(), maxPeers_);
+            socket->abort();
+            delete socket;
+            continue;
+        }
+        // Qt reads no more than this ahead of readPeer(); the kernel holds the rest back.
+        socket->setReadBufferSize(kReadChunkBytes);
+        hadConnection_ = true;
         auto peer = std::make_unique<Peer>();
         peer->socket = socket;
         peers_.push_back(std::move(peer));
@@ -131,11 +139,40 @@ void LocalMessagePort::closePeer(QLocalSocket* socket) {
     delete socket;
 }
 
+void LocalMessagePort::closeOverLimit(QLocalSocket* socket, const std::string& why) {
+    ++overLimit_;
+    SystemLog::log(SystemLog::kError, "Message port %s: a peer %s; connection closed", name_.c_str(), why.c_str());
+    closePeer(socket);
+    invalidateIfDeserted();
+}
+
+bool LocalMessagePort::writeFrame(QLocalSocket* socket, const Bytes& frame) {
+    // A peer that left may already be closed underneath (a failed write aborts the
+    // socket): nothing to write to, but it is not closed here.
+    if (socket->state() != QLocalSocket::ConnectedState) return true;
+    if (socket->bytesToWrite() > kMaxUnsentBytes) {
+        closeOverLimit(socket, StringFormat::format("leaves %lld bytes unread", static_cast<long long>(socket->bytesToWrite())));
+        return false;
+    }
+    socket->write(reinterpret_cast<const char*>(frame.data()), static_cast<qint64>(frame.size()));
+    socket->flush();  // non-blocking: writes what the socket takes now, the event loop the rest
+    return true;
+}
+
 void LocalMessagePort::readPeer(QLocalSocket* socket) {
     Peer* peer = findPeer(socket);
-    if (!peer || !valid_) return;
-    const QByteArray chunk = socket->readAll();
-    if (chunk.isEmpty()) return;
+    // Only what is there: reading a socket that a failed write closed underneath makes Qt complain.
+    const qint64 available = peer && valid_ ? socket->bytesAvailable() : 0;
+    if (available <= 0) return;
+    const size_t admitted = peer->decoder.admit(static_cast<size_t>(std::min<qint64>(available, kReadChunkBytes)));
+    if (admitted == 0) {
+        closeOverLimit(socket, StringFormat::format("sends a frame over the buffer limit (%zu bytes held, %zu of the "
+                                                    "pool of %zu lent)", peer->decoder.buffered(),
+                                                    MessagePortFrameDecoder::pooledBytes(),
+                                                    MessagePortFrameDecoder::kPoolBytes));
+        return;
+    }
+    const QByteArray chunk = socket->read(static_cast<qint64>(admitted));
     const std::vector<MessagePortFrame> frames = peer->decoder.feed(viewOf(chunk));
     const bool malformed = peer->decoder.failed();
     const std::string reason = peer->decoder.error();
@@ -145,6 +182,11 @@ void LocalMessagePort::readPeer(QLocalSocket* socket) {
     // after each one and touch nothing that may be gone.
     QPointer<LocalMessagePort> self(this);
     QPointer<QLocalSocket> guard(socket);
+    // Qt signals readyRead only for new bytes: what is left is read on the next turn.
+    if (!malformed && socket->bytesAvailable() > 0) {
+        QMetaObject::invokeMethod(
+            this, [this, guard] { if (guard) readPeer(guard); }, Qt::QueuedConnection);
+    }
     for (const MessagePortFrame& frame : frames) {
         // Replies and notifications travel only towards remote ports; one sent to
         // a local port is ignored.
@@ -158,7 +200,7 @@ void LocalMessagePort::readPeer(QLocalSocket* socket) {
             reply.kind = MessagePortFrame::Kind::Reply;
             reply.messageId = frame.messageId;
             if (result) reply.data = std::move(*result);
-            writeFrame(guard, reply.encode());
+            if (!writeFrame(guard, reply.encode())) return;
         }
     }
 
@@ -175,8 +217,9 @@ void LocalMessagePort::peerGone(QLocalSocket* socket) {
     if (!findPeer(socket)) return;
     // Whatever the peer wrote before it closed is still delivered.
     QPointer<LocalMessagePort> self(this);
-    readPeer(socket);
-    if (!self) return;
+    QPointer<QLocalSocket> guard(socket);
+    while (self && guard && valid_ && findPeer(guard) && guard->bytesAvailable() > 0) readPeer(guard);
+    if (!self || !guard) return;
     closePeer(socket);
     invalidateIfDeserted();
 }
@@ -204,11 +247,14 @@ int LocalMessagePort::broadcastNotification(int32_t messageId, ByteView data) {
     frame.messageId = messageId;
     frame.data.assign(data.begin(), data.end());
     const Bytes bytes = frame.encode();
+    // A copy: a peer that does not read is closed on the way.
+    std::vector<QLocalSocket*> sockets;
+    for (const auto& peer : peers_) sockets.push_back(peer->socket);
+    QPointer<LocalMessagePort> self(this);  // closing a peer may invalidate the port, whose callback may delete it
     int queued = 0;
-    for (const auto& peer : peers_) {
-        if (peer->socket->state() != QLocalSocket::ConnectedState) continue;
-        writeFrame(peer->socket, bytes);
-        ++queued;
+    for (QLocalSocket* socket : sockets) {
+        if (!self || !valid_) break;
+        if (findPeer(socket) && socket->state() == QLocalSocket::ConnectedState && writeFrame(socket, bytes)) ++queued;
     }
     return queued;
 }

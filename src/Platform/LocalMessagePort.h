@@ -16,9 +16,19 @@ class QLocalSocket;
 
 namespace vantorel {
 
+// Limits, so that no peer can make the port's process hold much: at most kMaxPeers
+// connections (a connection beyond them is closed at once); what a peer's frames may
+// buffer is bounded by MessagePortFrameDecoder (kOwnBytes each, the rest from the
+// process-wide pool); and a peer that leaves more than kMaxUnsentBytes of replies and
+// notifications unread gets no more. A peer over a limit is closed and counted.
 class LocalMessagePort : public QObject {
     Q_OBJECT
 public:
+    static constexpr int kMaxPeers = 64;
+    static constexpr int64_t kMaxUnsentBytes = 1 << 20;
+    // Qt's read buffer of each connection, and the most read from it at a time.
+    static constexpr int64_t kReadChunkBytes = 64 << 10;
+
     // Called for every Message or Request frame that arrives, on the thread that
     // created the port. The returned data is sent back as the Reply when the frame
     // was a Request (an empty optional sends an empty reply); ignored otherwise.
@@ -43,6 +53,12 @@ public:
     // A service's well-known port serves clients that come and go: with true it
     // stays valid when its last peer leaves. Default false (the rule above).
     void setStaysValidWithoutPeers(bool stays) { staysValidWithoutPeers_ = stays; }
+    // A port that serves one client needs fewer connections than kMaxPeers.
+    void setMaxPeers(int peers) { maxPeers_ = peers; }
+    // True once a connection was taken, even one that sent nothing yet.
+    bool hadConnection() const { return hadConnection_; }
+    // The socket file the port listens on (its name resolved as in docs/protocol.md).
+    std::string socketPath() const;
 
     // Pushes a Notification frame to every connected peer (the service's
     // notifications to its clients). Returns how many peers it was queued for.
@@ -50,6 +66,10 @@ public:
 
     // Frames from peers that were not valid frames (each closes its connection).
     uint64_t malformedFrames() const { return malformed_; }
+    // Connections closed at once because kMaxPeers were connected.
+    uint64_t refusedPeers() const { return refused_; }
+    // Peers closed for going over a buffer limit.
+    uint64_t overLimitPeers() const { return overLimit_; }
 
 private:
     struct Peer;
@@ -61,6 +81,9 @@ private:
     void peerGone(QLocalSocket* peer);
     Peer* findPeer(QLocalSocket* socket) const;
     void closePeer(QLocalSocket* socket);
+    void closeOverLimit(QLocalSocket* socket, const std::string& why);
+    // Writes a frame to a connected peer; false when the peer does not read and was closed.
+    bool writeFrame(QLocalSocket* socket, const Bytes& frame);
     void invalidateIfDeserted();
 
     std::string name_;
@@ -70,8 +93,12 @@ private:
     std::vector<std::unique_ptr<Peer>> peers_;
     bool valid_ = true;
     bool hadPeer_ = false;
+    bool hadConnection_ = false;
     bool staysValidWithoutPeers_ = false;
+    int maxPeers_ = kMaxPeers;
     uint64_t malformed_ = 0;
+    uint64_t refused_ = 0;
+    uint64_t overLimit_ = 0;
 };
 
 }  // namespace vantorel

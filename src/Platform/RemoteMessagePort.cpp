@@ -2,6 +2,7 @@
 #include "Platform/RemoteMessagePort.h"
 
 #include "Platform/MessagePortFrame.h"
+#include "Platform/StringFormat.h"
 #include "Platform/SystemLog.h"
 
 #include <QDeadlineTimer>
@@ -52,6 +53,9 @@ std::unique_ptr<RemoteMessagePort> RemoteMessagePort::lookup(const std::string& 
     if (!p->socket_->waitForConnected(std::max(0, timeoutMs))) return nullptr;
     // Queued, so that callbacks run from the event loop and never inside the
     // socket's own signal emission or inside sendRequest().
+    // What a peer's frames may buffer is bounded as on a local port (MessagePortFrameDecoder);
+    // Qt reads no more than this ahead of pump().
+    p->socket_->setReadBufferSize(kReadChunkBytes);
     connect(p->socket_, &QLocalSocket::readyRead, p, [p] { p->readAvailable(); }, Qt::QueuedConnection);
     connect(p->socket_, &QLocalSocket::disconnected, p, [p] { p->peerClosed(); }, Qt::QueuedConnection);
     connect(p->socket_, &QLocalSocket::bytesWritten, p, [p] { p->checkDrained(); }, Qt::QueuedConnection);
@@ -62,6 +66,8 @@ bool RemoteMessagePort::isValid() const {
     return !invalidated_ && socket_ && socket_->state() == QLocalSocket::ConnectedState;
 }
 
+std::string RemoteMessagePort::socketPath() const { return socket_ ? socket_->fullServerName().toStdString() : ""; }
+
 void RemoteMessagePort::setInvalidationCallback(InvalidationCallback callback) { invalidation_ = std::move(callback); }
 
 void RemoteMessagePort::setNotificationCallback(NotificationCallback callback) { notification_ = std::move(callback); }
@@ -69,10 +75,25 @@ void RemoteMessagePort::setNotificationCallback(NotificationCallback callback) {
 int64_t RemoteMessagePort::bytesPending() const { return socket_ ? socket_->bytesToWrite() : 0; }
 
 bool RemoteMessagePort::pump(std::optional<Bytes>* reply, bool* gotReply) {
-    if (!socket_ || socket_->bytesAvailable() <= 0) return true;
-    const QByteArray chunk = socket_->readAll();
-    const auto frames = impl_->decoder.feed(
-        ByteView(reinterpret_cast<const uint8_t*>(chunk.constData()), static_cast<size_t>(chunk.size())));
+    // Only what is there: reading a socket that a failed write closed underneath makes Qt complain.
+    while (socket_ && !invalidated_ && socket_->bytesAvailable() > 0) {
+        const size_t admitted = impl_->decoder.admit(static_cast<size_t>(std::min<qint64>(socket_->bytesAvailable(), kReadChunkBytes)));
+        if (admitted == 0) {
+            closeBroken("a frame over the buffer limit",
+                        StringFormat::format("%zu bytes held, %zu of the pool of %zu lent", impl_->decoder.buffered(),
+                                             MessagePortFrameDecoder::pooledBytes(), MessagePortFrameDecoder::kPoolBytes));
+            return false;
+        }
+        const QByteArray chunk = socket_->read(static_cast<qint64>(admitted));
+        if (!take(impl_->decoder.feed(ByteView(reinterpret_cast<const uint8_t*>(chunk.constData()),
+                                               static_cast<size_t>(chunk.size()))),
+                  reply, gotReply))
+            return false;
+    }
+    return true;
+}
+
+bool RemoteMessagePort::take(const std::vector<MessagePortFrame>& frames, std::optional<Bytes>* reply, bool* gotReply) {
     for (const MessagePortFrame& frame : frames) {
         switch (frame.kind) {
         case MessagePortFrame::Kind::Reply:
@@ -84,6 +105,9 @@ bool RemoteMessagePort::pump(std::optional<Bytes>* reply, bool* gotReply) {
             }
             break;
         case MessagePortFrame::Kind::Notification:
+            // Notifications only tell the client to look again: of a flood (one that
+            // comes while a request waits), the newest kMaxPendingNotifications are kept.
+            if (impl_->pending.size() >= kMaxPendingNotifications) impl_->pending.pop_front();
             impl_->pending.emplace_back(frame.messageId, frame.data);
             scheduleDelivery();
             break;
@@ -93,15 +117,19 @@ bool RemoteMessagePort::pump(std::optional<Bytes>* reply, bool* gotReply) {
         }
     }
     if (impl_->decoder.failed()) {
-        SystemLog::log(SystemLog::kError, "Message port %s: malformed frame from the remote port (%s); connection closed",
-                       name_.c_str(), impl_->decoder.error().c_str());
-        disconnect(socket_, nullptr, this, nullptr);
-        socket_->abort();
-        // The invalidation callback runs from the event loop, as for a peer that closed.
-        QMetaObject::invokeMethod(this, [this] { peerClosed(); }, Qt::QueuedConnection);
+        closeBroken("malformed frame", impl_->decoder.error());
         return false;
     }
     return true;
+}
+
+void RemoteMessagePort::closeBroken(const char* what, const std::string& why) {
+    SystemLog::log(SystemLog::kError, "Message port %s: %s from the remote port (%s); connection closed", name_.c_str(),
+                   what, why.c_str());
+    disconnect(socket_, nullptr, this, nullptr);
+    socket_->abort();
+    // The invalidation callback runs from the event loop, as for a peer that closed.
+    QMetaObject::invokeMethod(this, [this] { peerClosed(); }, Qt::QueuedConnection);
 }
 
 int32_t RemoteMessagePort::sendRequest(int32_t messageId, ByteView data, double sendTimeout, double receiveTimeout,

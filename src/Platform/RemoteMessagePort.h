@@ -9,10 +9,13 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <vector>
 
 class QLocalSocket;
 
 namespace vantorel {
+
+struct MessagePortFrame;
 
 class RemoteMessagePort : public QObject {
     Q_OBJECT
@@ -26,6 +29,10 @@ public:
         TransportError = -4,
         BecameInvalidError = -5,
     };
+    // Qt's read buffer of the connection, and the most read from it at a time.
+    static constexpr int64_t kReadChunkBytes = 64 << 10;
+    // Notifications held for delivery at most; older ones are dropped.
+    static constexpr size_t kMaxPendingNotifications = 64;
     using NotificationCallback = std::function<void(int32_t messageId, const Bytes& data)>;
     using InvalidationCallback = std::function<void(RemoteMessagePort* port)>;
 
@@ -35,6 +42,8 @@ public:
     ~RemoteMessagePort() override;
 
     const std::string& name() const { return name_; }
+    // The socket file connected to (the name resolved as in docs/protocol.md).
+    std::string socketPath() const;
 
     // Sends a Message (reply == nullptr) or a Request (reply != nullptr) frame and
     // blocks the calling thread: up to sendTimeout seconds for the write, then up
@@ -66,6 +75,9 @@ private:
     // (else it is stale and dropped), notifications are queued. False when the
     // stream was malformed (the connection is then closed).
     bool pump(std::optional<Bytes>* reply, bool* gotReply);
+    bool take(const std::vector<MessagePortFrame>& frames, std::optional<Bytes>* reply, bool* gotReply);
+    // A malformed or oversized stream: logs why, closes, invalidates from the event loop.
+    void closeBroken(const char* what, const std::string& why);
     void scheduleDelivery();
     void peerClosed();
     void checkDrained();

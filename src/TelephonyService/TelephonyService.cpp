@@ -16,6 +16,8 @@
 #include <QCoreApplication>
 #include <QFileInfo>
 
+#include <sys/stat.h>
+
 #include <atomic>
 #include <cmath>
 #include <vector>
@@ -143,7 +145,7 @@ void TelephonyService::stop() {
     }
     if (port_) {
         port_->setInvalidationCallback(nullptr);
-        malformedFromClosedPorts_ += port_->malformedFrames();
+        closedPorts_.add(*port_);
         port_->invalidate();
         port_.reset();
     }
@@ -156,15 +158,24 @@ void TelephonyService::stop() {
 TelephonyService::Counters TelephonyService::counters() const {
     Counters c = counters_;
     c.openChannels = channels_.size();
-    c.malformedFrames = malformedFramesNow();
+    const PortCounts ports = portCountsNow();
+    c.malformedFrames = ports.malformed;
+    c.refusedPeers = ports.refused;
+    c.overLimitPeers = ports.overLimit;
     return c;
 }
 
-uint64_t TelephonyService::malformedFramesNow() const {
-    uint64_t n = malformedFromClosedPorts_;
-    if (port_) n += port_->malformedFrames();
-    for (const auto& entry : channels_) n += entry.second->port->malformedFrames();
-    return n;
+void TelephonyService::PortCounts::add(const LocalMessagePort& port) {
+    malformed += port.malformedFrames();
+    refused += port.refusedPeers();
+    overLimit += port.overLimitPeers();
+}
+
+TelephonyService::PortCounts TelephonyService::portCountsNow() const {
+    PortCounts counts = closedPorts_;
+    if (port_) counts.add(*port_);
+    for (const auto& entry : channels_) counts.add(*entry.second->port);
+    return counts;
 }
 
 std::string TelephonyService::startupLine() const {
@@ -205,11 +216,22 @@ Bytes TelephonyService::createLogChannel(const std::string& clientPortName) {
                        clientPortName.c_str());
         return channelReply(kBackendFailed, "");
     }
+    if (channels_.size() >= kMaxChannels) {
+        SystemLog::log(SystemLog::kError, "Telephony service: no log channel for %s: %zu channels are open already",
+                       clientPortName.c_str(), channels_.size());
+        return channelReply(kTooManyChannels, "");
+    }
     std::unique_ptr<RemoteMessagePort> client = RemoteMessagePort::lookup(clientPortName, kClientLookupTimeoutMs);
     if (!client) {
         SystemLog::log(SystemLog::kError, "Telephony service: no log channel for %s: that port does not answer",
                        clientPortName.c_str());
         return channelReply(kClientPortUnreachable, "");
+    }
+    // Such a channel would stream to the service itself and keep itself alive.
+    if (servesPort(*client)) {
+        SystemLog::log(SystemLog::kError, "Telephony service: no log channel for %s: that is a port of the service itself",
+                       clientPortName.c_str());
+        return channelReply(kServicePortNamed, "");
     }
     // Process-wide, so two services (on two threads) never make the same name.
     static std::atomic<uint64_t> nextNumber{0};
@@ -224,21 +246,18 @@ Bytes TelephonyService::createLogChannel(const std::string& clientPortName) {
                        clientPortName.c_str(), name.c_str());
         return channelReply(kBackendFailed, "");
     }
+    port->setMaxPeers(kChannelPortPeers);
     port->setInvalidationCallback([this, number](LocalMessagePort*) { scheduleClose(number, "the client closed it"); });
     client->setInvalidationCallback(
         [this, number](RemoteMessagePort*) { scheduleClose(number, "the client's receive port went away"); });
-    connect(client.get(), &RemoteMessagePort::drained, this, [this, number] {
-        auto it = channels_.find(number);
-        if (it == channels_.end() || !it->second->congested) return;
-        it->second->congested = false;
-        updateFlow();
-    });
+    connect(client.get(), &RemoteMessagePort::drained, this, [this, number] { drainQueue(number); });
 
     auto channel = std::make_unique<Channel>();
     channel->number = number;
     channel->clientPortName = clientPortName;
     channel->port = std::move(port);
     channel->client = std::move(client);
+    channel->age.start();
     channels_[number] = std::move(channel);
     ++counters_.channelsServed;
     statusLine(StringFormat::format("client connected: channel %llu on %s for %s; %zu open",
@@ -319,12 +338,13 @@ void TelephonyService::closeChannel(uint64_t number, const std::string& why) {
     channel->port->setInvalidationCallback(nullptr);
     channel->client->setInvalidationCallback(nullptr);
     disconnect(channel->client.get(), nullptr, this, nullptr);
-    malformedFromClosedPorts_ += channel->port->malformedFrames();
+    closedPorts_.add(*channel->port);
     channel->port->invalidate();
     channel->client->invalidate();
-    statusLine(StringFormat::format("client left: channel %llu closed (%s) after %llu messages; %zu open",
+    statusLine(StringFormat::format("client left: channel %llu closed (%s) after %llu messages, %llu dropped; %zu open",
                                     static_cast<unsigned long long>(number), why.c_str(),
-                                    static_cast<unsigned long long>(channel->sent), channels_.size()));
+                                    static_cast<unsigned long long>(channel->sent),
+                                    static_cast<unsigned long long>(channel->dropped), channels_.size()));
     if (stopping_) return;
     // Nobody listens any more: the modem's logging is switched off (docs/protocol.md).
     if (channels_.empty() && backend_ && backend_->state() == ModemBackend::State::Streaming) {
@@ -337,23 +357,19 @@ void TelephonyService::closeChannel(uint64_t number, const std::string& why) {
 // ---- streaming ----
 
 void TelephonyService::sendMessage(int32_t messageId, const Bytes& data) {
-    bool sent = false;
+    bool forwarded = false;
     bool congestion = false;
     for (auto& [number, channel] : channels_) {
         if (!channel->streaming || channel->closing || !channel->mask.forwards(data)) continue;
-        if (!channel->client->post(messageId, data)) {
-            scheduleClose(number, "the client's receive port went away");
-            continue;
-        }
-        sent = true;
-        ++channel->sent;
-        ++counters_.messagesSent;
-        if (!channel->congested && channel->client->bytesPending() >= kHighWaterBytes) {
-            channel->congested = true;
-            congestion = true;
+        forwarded = true;
+        // Behind what waits already, so that the client gets its messages in order.
+        if (channel->congested || !channel->queue.empty()) {
+            enqueue(*channel, messageId, data);
+        } else if (deliver(number, *channel, messageId, data)) {
+            congestion = congestion || channel->congested;
         }
     }
-    if (sent && recorder_) {
+    if (forwarded && recorder_) {
         if (recorder_->write(CaptureWriter::nowMicros(), messageId, data)) {
             ++counters_.messagesRecorded;
         } else {
@@ -364,17 +380,55 @@ void TelephonyService::sendMessage(int32_t messageId, const Bytes& data) {
     if (congestion) updateFlow();
 }
 
+bool TelephonyService::deliver(uint64_t number, Channel& channel, int32_t messageId, const Bytes& data) {
+    if (!channel.client->post(messageId, data)) {
+        scheduleClose(number, "the client's receive port went away");
+        return false;
+    }
+    ++channel.sent;
+    ++counters_.messagesSent;
+    channel.congested = channel.client->bytesPending() >= kHighWaterBytes;
+    return true;
+}
+
+void TelephonyService::enqueue(Channel& channel, int32_t messageId, const Bytes& data) {
+    channel.queue.emplace_back(messageId, data);
+    channel.queuedBytes += data.size();
+    // The newest message always stays, however long.
+    while (channel.queuedBytes > kMaxQueuedBytes && channel.queue.size() > 1) {
+        channel.queuedBytes -= channel.queue.front().second.size();
+        channel.queue.pop_front();
+        ++counters_.messagesDropped;
+        if (channel.dropped++ == 0)
+            statusLine(StringFormat::format("channel %llu: its client takes too little, its oldest messages are dropped",
+                                            static_cast<unsigned long long>(channel.number)));
+    }
+}
+
+void TelephonyService::drainQueue(uint64_t number) {
+    auto it = channels_.find(number);
+    if (it == channels_.end() || it->second->closing) return;
+    Channel& channel = *it->second;
+    channel.congested = false;
+    while (!channel.queue.empty() && !channel.congested) {
+        auto [messageId, data] = std::move(channel.queue.front());
+        channel.queue.pop_front();
+        channel.queuedBytes -= data.size();
+        if (!deliver(number, channel, messageId, data)) return;
+    }
+    updateFlow();
+}
+
 void TelephonyService::updateFlow() {
     if (!backend_) return;
-    bool streaming = false;
-    bool congested = false;
+    // Paused only when no streaming channel can take more: a channel over the
+    // high-water mark queues and, full, drops, but holds up no other.
+    bool canTake = false;
     for (const auto& entry : channels_) {
         const Channel& channel = *entry.second;
-        if (!channel.streaming || channel.closing) continue;
-        streaming = true;
-        congested = congested || channel.congested;
+        if (channel.streaming && !channel.closing && !channel.congested) canTake = true;
     }
-    backend_->setPaused(!streaming || congested);
+    backend_->setPaused(!canTake);
 }
 
 void TelephonyService::backendStateChanged(ModemBackend::State state) {
@@ -390,11 +444,13 @@ void TelephonyService::backendStateChanged(ModemBackend::State state) {
         const auto* replay = qobject_cast<const ReplayBackend*>(backend_.get());
         const RecordedLog* report = replay ? &replay->stream().report() : nullptr;
         statusLine(StringFormat::format(
-            "replay finished: %llu messages replayed, %llu sent to clients; bad frames: %zu in the file, %llu from clients",
+            "replay finished: %llu messages replayed, %llu sent to clients, %llu dropped (clients too slow); bad frames: "
+            "%zu in the file, %llu from clients",
             static_cast<unsigned long long>(backend_->messagesEmitted()),
             static_cast<unsigned long long>(counters_.messagesSent),
+            static_cast<unsigned long long>(counters_.messagesDropped),
             report ? report->badCrc + report->malformed + report->truncated : 0,
-            static_cast<unsigned long long>(malformedFramesNow())));
+            static_cast<unsigned long long>(portCountsNow().malformed)));
     } else if (state == ModemBackend::State::Failed) {
         statusLine("backend failed");
     }
@@ -402,17 +458,41 @@ void TelephonyService::backendStateChanged(ModemBackend::State state) {
 }
 
 void TelephonyService::checkHealth() {
-    const uint64_t malformed = malformedFramesNow();
-    if (malformed > malformedReported_) {
-        statusLine(StringFormat::format("%llu malformed frames from clients so far (connections closed, still serving)",
-                                        static_cast<unsigned long long>(malformed)));
-        malformedReported_ = malformed;
+    const PortCounts ports = portCountsNow();
+    if (ports.malformed > reported_.malformed || ports.refused > reported_.refused ||
+        ports.overLimit > reported_.overLimit) {
+        statusLine(StringFormat::format("from clients so far: %llu malformed frames, %llu connections refused (too many), "
+                                        "%llu closed over a buffer limit; still serving",
+                                        static_cast<unsigned long long>(ports.malformed),
+                                        static_cast<unsigned long long>(ports.refused),
+                                        static_cast<unsigned long long>(ports.overLimit)));
+        reported_ = ports;
     }
-    // A client that died without its invalidation reaching us.
-    for (const auto& entry : channels_)
-        if (!entry.second->closing && !entry.second->client->isValid())
+    for (const auto& entry : channels_) {
+        if (entry.second->closing) continue;
+        // A client that died without its invalidation reaching us.
+        if (!entry.second->client->isValid())
             scheduleClose(entry.first, "the client's receive port went away");
+        // A client that asked for a channel and never came to it.
+        else if (!entry.second->port->hadConnection() && entry.second->age.hasExpired(kUnclaimedChannelMs))
+            scheduleClose(entry.first, "nobody connected to its port");
+    }
     if (recorder_) recorder_->flush();
+}
+
+bool TelephonyService::servesPort(const RemoteMessagePort& port) const {
+    // By file identity, so that another path to the same socket (a symbolic or hard
+    // link, "/tmp/./name") is recognised as well.
+    struct stat target {};
+    if (::stat(port.socketPath().c_str(), &target) != 0) return false;
+    auto same = [&](const LocalMessagePort& own) {
+        struct stat st {};
+        return ::stat(own.socketPath().c_str(), &st) == 0 && st.st_dev == target.st_dev && st.st_ino == target.st_ino;
+    };
+    if (port_ && same(*port_)) return true;
+    for (const auto& entry : channels_)
+        if (same(*entry.second->port)) return true;
+    return false;
 }
 
 }  // namespace vantorel

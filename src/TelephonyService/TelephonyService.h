@@ -5,11 +5,13 @@
 #include "TelephonyService/LogMask.h"
 #include "TelephonyService/ModemBackend.h"
 
+#include <QElapsedTimer>
 #include <QObject>
 #include <QTimer>
 
 #include <chrono>
 #include <cstdint>
+#include <deque>
 #include <functional>
 #include <map>
 #include <memory>
@@ -42,7 +44,8 @@ struct TelephonyServiceOptions {
 //     {"Request": "CreateLogChannel", "PortName": <client's receive port>} with
 //     {"ErrorDomain", "ErrorCode", "PortName"}: 0/0 and the channel's port name, or
 //     domain 1 with code 1 (malformed request), 2 (client port unreachable),
-//     3 (backend failed) and an empty name;
+//     3 (backend failed), 4 (the port named is one the service serves itself),
+//     5 (kMaxChannels open already) and an empty name;
 //   - each channel has a port "<well-known name>.channel.<pid>.<n>" that answers
 //     {"GetTechnology": ...} with {"GetTechnology": <identifier>} and takes the start
 //     command {"SetState": "Streaming", "SetMorvekLogCodes": [...], "SetTsExtraCodes": [...]}
@@ -54,10 +57,14 @@ struct TelephonyServiceOptions {
 // The backend starts on the first start command (and again after a finished replay when
 // a start command comes while no channel streams) and stops when the last channel is
 // freed (a replay then starts over for the next client; the emulator's ticks go on
-// counting). A replay waits (is paused) while no channel streams or while a client has
-// more than kHighWaterBytes not yet taken. A client that goes away (its receive port, or
-// its connection to the channel port) frees its channel. Everything runs on the thread
-// that calls start(); the receive callbacks come from that thread's event loop.
+// counting). A channel whose client has more than kHighWaterBytes not yet taken keeps
+// what comes next in a queue of at most kMaxQueuedBytes, dropping its oldest messages
+// beyond that; a replay waits (is paused) only while no streaming channel can take more,
+// so a lone slow client loses nothing and a client that never reads stalls no other.
+// A client that goes away (its receive port, or its connection to the channel port)
+// frees its channel, and so does one that never connects to the channel port within
+// kUnclaimedChannelMs. Everything runs on the thread that calls start(); the receive
+// callbacks come from that thread's event loop.
 class TelephonyService : public QObject {
     Q_OBJECT
 public:
@@ -65,8 +72,20 @@ public:
     static constexpr int32_t kChannelMessageId = 0;
     static constexpr int32_t kNotificationMessageId = 0;
     static constexpr int32_t kErrorDomain = 1;
-    enum ErrorCode : int32_t { kNoError = 0, kMalformedRequest = 1, kClientPortUnreachable = 2, kBackendFailed = 3 };
+    enum ErrorCode : int32_t {
+        kNoError = 0,
+        kMalformedRequest = 1,
+        kClientPortUnreachable = 2,
+        kBackendFailed = 3,
+        kServicePortNamed = 4,
+        kTooManyChannels = 5,
+    };
     static constexpr int64_t kHighWaterBytes = 1 << 20;
+    static constexpr size_t kMaxQueuedBytes = 1 << 20;
+    static constexpr size_t kMaxChannels = 64;
+    // Connections a channel port takes: its client's, and a few probes.
+    static constexpr int kChannelPortPeers = 4;
+    static constexpr int kUnclaimedChannelMs = 3000;
     static constexpr int kClientLookupTimeoutMs = 500;
 
     struct Counters {
@@ -74,8 +93,11 @@ public:
         uint64_t messagesRecorded = 0;   // messages written by --record
         uint64_t channelsServed = 0;     // channels created since start
         uint64_t openChannels = 0;       // channels open now
+        uint64_t messagesDropped = 0;    // messages a channel dropped, its client taking too little
         uint64_t malformedFrames = 0;    // invalid frames the ports received from clients
         uint64_t malformedRequests = 0;  // valid frames whose content was not a request we know
+        uint64_t refusedPeers = 0;       // connections closed at once, a port having its peers already
+        uint64_t overLimitPeers = 0;     // connections closed for going over a buffer limit
     };
     using StatusCallback = std::function<void(const std::string& line)>;
 
@@ -108,10 +130,19 @@ private:
         std::unique_ptr<LocalMessagePort> port;
         std::unique_ptr<RemoteMessagePort> client;
         bool streaming = false;
-        bool congested = false;
+        bool congested = false;  // the client has kHighWaterBytes or more not yet taken
         bool closing = false;
         LogMask mask;
         uint64_t sent = 0;
+        uint64_t dropped = 0;
+        std::deque<std::pair<int32_t, Bytes>> queue;  // not yet handed to the socket, oldest first
+        size_t queuedBytes = 0;
+        QElapsedTimer age;
+    };
+    // What the ports counted (malformed frames, refused and over-limit peers).
+    struct PortCounts {
+        uint64_t malformed = 0, refused = 0, overLimit = 0;
+        void add(const LocalMessagePort& port);
     };
 
     std::optional<Bytes> receiveOnServicePort(int32_t messageId, const Bytes& data);
@@ -122,11 +153,17 @@ private:
     void scheduleClose(uint64_t number, const char* why);
     void closeChannel(uint64_t number, const std::string& why);
     void sendMessage(int32_t messageId, const Bytes& data);
+    // Posts to the client; false when the client is gone (the channel is then closing).
+    bool deliver(uint64_t number, Channel& channel, int32_t messageId, const Bytes& data);
+    void enqueue(Channel& channel, int32_t messageId, const Bytes& data);
+    void drainQueue(uint64_t number);
+    // True when the port named is one this service listens on (the same socket file).
+    bool servesPort(const RemoteMessagePort& port) const;
     void backendStateChanged(ModemBackend::State state);
     void updateFlow();
     void checkHealth();
     void statusLine(const std::string& line);
-    uint64_t malformedFramesNow() const;
+    PortCounts portCountsNow() const;
 
     TelephonyServiceOptions options_;
     std::string portName_;
@@ -137,8 +174,8 @@ private:
     QTimer healthTimer_;
     StatusCallback status_;
     Counters counters_;
-    uint64_t malformedFromClosedPorts_ = 0;
-    uint64_t malformedReported_ = 0;
+    PortCounts closedPorts_;  // of the ports closed already
+    PortCounts reported_;
     bool stopping_ = false;
 };
 

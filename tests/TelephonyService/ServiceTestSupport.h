@@ -102,15 +102,19 @@ public:
     TelephonyServiceConnection::LogChannelResult channel;
 
     // keepConnection: keep the server connection (for notifications) instead of releasing it as the model does.
-    bool connect(const std::string& serviceName, bool keepConnection = false) {
-        const std::string recvName = uniquePortName("client");
-        recv_ = LocalMessagePort::create(recvName, [this](int32_t id, const Bytes& data) -> std::optional<Bytes> {
-            if (id == 0) received.push_back(data);
-            return std::nullopt;
-        });
+    // recvName: a receive port the caller made (one that never reads); by default the client makes its own.
+    bool connect(const std::string& serviceName, bool keepConnection = false, std::string recvName = {}) {
+        if (recvName.empty()) {
+            recvName = uniquePortName("client");
+            recv_ = LocalMessagePort::create(recvName, [this](int32_t id, const Bytes& data) -> std::optional<Bytes> {
+                if (id == 0) received.push_back(data);
+                return std::nullopt;
+            });
+            if (!recv_) return false;
+        }
         connection_ = TelephonyServiceConnection::open(
             [this](const std::string& name, const Value& info) { notifications.emplace_back(name, info); }, serviceName);
-        if (!recv_ || !connection_) return false;
+        if (!connection_) return false;
         channel = connection_->createLogChannel(recvName);
         if (!keepConnection) connection_.reset();
         send_ = RemoteMessagePort::lookup(channel.portName);
@@ -133,7 +137,7 @@ public:
 
     // Closes both ports, as the model does when it lets go of the channel.
     void close() {
-        recv_->invalidate();
+        if (recv_) recv_->invalidate();
         send_->invalidate();
     }
 

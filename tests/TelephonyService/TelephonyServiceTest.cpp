@@ -1,6 +1,7 @@
-// Tests the telephony service end to end over local sockets, the service on its own thread and a model-like client on the test thread: channels, GetTechnology, log masks, clients leaving, bad requests, flow control, notifications, recording and start-up failures.
+// Tests the telephony service end to end over local sockets, the service on its own thread and a model-like client on the test thread: channels, GetTechnology, log masks, clients leaving, bad requests, limits on peers and buffers, flow control and dropping for a client that does not read, notifications, recording and start-up failures.
 #include "TelephonyService/TelephonyService.h"
 
+#include "Platform/MessagePortFrame.h"
 #include "Platform/RecordBuilder.h"
 #include "Platform/TelephonyIdentifiers.h"
 #include "TelephonyService/EmulatorBackend.h"
@@ -10,9 +11,15 @@
 #include "TelephonyService/TelephonyServiceThread.h"
 
 #include <QCoreApplication>
+#include <QDir>
+#include <QLocalSocket>
 #include <QTemporaryDir>
 #include <QThread>
 #include <gtest/gtest.h>
+
+#include <sys/socket.h>
+#include <sys/un.h>
+#include <unistd.h>
 
 #include <atomic>
 #include <memory>
@@ -51,8 +58,9 @@ TelephonyServiceOptions emulatorOptions() {
     return options([] { return std::make_unique<EmulatorBackend>(std::make_unique<servicetest::FastUTRANScenario>()); });
 }
 
-bool waitForCounters(const TelephonyServiceThread& service, const std::function<bool(const Counters&)>& done) {
-    return waitUntil([&] { return done(service.counters()); });
+bool waitForCounters(const TelephonyServiceThread& service, const std::function<bool(const Counters&)>& done,
+                     int timeoutMs = 2000) {
+    return waitUntil([&] { return done(service.counters()); }, timeoutMs);
 }
 
 ModemBackend::State backendState(const TelephonyServiceThread& service) {
@@ -118,6 +126,9 @@ TEST(TelephonyService, ClientsThatGoAwayFreeTheirChannelsAndTheLastOneStopsTheBa
 TEST(TelephonyService, BadChannelRequestsAreAnsweredWithAnErrorAndServingGoesOn) {
     TelephonyServiceThread service(emulatorOptions());
     ASSERT_TRUE(service.start());
+    TestClient client;
+    ASSERT_TRUE(client.connect(service.portName()));
+    const auto unclaimed = LocalMessagePort::create(uniquePortName("unclaimed"), {});  // never comes to its channel
     auto port = RemoteMessagePort::lookup(service.portName());
     ASSERT_TRUE(port);
     auto request = [](std::optional<std::string> portName) {
@@ -130,6 +141,10 @@ TEST(TelephonyService, BadChannelRequestsAreAnsweredWithAnErrorAndServingGoesOn)
         {Bytes{'n', 'o', 't', ' ', 'a', ' ', 'p', 'l', 'i', 's', 't'}, TelephonyService::kMalformedRequest},
         {request(std::nullopt), TelephonyService::kMalformedRequest},
         {request(uniquePortName("nobody")), TelephonyService::kClientPortUnreachable},
+        {request(service.portName()), TelephonyService::kServicePortNamed},
+        {request(QDir::tempPath().toStdString() + "/./" + service.portName()), TelephonyService::kServicePortNamed},
+        {request(client.channel.portName), TelephonyService::kServicePortNamed},
+        {request(unclaimed->name()), TelephonyService::kNoError},
     };
     for (const auto& [data, code] : rows) {
         std::optional<Bytes> reply;
@@ -137,14 +152,50 @@ TEST(TelephonyService, BadChannelRequestsAreAnsweredWithAnErrorAndServingGoesOn)
         const PropertyListResult parsed = PropertyListSerialization::readDictionary(reply.value_or(Bytes{}));
         ASSERT_TRUE(parsed);
         const DictionaryRef answer = parsed.value->asDictionary();
-        EXPECT_EQ(answer->get("ErrorDomain").asInteger(), 1);
+        EXPECT_EQ(answer->get("ErrorDomain").asInteger(), code == 0 ? 0 : 1);
         EXPECT_EQ(answer->get("ErrorCode").asInteger(), code);
-        EXPECT_EQ(*answer->get("PortName").asString(), "");
+        EXPECT_EQ(answer->get("PortName").asString()->empty(), code != 0);
     }
-    TestClient client;
-    ASSERT_TRUE(client.connect(service.portName()));
     EXPECT_EQ(service.counters().malformedRequests, 2u);
-    EXPECT_EQ(service.counters().openChannels, 1u);
+    EXPECT_EQ(service.counters().openChannels, 2u);
+    EXPECT_TRUE(waitForCounters(service, [](const Counters& c) { return c.openChannels == 1; }, 4500));
+}
+
+TEST(TelephonyService, PeersOverALimitAreClosedAndOthersAreStillServed) {
+    TelephonyServiceThread service(emulatorOptions());
+    ASSERT_TRUE(service.start());
+    static std::atomic<int> notOpen{0};  // Qt's complaint about a read or write on a closed socket
+    const QtMessageHandler previous = qInstallMessageHandler([](QtMsgType, const QMessageLogContext&, const QString& text) {
+        if (text.contains("device not open")) ++notOpen;
+    });
+    auto peer = [&](const Bytes& bytes) {  // a connection that writes as much of the bytes as the service takes
+        auto socket = std::make_unique<QLocalSocket>();
+        socket->connectToServer(QString::fromStdString(service.portName()));
+        EXPECT_TRUE(socket->waitForConnected(1000));
+        socket->write(reinterpret_cast<const char*>(bytes.data()), static_cast<qint64>(bytes.size()));
+        while (socket->bytesToWrite() > 0 && socket->waitForBytesWritten(1000)) {}
+        return socket;
+    };
+    Bytes request = MessagePortFrame{MessagePortFrame::Kind::Request, 1, servicetest::xmlOf(Dictionary::create())}.encode();
+    for (int i = 0; i < 5; ++i) request.insert(request.end(), request.begin(), request.end());
+    for (int i = 0; i < 5; ++i) peer(request)->abort();  // gone before its replies are written
+
+    // All but the last byte of a frame of the longest length, from more peers than the pool can hold.
+    Bytes big = MessagePortFrame{MessagePortFrame::Kind::Message, 0, Bytes(MessagePortFrame::kMaxDataLength, 'x')}.encode();
+    big.pop_back();
+    std::vector<std::unique_ptr<QLocalSocket>> peers;
+    for (int i = 0; i < 6; ++i) peers.push_back(peer(big));
+    EXPECT_TRUE(waitForCounters(service, [](const Counters& c) { return c.overLimitPeers == 2; }));
+    EXPECT_LE(MessagePortFrameDecoder::pooledBytes(), MessagePortFrameDecoder::kPoolBytes);
+    TestClient client;
+    EXPECT_TRUE(client.connect(service.portName()));
+
+    for (int i = 0; i < LocalMessagePort::kMaxPeers; ++i) peers.push_back(peer({}));  // 4 held already
+    EXPECT_TRUE(peers.back()->state() == QLocalSocket::UnconnectedState || peers.back()->waitForDisconnected(1000));
+    EXPECT_TRUE(waitForCounters(service, [](const Counters& c) { return c.refusedPeers >= 4; }));
+    service.stop();
+    qInstallMessageHandler(previous);
+    EXPECT_EQ(notOpen.load(), 0);
 }
 
 TEST(TelephonyService, AFinishedReplayIsNotifiedAndStartsOverForTheNextClient) {
@@ -192,6 +243,34 @@ TEST(TelephonyService, ASlowClientPausesTheReplayAndStillGetsEverythingInOrder) 
     EXPECT_LT(emitted, records.size());
     ASSERT_TRUE(waitUntil([&] { return client.received.size() == records.size(); }, 5000));
     EXPECT_EQ(client.received, records);
+}
+
+TEST(TelephonyService, AClientThatNeverReadsLosesItsOldestMessagesAndHoldsUpNoOther) {
+    std::vector<Bytes> records;  // numbered, replayed in a loop at full speed
+    for (uint16_t i = 0; i < 512; ++i) records.push_back(RecordBuilder::ordinary(0xD00A, 1024).u16(13, i).build());
+    TelephonyServiceThread service(replayOptions(records, /*loop=*/true));
+    ASSERT_TRUE(service.start());
+    // The never-reading client's receive port: a listening socket whose connections nobody accepts.
+    const std::string silentName = uniquePortName("silent");
+    const std::string path = QDir::tempPath().toStdString() + "/" + silentName;
+    const int fd = ::socket(AF_UNIX, SOCK_STREAM, 0);
+    sockaddr_un address{};
+    address.sun_family = AF_UNIX;
+    path.copy(address.sun_path, sizeof address.sun_path - 1);
+    ASSERT_EQ(::bind(fd, reinterpret_cast<sockaddr*>(&address), sizeof address), 0);
+    ASSERT_EQ(::listen(fd, 4), 0);
+    TestClient silent, reader;
+    ASSERT_TRUE(silent.connect(service.portName(), false, silentName));
+    ASSERT_TRUE(silent.send(startCommand({}, {}, false)));
+    ASSERT_TRUE(reader.connect(service.portName()));
+    ASSERT_TRUE(reader.send(startCommand({}, {}, false)));
+    // 4 MiB: far more than the socket buffers, the high-water mark and the queue hold together.
+    ASSERT_TRUE(waitUntil([&] { return reader.received.size() > 8 * records.size(); }));
+    EXPECT_GT(service.counters().messagesDropped, 0u);
+    for (size_t i = 1; i < reader.received.size(); ++i)  // the reader lost nothing
+        ASSERT_EQ(reader.received[i], records[(i + (reader.received[0][13] | reader.received[0][14] << 8)) % records.size()]);
+    ::close(fd);
+    ::unlink(path.c_str());
 }
 
 TEST(TelephonyService, RecordingWritesEveryMessageSentAsACapture) {

@@ -89,9 +89,11 @@ int main(int argc, char** argv) {
     service.stop();
     const TelephonyService::Counters c = service.counters();
     std::fprintf(stderr,
-                 "vantorel-telephonyd: stopped: %llu messages sent, %llu recorded, %llu channels served, %llu malformed "
-                 "frames\n",
-                 static_cast<unsigned long long>(c.messagesSent), static_cast<unsigned long long>(c.messagesRecorded),
-                 static_cast<unsigned long long>(c.channelsServed), static_cast<unsigned long long>(c.malformedFrames));
+                 "vantorel-telephonyd: stopped: %llu messages sent, %llu dropped (clients too slow), %llu recorded, %llu "
+                 "channels served, %llu malformed frames, %llu connections refused, %llu closed over a buffer limit\n",
+                 static_cast<unsigned long long>(c.messagesSent), static_cast<unsigned long long>(c.messagesDropped),
+                 static_cast<unsigned long long>(c.messagesRecorded), static_cast<unsigned long long>(c.channelsServed),
+                 static_cast<unsigned long long>(c.malformedFrames), static_cast<unsigned long long>(c.refusedPeers),
+                 static_cast<unsigned long long>(c.overLimitPeers));
     return status;
 }
