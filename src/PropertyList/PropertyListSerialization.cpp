@@ -3,6 +3,7 @@
 
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
+#include "PropertyList/PropertyListGuard.h"
 
 #include <plist/plist.h>
 
@@ -18,18 +19,14 @@ namespace {
 // libplist dates count seconds from 2001-01-01 00:00:00 UTC.
 constexpr double kSecondsFrom1970To2001 = 978307200.0;
 
-// Containers deeper than this are refused: a hostile binary plist could otherwise
-// nest (or loop) until the stack runs out.
-constexpr int kMaxDepth = 256;
-
 struct PlistDeleter {
     void operator()(void* p) const { plist_free(static_cast<plist_t>(p)); }
 };
 using PlistPtr = std::unique_ptr<void, PlistDeleter>;
 
-bool toValue(plist_t node, int depth, Value& out, std::string& error) {
-    if (depth > kMaxDepth) {
-        error = "property list nests deeper than 256 levels";
+bool toValue(plist_t node, size_t depth, Value& out, std::string& error) {
+    if (depth > PropertyListGuard::kMaxDepth) {
+        error = PropertyListGuard::tooDeep();
         return false;
     }
     switch (plist_get_node_type(node)) {
@@ -59,10 +56,15 @@ bool toValue(plist_t node, int depth, Value& out, std::string& error) {
         return true;
     }
     case PLIST_STRING: {
-        char* s = nullptr;
-        plist_get_string_val(node, &s);
-        out = Value(std::string(s ? s : ""));
-        free(s);
+        // Not plist_get_string_val: it asserts that the string holds no U+0000.
+        uint64_t length = 0;
+        const char* s = plist_get_string_ptr(node, &length);
+        std::string text = s ? std::string(s, length) : std::string();
+        if (text.find('\0') != std::string::npos) {
+            error = "string holds a NUL character";
+            return false;
+        }
+        out = Value(std::move(text));
         return true;
     }
     case PLIST_DATA: {
@@ -81,13 +83,19 @@ bool toValue(plist_t node, int depth, Value& out, std::string& error) {
         return true;
     }
     case PLIST_ARRAY: {
+        // An iterator, not plist_array_get_item: on a parsed tree that walks the list
+        // from the start every time, quadratic in the array's length.
         auto array = Array::create();
-        uint32_t n = plist_array_get_size(node);
-        for (uint32_t i = 0; i < n; ++i) {
+        plist_array_iter it = nullptr;
+        plist_array_new_iter(node, &it);
+        plist_t child = nullptr;
+        for (plist_array_next_item(node, it, &child); child; plist_array_next_item(node, it, &child)) {
             Value item;
-            if (!toValue(plist_array_get_item(node, i), depth + 1, item, error)) return false;
+            if (!toValue(child, depth + 1, item, error)) break;
             array->append(std::move(item));
         }
+        free(it);
+        if (child) return false;
         out = Value(array);
         return true;
     }
@@ -178,6 +186,10 @@ PropertyListResult PropertyListSerialization::read(ByteView bytes) {
         result.error = "property list larger than 4 GiB";
         return result;
     }
+    // libplist aborts, overflows its stack or expands without bound on some input:
+    // nothing reaches it unchecked.
+    result.error = PropertyListGuard::check(bytes);
+    if (!result.error.empty()) return result;
     plist_t root = nullptr;
     const char* data = reinterpret_cast<const char*>(bytes.data());
     auto length = static_cast<uint32_t>(bytes.size());

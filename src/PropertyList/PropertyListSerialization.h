@@ -20,7 +20,8 @@ public:
     enum class Format { XML, Binary };
 
     // Reads a property list in either format (detected from the bytes). Empty,
-    // truncated or malformed input gives an error result, never a crash.
+    // truncated, malformed or hostile input (see PropertyListGuard, which checks the
+    // bytes before libplist parses them) gives an error result, never a crash.
     static PropertyListResult read(ByteView bytes);
     // The same, for callers that need a dictionary at the top (commands, replies,
     // snapshots): another root type is an error result.
