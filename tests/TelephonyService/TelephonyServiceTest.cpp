@@ -8,6 +8,7 @@
 #include "TelephonyService/ReplayBackend.h"
 #include "TelephonyService/Replay/CaptureReader.h"
 #include "TelephonyService/ServiceTestSupport.h"
+#include "support/HostilePlist.h"
 #include "TelephonyService/TelephonyServiceThread.h"
 
 #include <QCoreApplication>
@@ -29,6 +30,7 @@
 namespace vantorel {
 namespace {
 
+using testing::withNulCharacter;
 using servicetest::startCommand;
 using servicetest::streamOf;
 using servicetest::TestClient;
@@ -144,6 +146,7 @@ TEST(TelephonyService, BadChannelRequestsAreAnsweredWithAnErrorAndServingGoesOn)
         {request(service.portName()), TelephonyService::kServicePortNamed},
         {request(QDir::tempPath().toStdString() + "/./" + service.portName()), TelephonyService::kServicePortNamed},
         {request(client.channel.portName), TelephonyService::kServicePortNamed},
+        {withNulCharacter(*PropertyListSerialization::read(request("\u00e9-")).value), TelephonyService::kMalformedRequest},
         {request(unclaimed->name()), TelephonyService::kNoError},
     };
     for (const auto& [data, code] : rows) {
@@ -156,7 +159,7 @@ TEST(TelephonyService, BadChannelRequestsAreAnsweredWithAnErrorAndServingGoesOn)
         EXPECT_EQ(answer->get("ErrorCode").asInteger(), code);
         EXPECT_EQ(answer->get("PortName").asString()->empty(), code != 0);
     }
-    EXPECT_EQ(service.counters().malformedRequests, 2u);
+    EXPECT_EQ(service.counters().malformedRequests, 3u);
     EXPECT_EQ(service.counters().openChannels, 2u);
     EXPECT_TRUE(waitForCounters(service, [](const Counters& c) { return c.openChannels == 1; }, 4500));
 }

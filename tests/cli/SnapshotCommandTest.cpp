@@ -8,6 +8,7 @@
 #include "PropertyList/Dictionary.h"
 #include "PropertyList/PropertyListSerialization.h"
 #include "support/CommandOutput.h"
+#include "support/HostilePlist.h"
 
 #include <QFile>
 #include <QTemporaryDir>
@@ -88,6 +89,7 @@ TEST_F(SnapshotCommandTest, BadInputIsAClearErrorAndWritesNothing) {
     write("noDlf", snapshotOf(Value(Array::of({entry("Description", Value("Snapshot (x)"))}))));
     write("dlfText", snapshotOf(Value(Array::of({entry("DLF", Value("text"))}))));
     write("good", snapshotOf(Value(Array::of({entry("DLF", Value::data({1, 2, 3}))}))));
+    write("nul", vantorel::testing::withNulCharacter(snapshotOf(Value(Array::of({entry("Description", "\u00e9-")})))));
     const struct {
         QStringList args;
         int code;
@@ -98,6 +100,7 @@ TEST_F(SnapshotCommandTest, BadInputIsAClearErrorAndWritesNothing) {
         {{path("text")}, 1, "is not a snapshot: not a property list"},
         {{path("array")}, 1, "is not a snapshot: property list root is array, not a dictionary"},
         {{path("command")}, 1, "is not a snapshot: it has no \"Timestamp\", \"Data\", \"Description\""},
+        {{path("nul")}, 1, "is not a snapshot: string holds a NUL character"},
         {{path("wrongType")}, 1, "is not a snapshot: its \"Data\" is string, not array"},
         {{path("noDlf"), "--dlf", path("out.dlf")}, 1, "no entry holds a \"DLF\""},
         {{path("dlfText"), "--dlf", path("out.dlf")}, 1, "entry 0's \"DLF\" is string, not data"},

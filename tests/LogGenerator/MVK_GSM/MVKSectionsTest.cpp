@@ -8,11 +8,14 @@
 #include "LogGenerator/MVK_GSM/ServingPLMN.h"
 #include "LogGenerator/MVK_GSM/SimInfo.h"
 #include "LogGenerator/SectionTesting.h"
+#include "support/HostilePlist.h"
 
 #include <gtest/gtest.h>
 
 namespace vantorel {
 namespace {
+
+using testing::withNulCharacter;
 
 using namespace sectiontest;
 
@@ -146,6 +149,8 @@ TEST(PDPContextListSection, AnArrayReplacesTheListAnythingElseLeavesIt) {
         {{internet, pdpRecord(Value(Array::create()))}, "[]"},
         {{internet, pdpRecord(context("x"))}, internetShown},
         {{internet, RecordBuilder::extra(2, 16).bytes(13, {'x', 'y', 'z'}).build()}, internetShown},
+        {{internet, RecordBuilder::extra(2).bytes(13, withNulCharacter(Value(Array::of({context("\u00e9-")})))).build()},
+         internetShown},
     };
     for (const auto& [records, expected] : rows)
         EXPECT_EQ(Bound<PDPContextList>(true).feed(records, 0xFF0002).shown(), expected);
