@@ -3,6 +3,7 @@
 
 #include "LogGenerator/ArrayLock.h"
 #include "Platform/ByteReader.h"
+#include "Platform/LogCodes.h"
 #include "Platform/ProgrammingError.h"
 #include "Platform/SystemLog.h"
 #include "PropertyList/Array.h"
@@ -114,7 +115,14 @@ ArrayRef Base::readEntries(const ByteReader& record, size_t firstOffset, size_t 
 
 PropertyListResult Base::parseExtraPayload(ByteView record) {
     // Offset 13 is the end of the record header; from() gives nothing for a header-only record.
-    return PropertyListSerialization::read(ByteReader(record).from(13));
+    const ByteReader reader(record);
+    PropertyListResult result = PropertyListSerialization::read(reader.from(13));
+    // The reason (a hostile or broken payload: a NUL in a string, nesting too deep, a
+    // cut list) is said once here; the section decides what its display keeps.
+    if (!result)
+        SystemLog::log(SystemLog::kWarning, "Extra record 0x%X skipped: %s",
+                       static_cast<unsigned>(LogCode::kExtraBase | reader.u16(3).value_or(0)), result.error.c_str());
+    return result;
 }
 
 void Base::logUnknownCode(int32_t logCode) {

@@ -8,6 +8,7 @@
 #include "LogGenerator/MVK_GSM/ServingPLMN.h"
 #include "LogGenerator/MVK_GSM/SimInfo.h"
 #include "LogGenerator/SectionTesting.h"
+#include "Platform/SystemLogCapture.h"
 #include "support/HostilePlist.h"
 
 #include <gtest/gtest.h>
@@ -152,8 +153,10 @@ TEST(PDPContextListSection, AnArrayReplacesTheListAnythingElseLeavesIt) {
         {{internet, RecordBuilder::extra(2).bytes(13, withNulCharacter(Value(Array::of({context("\u00e9-")})))).build()},
          internetShown},
     };
+    SystemLogCapture log;
     for (const auto& [records, expected] : rows)
         EXPECT_EQ(Bound<PDPContextList>(true).feed(records, 0xFF0002).shown(), expected);
+    EXPECT_TRUE(log.contains(SystemLog::kWarning, "Extra record 0xFF0002 skipped: string holds a NUL character"));
 }
 
 Bytes simRecord(std::initializer_list<std::pair<const char*, Value>> files) {
