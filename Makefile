@@ -1,4 +1,4 @@
-# Vantorel: the two commands of the README (make run, make test), and make bench.
+# Vantorel: the two commands of the README (make run, make test), make bench and make fuzz.
 # Every dependency is a Debian package installed by scripts/install-deps.
 
 JOBS ?= $(shell nproc 2>/dev/null || echo 2)
@@ -9,7 +9,11 @@ CMAKE_FLAGS ?=
 BENCH_DIR := build/bench
 BENCH_FLAGS ?= --benchmark_min_time=0.5
 
-.PHONY: all deps build test run bench clean
+FUZZ_DIR := build/fuzz
+FUZZ_SECONDS ?= 60
+FUZZ_TARGETS ?=
+
+.PHONY: all deps build test run bench fuzz clean
 
 all: build
 
@@ -38,6 +42,14 @@ bench: deps
 	@cmake -S . -B $(BENCH_DIR) -G Ninja -DCMAKE_BUILD_TYPE=Release -DVANTOREL_TESTS=OFF -DVANTOREL_BENCH=ON $(CMAKE_FLAGS) >/dev/null
 	@cmake --build $(BENCH_DIR) -j $(JOBS) --target vantorel-bench
 	@$(BENCH_DIR)/bench/vantorel-bench $(BENCH_FLAGS)
+
+# libFuzzer on every reader of untrusted bytes (docs/reliability.md): clang, ASan+UBSan,
+# FUZZ_SECONDS per target (FUZZ_TARGETS to pick some); fails naming each input that crashed one.
+fuzz: deps
+	@cmake -S . -B $(FUZZ_DIR) -G Ninja -DCMAKE_CXX_COMPILER=clang++ -DCMAKE_BUILD_TYPE=RelWithDebInfo \
+		-DVANTOREL_TESTS=OFF -DVANTOREL_SANITIZE=ON -DVANTOREL_FUZZ=ON $(CMAKE_FLAGS) >/dev/null
+	@cmake --build $(FUZZ_DIR) -j $(JOBS) --target vantorel-fuzz
+	@tests/fuzz/run-fuzzers $(FUZZ_DIR) $(FUZZ_SECONDS) $(FUZZ_TARGETS)
 
 clean:
 	rm -rf build

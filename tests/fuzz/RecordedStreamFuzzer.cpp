@@ -1,0 +1,17 @@
+// Fuzz target: any recorded file's bytes through RecordedStream: format detection, then the reader it picks.
+#include "FuzzSupport.h"
+#include "Platform/TelephonyIdentifiers.h"
+#include "TelephonyService/Replay/RecordedStream.h"
+
+using namespace vantorel;
+
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+    const ByteView input(data, size);
+    const RecordedStream stream = RecordedStream::fromBytes(input, kTSLogChannelTechnology_Morvek_UTRAN2);
+    FUZZ_CHECK(stream.format() == RecordedStream::detect(input));
+    (void)stream.summary();
+    // QMDL and DLF records reach the decoders as ordinary records with message id 0.
+    if (stream.format() != RecordedStream::Format::Capture)
+        for (const TimedMessage& m : stream.messages()) FUZZ_CHECK(m.messageId == 0 && !m.data.empty() && m.data[0] == 1);
+    return 0;
+}
