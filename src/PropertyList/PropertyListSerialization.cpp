@@ -3,10 +3,12 @@
 
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
+#include "PropertyList/Utf8.h"
 #include "PropertyList/PropertyListGuard.h"
 
 #include <plist/plist.h>
 
+#include <algorithm>
 #include <cmath>
 #include <cstring>
 #include <limits>
@@ -64,6 +66,12 @@ bool toValue(plist_t node, size_t depth, Value& out, std::string& error) {
             error = "string holds a NUL character";
             return false;
         }
+        // libplist passes the bytes of an ASCII-marked binary string or an XML text
+        // through unchecked; the display, JSON and a written binary plist need UTF-8.
+        if (!Utf8::isValid(text)) {
+            error = "string is not valid UTF-8";
+            return false;
+        }
         out = Value(std::move(text));
         return true;
     }
@@ -113,6 +121,10 @@ bool toValue(plist_t node, size_t depth, Value& out, std::string& error) {
             }
             Value v;
             bool ok = toValue(item, depth + 1, v, error);
+            if (ok && key && !Utf8::isValid(key)) {
+                error = "dictionary key is not valid UTF-8";
+                ok = false;
+            }
             if (ok) dict->set(key ? key : "", std::move(v));
             free(key);
             if (!ok) {
@@ -141,8 +153,13 @@ plist_t fromValue(const Value& value) {
         return plist_new_data(reinterpret_cast<const char*>(b.data()), b.size());
     }
     case Value::Type::Date: {
+        // libplist holds a date as 32-bit whole seconds from 2001: a date beyond about
+        // 68 years either side is written as the nearest one it can hold, not
+        // converted out of range.
         double s = value.asDate()->secondsSince1970 - kSecondsFrom1970To2001;
-        double whole = std::floor(s);
+        if (std::isnan(s)) s = 0;
+        s = std::clamp(s, double{std::numeric_limits<int32_t>::min()}, double{std::numeric_limits<int32_t>::max()});
+        const double whole = std::floor(s);
         return plist_new_date(static_cast<int32_t>(whole), static_cast<int32_t>((s - whole) * 1e6));
     }
     case Value::Type::Array: {

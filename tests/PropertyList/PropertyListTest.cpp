@@ -161,6 +161,7 @@ TEST(PropertyListSerialization, HostileInputIsRefusedBeforeLibplistCanAbortOverf
         {"NUL in an ASCII string", bplist({{0x53, 'a', 0, 'b'}}), "string holds a NUL character"},
         {"NUL in a UTF-16 string", bplist({{0x62, 0, 'a', 0, 0}}), "string holds a NUL character"},
         {"NUL in a key", bplist({refs(0xD1, {1, 2}), {0x62, 0, 'k', 0, 0}, {0x09}}), "string holds a NUL character"},
+        {"a string that is not UTF-8", bplist({{0x52, 0xC3, 0x28}}), "string is not valid UTF-8"},
         {"raw NUL in XML", Bytes(nulXML.begin(), nulXML.end()), "NUL byte"},
         {"50,000 nested binary arrays", chain(50'000), "nested deeper than 256"},
         {"100,000 nested binary arrays", chain(100'000), "nested deeper than 256"},
