@@ -387,7 +387,13 @@ bool TelephonyService::deliver(uint64_t number, Channel& channel, int32_t messag
     }
     ++channel.sent;
     ++counters_.messagesSent;
+    const bool wasCongested = channel.congested;
     channel.congested = channel.client->bytesPending() >= kHighWaterBytes;
+    if (channel.congested && !wasCongested) {
+        channel.congestedSince.start();
+        // Look again when the client would count as stalled.
+        QTimer::singleShot(kStallMs + 10, this, [this] { updateFlow(); });
+    }
     return true;
 }
 
@@ -421,14 +427,19 @@ void TelephonyService::drainQueue(uint64_t number) {
 
 void TelephonyService::updateFlow() {
     if (!backend_) return;
-    // Paused only when no streaming channel can take more: a channel over the
-    // high-water mark queues and, full, drops, but holds up no other.
-    bool canTake = false;
+    // A client behind but still taking holds the replay back (nothing is lost for a
+    // slow reader); one that has taken nothing for kStallMs no longer does, and only
+    // its own queue drops. With no channel able to take more, the replay waits.
+    bool canTake = false, holdsBack = false;
     for (const auto& entry : channels_) {
         const Channel& channel = *entry.second;
-        if (channel.streaming && !channel.closing && !channel.congested) canTake = true;
+        if (!channel.streaming || channel.closing) continue;
+        if (!channel.congested)
+            canTake = true;
+        else if (channel.congestedSince.elapsed() < kStallMs)
+            holdsBack = true;
     }
-    backend_->setPaused(!canTake);
+    backend_->setPaused(!canTake || holdsBack);
 }
 
 void TelephonyService::backendStateChanged(ModemBackend::State state) {

@@ -59,8 +59,10 @@ struct TelephonyServiceOptions {
 // freed (a replay then starts over for the next client; the emulator's ticks go on
 // counting). A channel whose client has more than kHighWaterBytes not yet taken keeps
 // what comes next in a queue of at most kMaxQueuedBytes, dropping its oldest messages
-// beyond that; a replay waits (is paused) only while no streaming channel can take more,
-// so a lone slow client loses nothing and a client that never reads stalls no other.
+// beyond that. A replay waits (is paused) while a client is behind but still taking
+// (lossless back-pressure for slow readers) and while no streaming channel can take more;
+// a client that has taken nothing for kStallMs while behind is stalled and no longer
+// holds the replay: it alone loses its oldest messages, until it drains.
 // A client that goes away (its receive port, or its connection to the channel port)
 // frees its channel, and so does one that never connects to the channel port within
 // kUnclaimedChannelMs. Everything runs on the thread that calls start(); the receive
@@ -81,6 +83,7 @@ public:
         kTooManyChannels = 5,
     };
     static constexpr int64_t kHighWaterBytes = 1 << 20;
+    static constexpr int kStallMs = 1000;
     static constexpr size_t kMaxQueuedBytes = 1 << 20;
     static constexpr size_t kMaxChannels = 64;
     // Connections a channel port takes: its client's, and a few probes.
@@ -131,6 +134,7 @@ private:
         std::unique_ptr<RemoteMessagePort> client;
         bool streaming = false;
         bool congested = false;  // the client has kHighWaterBytes or more not yet taken
+        QElapsedTimer congestedSince;  // since when, with no drain in between
         bool closing = false;
         LogMask mask;
         uint64_t sent = 0;
