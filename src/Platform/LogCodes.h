@@ -31,6 +31,10 @@ inline constexpr int32_t kUTRANGSMNeighbourList = 0xD00E;   // GSM neighbours
 inline constexpr int32_t kUTRANRRCState = 0xD0E0;           // RRC state
 inline constexpr int32_t kUTRANServingCell = 0xD0E2;        // serving cell
 
+// LTE.
+inline constexpr int32_t kLTEIdleNeighbourMeasurements = 0xB180;  // idle-mode neighbour cell measurements
+inline constexpr int32_t kLTEReselectionCandidates = 0xB186;      // cell reselection candidates
+
 // The DLF file's own version-report record.
 inline constexpr int32_t kDlfVersionReport = 0x1FFD;
 
