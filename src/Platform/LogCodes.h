@@ -32,6 +32,10 @@ inline constexpr int32_t kUTRANRRCState = 0xD0E0;           // RRC state
 inline constexpr int32_t kUTRANServingCell = 0xD0E2;        // serving cell
 
 // LTE.
+inline constexpr int32_t kLTEMasterInfoBlock = 0xB0C1;             // RRC master information block: transmit antennas
+inline constexpr int32_t kLTEServingCellInfo = 0xB0C2;             // RRC serving cell: PCI, E-ARFCNs, bandwidths, TAC, band
+inline constexpr int32_t kLTEIntraFreqMeasurement = 0xB179;        // connected mode intra-frequency measurement results
+inline constexpr int32_t kLTEServingCellMeasurement = 0xB17F;      // idle mode serving cell measurement and evaluation
 inline constexpr int32_t kLTEIdleNeighbourMeasurements = 0xB180;  // idle-mode neighbour cell measurements
 inline constexpr int32_t kLTEReselectionCandidates = 0xB186;      // cell reselection candidates
 

@@ -1,0 +1,154 @@
+// LTEServingSectionsTest: the LTE serving-cell and measurement sections fed built and captured records.
+#include "LogGenerator/LTE/ConnectedModeMeasurementMisc.h"
+#include "LogGenerator/LTE/DetectedCells.h"
+#include "LogGenerator/LTE/LTEServingCellInfo.h"
+#include "LogGenerator/LTE/MeasuredNeighborCells.h"
+#include "LogGenerator/LTE/ServingCellMeasurement.h"
+#include "LogGenerator/SectionTesting.h"
+#include "TelephonyService/Replay/QmdlReader.h"
+
+#include <gtest/gtest.h>
+
+#include <string>
+
+namespace vantorel {
+namespace {
+
+using namespace sectiontest;
+
+// 0xB0C2: 14 PCI, 16 downlink / 18 uplink E-ARFCN, 20 / 21 bandwidths in resource blocks,
+// 22 cell identity (signed 32), 26 TAC, 28 band; 38 bytes.
+Bytes servingCell(uint8_t downRB, uint8_t upRB, size_t length = 38) {
+    return RecordBuilder::ordinary(0xB0C2, 38).u16(14, 503).u16(16, 65535).u16(18, 0).u8(20, downRB).u8(21, upRB)
+        .u32(22, 0xFFFFFFFF).u16(26, 34624).u32(28, 17).resize(length).build();
+}
+
+TEST(LTEServingCellInfoSection, ConfigurationBandwidthsAntennasAndShortRecords) {
+    const std::pair<uint8_t, const char*> bandwidths[] = {{6, "1.4 MHz"}, {15, "3 MHz"},  {25, "5 MHz"}, {75, "15 MHz"},
+                                                         {100, "20 MHz"}, {0, "Unknown"}, {255, "Unknown"}};
+    for (const auto& [rb, text] : bandwidths)
+        EXPECT_EQ(render(Bound<LTEServingCellInfo>().feed(servingCell(rb, 50), 0xB0C2).dict->get("Download Bandwidth")),
+                  text);
+    SystemLogCapture capture;
+    Bound<LTEServingCellInfo> info;
+    info.feed(servingCell(50, 50, 37), 0xB0C2).feed(RecordBuilder::ordinary(0xB0C1, 21).u8(20, 4).build(), 0xB0C1);
+    EXPECT_EQ(info.shown(), "{}");
+    info.feed(RecordBuilder::ordinary(0xB0C1, 22).u8(20, 4).build(), 0xB0C1).feed(servingCell(50, 50), 0xB179);
+    EXPECT_EQ(info.shown(), "{Num Tx Antennas=4}");
+    // An accepted antenna record is reported as unknown too; then the foreign code.
+    EXPECT_EQ(errorLines(capture), (std::vector<std::string>{"Received an unknown log message: 45249",
+                                                              "Received an unknown log message: 45433"}));
+}
+
+TEST(LTEServingCellInfoSection, TheFirstServingLTECellWinsAndTheNextConfigurationRecordDropsItsUARFCN) {
+    const char *const lte = kTSCellMonitorRadioAccessTechnologyLTE, *const serving = kTSCellMonitorCellTypeServing;
+    auto full = [](const char* rat, const char* type, int tac) {
+        return cell(rat, type, {{kTSCellMonitorTAC, tac}, {kTSCellMonitorCellId, 2}, {kTSCellMonitorPID, 3},
+                                {kTSCellMonitorBandInfo, 7}, {kTSCellMonitorUARFCN, 1300}});
+    };
+    SystemLogCapture capture;
+    Bound<LTEServingCellInfo> info;
+    const char *const umts = kTSCellMonitorRadioAccessTechnologyUMTS, *const neighbour = kTSCellMonitorCellTypeNeighbor;
+    info.feed(cellMonitor({full(lte, nullptr, 9), full(nullptr, serving, 9), full(lte, neighbour, 9),
+                           full(umts, serving, 9), full(lte, serving, 1), full(lte, serving, 2)}), 0xFF0001);
+    EXPECT_EQ(info.shown(),
+              "{Tracking Area Code=1, Cell Identity=2, Physical Cell ID=3, Freq Band Indicator=7, UARFCN=1300}");
+    const std::string configured =
+        "{Tracking Area Code=34624, Cell Identity=-1, Physical Cell ID=503, Freq Band Indicator=17, "
+        "Download Frequency=65535, Upload Frequency=0, Download Bandwidth=10 MHz, Upload Bandwidth=Unknown";
+    EXPECT_EQ(info.feed(servingCell(50, 7), 0xB0C2).shown(), configured + "}");
+    // A serving cell lacking values keeps the earlier ones; no cells or no property list change nothing.
+    info.feed(cellMonitor({cell(lte, serving, {{kTSCellMonitorUARFCN, 8}}), full(lte, serving, 3)}), 0xFF0001)
+        .feed(cellMonitor({}), 0xFF0001)
+        .feed(RecordBuilder::extra(1, 20).bytes(13, {'n', 'o', 't'}).build(), 0xFF0001);
+    EXPECT_EQ(info.shown(), configured + ", UARFCN=8}");
+    const std::string failed = "Serving Cell Info: Failed to retrieve ";
+    const std::vector<std::string> expected = {
+        failed + "TAC\n", failed + "Cell ID\n", failed + "Physical Cell ID\n", failed + "Freq Band Indicator\n",
+        "Cell Info Array data could not be constructed", "Failed to get Cell Array\n"};
+    EXPECT_EQ(errorLines(capture), expected);
+}
+
+// 0xB179: 17 E-ARFCN, 19 serving PCI, 21 subframe, 23 RSRP, 25 RSRQ, 27 n, 28 d; n 6-byte
+// neighbour entries (PCI, RSRP, RSRQ) from 29, then d 2-byte detected-cell PCIs.
+Bytes intraFreq(uint8_t n, uint8_t d, std::initializer_list<uint16_t> entries, size_t length) {
+    RecordBuilder b = RecordBuilder::ordinary(0xB179, length).u16(17, 1300).u16(19, 101).u16(21, 9).u16(25, 160);
+    size_t offset = 29;
+    for (uint16_t v : entries) b.u16(std::exchange(offset, offset + 2), v);
+    return b.u8(27, n).u8(28, d).resize(length).build();
+}
+
+TEST(LTEIntraFrequencySections, OneRecordFeedsAllThreeAndEntriesStopAtTheRecordsEnd) {
+    const Bytes two = intraFreq(2, 1, {11, 0, 0, 12, 560, 65535, 13}, 43);
+    const char* const twoNeighbours = "[{Physical Cell ID=11, Filtered RSRP=-140.00 dBm, Filtered RSRQ=-20.00 dB}, "
+                                      "{Physical Cell ID=12, Filtered RSRP=0.00 dBm, Filtered RSRQ=8171.88 dB}]";
+    struct Row { std::vector<Bytes> records; const char *neighbours, *detected; };
+    const Row rows[] = {
+        {{two}, twoNeighbours, "[{Physical Cell ID=13}]"},
+        {{two, intraFreq(0, 2, {21, 22}, 33)}, "[]", "[{Physical Cell ID=21}, {Physical Cell ID=22}]"},
+        {{intraFreq(3, 1, {31, 65535, 160, 32}, 37)},  // 3 claimed, 1 fits; no detected cell after 3 entries
+         "[{Physical Cell ID=31, Filtered RSRP=16243.75 dBm, Filtered RSRQ=0.00 dB}]", "[]"},
+        {{intraFreq(1, 5, {41, 0, 0, 42, 43}, 40)},  // 5 claimed, 2 fit
+         "[{Physical Cell ID=41, Filtered RSRP=-140.00 dBm, Filtered RSRQ=-20.00 dB}]",
+         "[{Physical Cell ID=42}, {Physical Cell ID=43}]"},
+        {{two, intraFreq(0, 0, {51, 52, 53}, 35)}, "[]", "[]"},
+        {{two, RecordBuilder::ordinary(0xB179, 28).u16(19, 999).build()}, twoNeighbours, "[{Physical Cell ID=13}]"},
+    };
+    for (const Row& row : rows) {
+        EXPECT_EQ(Bound<ConnectedModeMeasurementMisc>().feed(row.records, 0xB179).shown(),
+                  "{E-ARFCN=1300, Serving Physical Cell ID=101, Subframe Number=9, "
+                  "Serving Filtered RSRP=-140.00 dBm, Serving Filtered RSRQ=0.00 dB}");
+        EXPECT_EQ(Bound<MeasuredNeighborCells>(true).feed(row.records, 0xB179).shown(), row.neighbours);
+        EXPECT_EQ(Bound<DetectedCells>(true).feed(row.records, 0xB179).shown(), row.detected);
+    }
+}
+
+// One little-endian word from (value, first bit) pairs.
+uint32_t word(std::initializer_list<std::pair<uint32_t, unsigned>> fields) {
+    uint32_t w = 0;
+    for (auto [value, bit] : fields) w |= value << bit;
+    return w;
+}
+
+TEST(LTEServingCellMeasurementSection, EveryBitFieldItsConversionAndTheNotPresentMarkers) {
+    const std::pair<Bytes, const char*> rows[] = {
+        {RecordBuilder::ordinary(0xB17F, 33).u8(13, 4).u16(17, 6300)
+             .u32(19, word({{300, 0}, {9, 9}}))
+             .u32(21, word({{400, 0}, {401, 9}, {100, 18}, {101, 25}}))
+             .u32(25, word({{300, 0}, {33, 9}, {23, 15}, {63, 22}, {0xF, 28}}))
+             .u32(29, word({{127, 0}, {45, 7}, {31, 13}, {32, 19}, {1, 25}, {11, 26}, {3, 30}})).build(),
+         "{Version=4, E-ARFCN=6300, Physical Cell ID=300, Serving Layer Priority=9, Measured RSRP=-40.00 dBm, "
+         "Average RSRP=-39.75 dBm, Measured RSRQ=-5.00 dB, Average RSRQ=-4.75 dB, Measured RSSI=10.00 dBm, "
+         "Qrxlevmin=-74 dBm, P_Max=-7 dBm, Max UE Tx Power=33 dBm, Srxlev=97 dBm, "
+         "Num of Consecutive DRX Cycles of S < 0=45, S Intra Search=62 dB, S Non Intra Search=Not Present, "
+         "Measurement Rules Updated=True, Measurement Rules=11}"},
+        {RecordBuilder::ordinary(0xB17F, 40).u32(25, word({{64, 15}})).u32(29, word({{32, 13}, {5, 19}})).build(),
+         "{Version=0, E-ARFCN=0, Physical Cell ID=0, Serving Layer Priority=0, Measured RSRP=-140.00 dBm, "
+         "Average RSRP=-140.00 dBm, Measured RSRQ=-30.00 dB, Average RSRQ=-30.00 dB, Measured RSSI=-140.00 dBm, "
+         "Qrxlevmin=-140 dBm, P_Max=Not Present, Max UE Tx Power=-30 dBm, Srxlev=-30 dBm, "
+         "Num of Consecutive DRX Cycles of S < 0=0, S Intra Search=Not Present, S Non Intra Search=10 dBm, "
+         "Measurement Rules Updated=False, Measurement Rules=0}"},
+        {RecordBuilder::ordinary(0xB17F, 32).u8(13, 4).build(), "{}"},
+    };
+    for (const auto& [record, expected] : rows)
+        EXPECT_EQ(Bound<ServingCellMeasurement>().feed(record, 0xB17F).shown(), expected);
+}
+
+// qmdl_example's twelve 0xB0C2 (version 2) records all hold, from offset 13:
+// 02 | 57 00 | 94 16 | E4 5C | 32 | 32 | 0F 0B 6D 08 | 40 87 | 11 00 00 00: PCI 0x57 = 87, downlink
+// E-ARFCN 0x1694 = 5780 and uplink 0x5CE4 = 23780 (band 17's pair), 0x32 = 50 resource blocks =
+// 10 MHz each way, cell identity 0x086D0B0F = 141363983, TAC 0x8740 = 34624, band 0x11 = 17. Its
+// two 0xB0C1 (version 1) records hold 02 at offset 20: two transmit antennas.
+TEST(LTEServingCellInfoSection, TheCapturedServingCellRecordsShowTheServingCell) {
+    const RecordedLog log = QmdlReader::readFile(std::string(VANTOREL_CAPTURES_DIR) + "/qmdl_example.qmdl");
+    ASSERT_TRUE(log.ok() && log.count(0xB0C2) == 12 && log.count(0xB0C1) == 2) << log.error;
+    Bound<LTEServingCellInfo> info;
+    for (const RecordedEntry& e : log.entries)
+        if (e.logCode == 0xB0C2 || e.logCode == 0xB0C1) info.feed(e.record, e.logCode);
+    EXPECT_EQ(info.shown(), "{Physical Cell ID=87, Download Frequency=5780, Upload Frequency=23780, "
+                            "Download Bandwidth=10 MHz, Upload Bandwidth=10 MHz, Cell Identity=141363983, "
+                            "Tracking Area Code=34624, Freq Band Indicator=17, Num Tx Antennas=2}");
+}
+
+}  // namespace
+}  // namespace vantorel
