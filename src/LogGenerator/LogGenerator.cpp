@@ -1,6 +1,7 @@
 // LogGenerator: the abstract decoder, its snapshot history and the choice of decoder by technology.
 #include "LogGenerator/LogGenerator.h"
 
+#include "LogGenerator/LTE/LTELogGenerator.h"
 #include "LogGenerator/UTRAN/UTRANLogGenerator.h"
 #include "Platform/DateDescription.h"
 #include "Platform/ProgrammingError.h"
@@ -84,7 +85,7 @@ const TechnologyRow kTechnologies[] = {
     {kTSLogChannelTechnology_IFX, nullptr},
     {kTSLogChannelTechnology_Morvek_GSM, nullptr},
     {kTSLogChannelTechnology_Morvek_CDMA, nullptr},
-    {kTSLogChannelTechnology_Morvek_LTE, nullptr},
+    {kTSLogChannelTechnology_Morvek_LTE, &LTELogGenerator::generator},
     {kTSLogChannelTechnology_Morvek_UTRAN2, &UTRANLogGenerator::generator},
 };
 

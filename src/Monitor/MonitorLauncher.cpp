@@ -3,6 +3,7 @@
 
 #include "Model/VantorelModel.h"
 #include "Platform/TechnologyNames.h"
+#include "TelephonyService/EmulatorBackend.h"
 
 #include <QCommandLineParser>
 #include <QMetaObject>
@@ -13,7 +14,10 @@ namespace vantorel {
 
 void MonitorLauncher::addOptions(QCommandLineParser& parser) {
     const QString techs = QString::fromStdString(TechnologyNames::listing());
-    parser.addOption({"emulate", "Run the built-in modem emulator for TECH (" + techs + ").", "TECH"});
+    parser.addOption({"emulate",
+                      "Run the built-in modem emulator for TECH (scenarios: " +
+                          QString::fromStdString(EmulatorBackend::availableScenarios()) + "; default utran).",
+                      "TECH"});
     parser.addOption({"replay", "Replay a recorded stream: QXDM DLF, QMDL/mi2log or a Vantorel capture.", "FILE"});
     parser.addOption({"service", "Watch a running vantorel-telephonyd listening on port NAME.", "NAME"});
     parser.addOption({"technology", "Technology of a replayed file that does not carry one (" + techs + ").", "TECH"});

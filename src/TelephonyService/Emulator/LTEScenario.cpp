@@ -19,14 +19,6 @@ namespace vantorel {
 
 namespace {
 
-// The LTE log codes this modem sends (kept here until the shared code table names them).
-constexpr int32_t kServingCell = 0xB0C2;            // serving cell configuration
-constexpr int32_t kAntennaConfig = 0xB0C1;          // serving cell antenna configuration
-constexpr int32_t kConnectedIntraFreqMeas = 0xB179; // connected-mode intra-frequency measurement
-constexpr int32_t kIdleServingMeas = 0xB17F;        // idle-mode serving cell measurement
-constexpr int32_t kIdleNeighbourMeas = 0xB180;      // idle-mode neighbour cell measurement
-constexpr int32_t kReselectionCandidates = 0xB186;  // idle-mode reselection candidates
-
 // A carrier of the network: downlink EARFCN (uplink = downlink + 18000 on these
 // FDD bands), 3GPP band, bandwidth in resource blocks, 10 log10(resource blocks)
 // (RSSI = RSRP + that - RSRQ), idle-mode layer priority, and whether SIB1 carries P-Max.
@@ -395,7 +387,7 @@ std::vector<Bytes> LTEScenario::step() {
 
 Bytes LTEScenario::servingCellRecord(uint64_t tick) const {
     const Carrier& carrier = kCarriers[serving_.carrier];
-    return RecordBuilder::ordinary(kServingCell, 38)
+    return RecordBuilder::ordinary(LogCode::kLTEServingCellInfo, 38)
         .timestamp(timestampForTick(tick))
         .u8(13, 1)                                                // 13: record version
         .u16(14, serving_.pci)                                    // 14-15: physical cell identity
@@ -410,7 +402,7 @@ Bytes LTEScenario::servingCellRecord(uint64_t tick) const {
 }
 
 Bytes LTEScenario::antennaRecord(uint64_t tick) const {
-    return RecordBuilder::ordinary(kAntennaConfig, 22)
+    return RecordBuilder::ordinary(LogCode::kLTEMasterInfoBlock, 22)
         .timestamp(timestampForTick(tick))
         .u8(13, 1)             // 13: record version
         .u16(14, serving_.pci)  // 14-15: physical cell identity
@@ -430,7 +422,7 @@ Bytes LTEScenario::connectedMeasurementRecord(uint64_t tick, bool withPrefix) co
     auto rawRSRP = [](int32_t q) { return static_cast<uint16_t>(clampRaw(q + 560, 16)); };
     auto rawRSRQ = [](int32_t q) { return static_cast<uint16_t>(clampRaw(2 * q + 160, 16)); };
     const uint16_t subframe = static_cast<uint16_t>((tick * 500 + serving_.pci) % 10240);  // SFN x 10 + subframe
-    RecordBuilder b = RecordBuilder::ordinary(kConnectedIntraFreqMeas, 29 + 6 * n + 2 * d);
+    RecordBuilder b = RecordBuilder::ordinary(LogCode::kLTEIntraFreqMeasurement, 29 + 6 * n + 2 * d);
     b.timestamp(timestampForTick(tick))
         .u8(13, 4)                                          // 13: record version
         .u16(17, kCarriers[serving_.carrier].earfcn)        // 17-18: EARFCN
@@ -472,7 +464,7 @@ Bytes LTEScenario::servingMeasurementRecord(uint64_t tick) {
     const uint32_t w29 = clampRaw(s + 30, 7) | (static_cast<uint32_t>(drxBelowZero_) << 7) | (kSIntraSearch << 13) |
                          (kSNonIntraSearch << 19) | ((rulesUpdated ? 1u : 0u) << 25) |
                          (static_cast<uint32_t>(rules) << 26);
-    return RecordBuilder::ordinary(kIdleServingMeas, 33)
+    return RecordBuilder::ordinary(LogCode::kLTEServingCellMeasurement, 33)
         .timestamp(timestampForTick(tick))
         .u8(13, 4)                         // 13: record version
         .u16(17, carrier.earfcn)           // 17-18: EARFCN
@@ -491,7 +483,7 @@ Bytes LTEScenario::neighbourMeasurementRecord(uint64_t tick) {
     }
     const size_t n = std::min<size_t>(cells.size(), 32);  // 1..32 (step() sends none without neighbours)
     const Carrier& carrier = kCarriers[serving_.carrier];
-    RecordBuilder b = RecordBuilder::ordinary(kIdleNeighbourMeas, 21 + 20 * n);
+    RecordBuilder b = RecordBuilder::ordinary(LogCode::kLTEIdleNeighbourMeasurements, 21 + 20 * n);
     b.timestamp(timestampForTick(tick));
     b.u8(13, 2);                   // 13: record version
     b.u16(17, carrier.earfcn);     // 17-18: EARFCN
@@ -534,7 +526,7 @@ Bytes LTEScenario::reselectionCandidatesRecord(uint64_t tick) const {
     // decoder walks; a candidate's RAT-specific part starts at its byte 4, so it shares
     // bytes with the next candidate's header and only the last one's is its own (4 bytes
     // after it: LTE EARFCN and PCI << 7, UTRAN UARFCN and PSC, GERAN ARFCN, band, BSIC).
-    RecordBuilder b = RecordBuilder::ordinary(kReselectionCandidates, 21 + 4 * n + 4);
+    RecordBuilder b = RecordBuilder::ordinary(LogCode::kLTEReselectionCandidates, 21 + 4 * n + 4);
     b.timestamp(timestampForTick(tick));
     b.u8(13, 1);                                          // 13: record version
     b.u16(15, kCarriers[serving_.carrier].earfcn);        // 15-16: serving EARFCN
@@ -630,14 +622,14 @@ Bytes LTEScenario::malformedRecord(uint64_t tick) const {
     switch ((tick / kMalformedPeriod) % 3) {
     case 0:
         // A connected-mode measurement cut after the serving RSRP: 24 bytes, below its 29-byte minimum.
-        return RecordBuilder::ordinary(kConnectedIntraFreqMeas, 24)
+        return RecordBuilder::ordinary(LogCode::kLTEIntraFreqMeasurement, 24)
             .timestamp(timestampForTick(tick))
             .u16(17, kCarriers[serving_.carrier].earfcn)
             .u16(19, serving_.pci)
             .build();
     case 1:
         // A serving-cell record with record type 2, neither ordinary (1) nor extra (255).
-        return RecordBuilder(2, kServingCell, 38)
+        return RecordBuilder(2, LogCode::kLTEServingCellInfo, 38)
             .timestamp(timestampForTick(tick))
             .u16(14, serving_.pci)
             .u16(16, kCarriers[serving_.carrier].earfcn)

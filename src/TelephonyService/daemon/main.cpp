@@ -3,6 +3,7 @@
 #include "Platform/SystemLog.h"
 #include "Platform/TechnologyNames.h"
 #include "Platform/TelephonyServiceConnection.h"
+#include "TelephonyService/EmulatorBackend.h"
 #include "TelephonyService/TelephonyService.h"
 
 #include <QCommandLineParser>
@@ -33,7 +34,8 @@ int main(int argc, char** argv) {
         "the modem's records, from the modem emulator or a recorded stream."));
     parser.addHelpOption();
     const QCommandLineOption emulate(QStringLiteral("emulate"),
-                                     QStringLiteral("Run the modem emulator for TECH (%1).").arg(names),
+                                     QStringLiteral("Run the modem emulator for TECH (scenarios: %1).")
+                                         .arg(QString::fromStdString(EmulatorBackend::availableScenarios())),
                                      QStringLiteral("TECH"));
     const QCommandLineOption replay(QStringLiteral("replay"),
                                     QStringLiteral("Replay FILE: a capture, a QXDM DLF or a QMDL / mi2log file."),
