@@ -1,6 +1,12 @@
 // EmulatorScenario: the seeded random sequence and time stamps shared by the emulator's synthetic modems.
 #include "TelephonyService/Emulator/EmulatorScenario.h"
 
+#include "Platform/LogCodes.h"
+#include "Platform/RecordBuilder.h"
+#include "Platform/StringFormat.h"
+#include "PropertyList/Array.h"
+#include "PropertyList/Dictionary.h"
+
 namespace vantorel {
 
 namespace {
@@ -15,6 +21,12 @@ uint32_t foldSeed(uint64_t seed) {
 EmulatorScenario::EmulatorScenario(uint64_t seed) : seed_(seed), engine_(foldSeed(seed)) {}
 
 EmulatorScenario::~EmulatorScenario() = default;
+
+std::vector<Bytes> EmulatorScenario::recordsForTick(uint64_t tick) {
+    if (tick < nextTick_) restart();
+    while (nextTick_ < tick) step();
+    return step();
+}
 
 std::chrono::milliseconds EmulatorScenario::tickInterval() const {
     return std::chrono::milliseconds(500);
@@ -42,6 +54,48 @@ bool EmulatorScenario::chance(uint32_t percent) {
 uint64_t EmulatorScenario::timestampForTick(uint64_t tick) const {
     uint64_t ms = tick * static_cast<uint64_t>(tickInterval().count());
     return (ms * 4 / 5) << 16;
+}
+
+Bytes EmulatorScenario::packetContextsRecord(std::span<const PacketContext> contexts, bool binary) {
+    auto list = Array::create();
+    for (size_t i = 0; i < contexts.size(); ++i) {
+        const PacketContext& p = contexts[i];
+        if (i > 0 && !p.active) continue;
+        auto d = Dictionary::create();
+        d->set("APN", p.apn);
+        d->set("PDP Type", p.type);
+        d->set("PDP Address", p.address);
+        d->set("NSAPI", StringFormat::format("%d", p.nsapi));
+        d->set("State", p.active ? "Active" : "Inactive");
+        list->append(Value(d));
+    }
+    return RecordBuilder::extraPropertyList(LogCode::kPDPContexts, Value(list), binary);
+}
+
+Bytes EmulatorScenario::cutPropertyListRecord(int32_t code, std::string_view text, uint64_t tick) const {
+    return RecordBuilder::extra(code)
+        .timestamp(timestampForTick(tick))
+        .bytes(RecordBuilder::kHeaderLength, ByteView(reinterpret_cast<const uint8_t*>(text.data()), text.size()))
+        .build();
+}
+
+char EmulatorScenario::luhnDigit(const std::string& digits) {
+    int sum = 0;
+    bool doubled = true;  // the digit next to the check digit is doubled
+    for (size_t i = digits.size(); i-- > 0;) {
+        int d = digits[i] - '0';
+        if (doubled) {
+            d *= 2;
+            if (d > 9) d -= 9;
+        }
+        sum += d;
+        doubled = !doubled;
+    }
+    return static_cast<char>('0' + (10 - sum % 10) % 10);
+}
+
+std::string EmulatorScenario::dottedAddress(int a, int b, int c, int d) {
+    return StringFormat::format("%d.%d.%d.%d", a, b, c, d);
 }
 
 }  // namespace vantorel

@@ -6,7 +6,9 @@
 #include <chrono>
 #include <cstdint>
 #include <random>
+#include <span>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace vantorel {
@@ -35,13 +37,28 @@ public:
     virtual std::string description() const = 0;
     // Time between two ticks.
     virtual std::chrono::milliseconds tickInterval() const;
-    // The messages the modem sends at tick n, in sending order. Called with
-    // n = 0, 1, 2, ... in order; the scenario may keep state between calls.
-    virtual std::vector<Bytes> recordsForTick(uint64_t tick) = 0;
+    // The messages the modem sends at tick n, in sending order. The state is a walk
+    // from tick 0: going back restarts it from the seed, skipping ahead runs the ticks
+    // in between, so tick n always gives the same bytes.
+    std::vector<Bytes> recordsForTick(uint64_t tick);
 
     uint64_t seed() const { return seed_; }
 
 protected:
+    // A packet-data context as the 0xFF0002 extra record lists it.
+    struct PacketContext {
+        std::string apn;
+        std::string type;  // "IP", "IPV6"
+        std::string address;
+        int nsapi = 0;
+        bool active = false;
+    };
+
+    // The walk: back to the state of tick 0 (reseed() included, nextTick_ = 0), and
+    // the records of tick nextTick_ (which it then advances).
+    virtual void restart() = 0;
+    virtual std::vector<Bytes> step() = 0;
+
     // Restarts the random sequence from the seed (for scenarios that replay).
     void reseed();
     // The next raw 32-bit number of the sequence.
@@ -53,6 +70,17 @@ protected:
     // The record time stamp (bytes 5..12, never read by the decoders) of tick n,
     // in the modem's format: 1.25 ms units since start in bits 16..63, bits 0..15 zero.
     uint64_t timestampForTick(uint64_t tick) const;
+
+    // The 0xFF0002 extra record: the first context always, the others while active;
+    // each dictionary is shown as sent, so every value is a display string.
+    static Bytes packetContextsRecord(std::span<const PacketContext> contexts, bool binary);
+    // An extra record whose XML property list was cut off in transfer (`text`).
+    Bytes cutPropertyListRecord(int32_t code, std::string_view text, uint64_t tick) const;
+    // The Luhn check digit that ends an ICCID (ITU-T E.118).
+    static char luhnDigit(const std::string& digits);
+    static std::string dottedAddress(int a, int b, int c, int d);
+
+    uint64_t nextTick_ = 0;
 
 private:
     uint64_t seed_;

@@ -74,25 +74,6 @@ int32_t srxlev(int32_t rsrp) {
     return rsrp / 4 - kQrxlevmin;
 }
 
-std::string dottedAddress(int a, int b, int c, int d) {
-    return StringFormat::format("%d.%d.%d.%d", a, b, c, d);
-}
-
-// The Luhn check digit that ends an ICCID (ITU-T E.118).
-char luhnDigit(const std::string& digits) {
-    int sum = 0;
-    bool doubled = true;  // the digit next to the check digit is doubled
-    for (size_t i = digits.size(); i-- > 0;) {
-        int d = digits[i] - '0';
-        if (doubled) {
-            d *= 2;
-            if (d > 9) d -= 9;
-        }
-        sum += d;
-        doubled = !doubled;
-    }
-    return static_cast<char>('0' + (10 - sum % 10) % 10);
-}
 
 }  // namespace
 
@@ -108,13 +89,6 @@ std::string LTEScenario::description() const {
     return "LTE cell of 262-01 on bands 3/7/20: drifting RSRP/RSRQ, neighbours, idle reselection candidates, handovers";
 }
 
-std::vector<Bytes> LTEScenario::recordsForTick(uint64_t tick) {
-    // The state is a walk from tick 0: going back restarts it from the seed,
-    // skipping ahead runs the ticks in between, so tick n always looks the same.
-    if (tick < nextTick_) restart();
-    while (nextTick_ < tick) step();
-    return step();
-}
 
 // ---- state -------------------------------------------------------------------
 
@@ -191,8 +165,8 @@ void LTEScenario::restart() {
     connected_ = false;
     dwell_ = uniform(3, 5);  // a short first idle period, so both modes show soon
 
-    bearers_[0] = Bearer{"internet", "IP", "0.0.0.0", 5, false};
-    bearers_[1] = Bearer{"ims", "IPV6", "::", 6, false};
+    bearers_[0] = PacketContext{"internet", "IP", "0.0.0.0", 5, false};
+    bearers_[1] = PacketContext{"ims", "IPV6", "::", 6, false};
     int32_t b = uniform(0, 255);
     int32_t c = uniform(0, 255);
     int32_t d = uniform(2, 254);
@@ -287,7 +261,7 @@ bool LTEScenario::evolveCandidates() {
 
 bool LTEScenario::evolveBearers() {
     // The IMS bearer is set up while connected and released now and then.
-    Bearer& ims = bearers_[1];
+    PacketContext& ims = bearers_[1];
     if (connected_ && !ims.active && chance(6)) {
         int32_t host = uniform(1, 0xFFFF);
         ims.address = StringFormat::format("2a01:598:%x:%x::1", static_cast<unsigned>(uniform(0, 0xFFFF)),
@@ -365,7 +339,7 @@ std::vector<Bytes> LTEScenario::step() {
         // The extras first, so the display fills at once.
         out.push_back(simFilesRecord(false));
         out.push_back(cellMonitorRecord(false));
-        out.push_back(bearersRecord(false));
+        out.push_back(packetContextsRecord(bearers_, false));
     }
     if (cellChanged || tick % 10 == 0) out.push_back(servingCellRecord(tick));
     if (cellChanged || tick % 20 == 0) out.push_back(antennaRecord(tick));
@@ -377,7 +351,7 @@ std::vector<Bytes> LTEScenario::step() {
         if (candidatesChanged || tick % 5 == 0) out.push_back(reselectionCandidatesRecord(tick));
     }
     if (tick > 0 && (cellChanged || tick % 10 == 0)) out.push_back(cellMonitorRecord((tick / 10) % 2 == 1));
-    if (tick > 0 && (bearersChanged || tick % 20 == 0)) out.push_back(bearersRecord((tick / 20) % 2 == 1));
+    if (tick > 0 && (bearersChanged || tick % 20 == 0)) out.push_back(packetContextsRecord(bearers_, (tick / 20) % 2 == 1));
     if (tick > 0 && tick % 60 == 0) out.push_back(simFilesRecord((tick / 60) % 2 == 1));
     if (tick % kMalformedPeriod == 12) out.push_back(malformedRecord(tick));
     return out;
@@ -602,21 +576,6 @@ Bytes LTEScenario::cellMonitorRecord(bool binary) const {
     return RecordBuilder::extraPropertyList(LogCode::kCellMonitor, Value(cells), binary);
 }
 
-Bytes LTEScenario::bearersRecord(bool binary) const {
-    // The PDP context (EPS bearer) list: each dictionary is shown as sent, so every value is a display string.
-    auto contexts = Array::create();
-    for (const Bearer& p : bearers_) {
-        if (&p != &bearers_[0] && !p.active) continue;  // the IMS bearer only while it exists
-        auto d = Dictionary::create();
-        d->set("APN", p.apn);
-        d->set("PDP Type", p.type);
-        d->set("PDP Address", p.address);
-        d->set("NSAPI", StringFormat::format("%d", p.nsapi));
-        d->set("State", p.active ? "Active" : "Inactive");
-        contexts->append(Value(d));
-    }
-    return RecordBuilder::extraPropertyList(LogCode::kPDPContexts, Value(contexts), binary);
-}
 
 Bytes LTEScenario::malformedRecord(uint64_t tick) const {
     switch ((tick / kMalformedPeriod) % 3) {
@@ -636,13 +595,10 @@ Bytes LTEScenario::malformedRecord(uint64_t tick) const {
             .build();
     default: {
         // A cell-monitor extra whose XML property list was cut off in transfer.
-        static constexpr std::string_view kCut =
-            "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<plist version=\"1.0\">\n<array>\n\t<dict>\n\t\t<key>kTSCell";
-        Bytes payload(kCut.begin(), kCut.end());
-        return RecordBuilder::extra(LogCode::kCellMonitor)
-            .timestamp(timestampForTick(tick))
-            .bytes(RecordBuilder::kHeaderLength, ByteView(payload))
-            .build();
+        return cutPropertyListRecord(
+            LogCode::kCellMonitor,
+            "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<plist version=\"1.0\">\n<array>\n\t<dict>\n\t\t<key>kTSCell",
+            tick);
     }
     }
 }

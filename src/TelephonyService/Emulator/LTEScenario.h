@@ -44,7 +44,6 @@ public:
 
     std::string technology() const override;
     std::string description() const override;
-    std::vector<Bytes> recordsForTick(uint64_t tick) override;
 
 private:
     // An LTE cell; signal levels in quarter dB (RSRP, RSRQ) and half dB (RSSI).
@@ -68,18 +67,11 @@ private:
         uint8_t band = 0;       // GERAN band indicator
         bool present = false;
     };
-    struct Bearer {
-        std::string apn;
-        std::string type;
-        std::string address;
-        int nsapi = 0;
-        bool active = false;
-    };
     static constexpr size_t kNeighbourPool = 8;
     static constexpr size_t kCandidatePool = 6;
 
-    void restart();
-    std::vector<Bytes> step();
+    void restart() override;
+    std::vector<Bytes> step() override;
 
     // State changes of one tick; those returning bool say whether the display should hear of it.
     void evolveRadio();
@@ -101,10 +93,8 @@ private:
     Bytes reselectionCandidatesRecord(uint64_t tick) const;
     Bytes simFilesRecord(bool binary) const;
     Bytes cellMonitorRecord(bool binary) const;
-    Bytes bearersRecord(bool binary) const;
     Bytes malformedRecord(uint64_t tick) const;
 
-    uint64_t nextTick_ = 0;
 
     // Fixed per seed.
     std::string iccid_;
@@ -128,7 +118,7 @@ private:
     bool connected_ = false;
     int dwell_ = 0;  // ticks left in the current RRC mode
 
-    std::array<Bearer, 2> bearers_{};
+    std::array<PacketContext, 2> bearers_{};
 };
 
 }  // namespace vantorel

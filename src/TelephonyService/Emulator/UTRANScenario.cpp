@@ -49,25 +49,6 @@ uint8_t rawRSCP(int32_t dBm) {
     return static_cast<uint8_t>(std::clamp(dBm + 116, 0, 91));
 }
 
-std::string dottedAddress(int a, int b, int c, int d) {
-    return StringFormat::format("%d.%d.%d.%d", a, b, c, d);
-}
-
-// The Luhn check digit that ends an ICCID (ITU-T E.118).
-char luhnDigit(const std::string& digits) {
-    int sum = 0;
-    bool doubled = true;  // the digit next to the check digit is doubled
-    for (size_t i = digits.size(); i-- > 0;) {
-        int d = digits[i] - '0';
-        if (doubled) {
-            d *= 2;
-            if (d > 9) d -= 9;
-        }
-        sum += d;
-        doubled = !doubled;
-    }
-    return static_cast<char>('0' + (10 - sum % 10) % 10);
-}
 
 }  // namespace
 
@@ -83,13 +64,6 @@ std::string UTRANScenario::description() const {
     return "TD-SCDMA (UTRAN2) cell of 460-00: RRC state changes, drifting neighbours, reselections";
 }
 
-std::vector<Bytes> UTRANScenario::recordsForTick(uint64_t tick) {
-    // The state is a walk from tick 0: going back restarts it from the seed,
-    // skipping ahead runs the ticks in between, so tick n always looks the same.
-    if (tick < nextTick_) restart();
-    while (nextTick_ < tick) step();
-    return step();
-}
 
 // ---- state -------------------------------------------------------------------
 
@@ -157,8 +131,8 @@ void UTRANScenario::restart() {
     rrc_ = kDisconnected;
     dwell_ = uniform(2, 3);  // a short first idle period, so the display soon shows a connection
 
-    pdp_[0] = PDPContext{"cmnet", "0.0.0.0", 5, false};
-    pdp_[1] = PDPContext{"cmwap", "0.0.0.0", 6, false};
+    pdp_[0] = PacketContext{"cmnet", "IP", "0.0.0.0", 5, false};
+    pdp_[1] = PacketContext{"cmwap", "IP", "0.0.0.0", 6, false};
 }
 
 size_t UTRANScenario::presentNeighbours() const {
@@ -296,8 +270,8 @@ void UTRANScenario::chooseTransportChannels() {
 
 bool UTRANScenario::evolvePDP() {
     if (rrc_ != kCellDCH) return false;
-    PDPContext& internet = pdp_[0];
-    PDPContext& wap = pdp_[1];
+    PacketContext& internet = pdp_[0];
+    PacketContext& wap = pdp_[1];
     if (!internet.active) {
         int32_t b = uniform(0, 255);
         int32_t c = uniform(0, 255);
@@ -338,7 +312,7 @@ std::vector<Bytes> UTRANScenario::step() {
         // The extras first, so the display fills at once.
         out.push_back(simFilesRecord(false));
         out.push_back(cellMonitorRecord(false));
-        out.push_back(pdpContextsRecord(false));
+        out.push_back(packetContextsRecord(pdp_, false));
     }
     if (rrcChanged || tick % 5 == 0) out.push_back(rrcStateRecord(tick, tick % 30 != 15));
     if (servingChanged || tick % 10 == 0) out.push_back(servingCellRecord(tick));
@@ -346,7 +320,7 @@ std::vector<Bytes> UTRANScenario::step() {
     if (tick % 4 == 1) out.push_back(gsmNeighbourListRecord(tick));
     if (rrc_ == kCellFach || rrc_ == kCellDCH) out.push_back(blerSIRRecord(tick));
     if (tick > 0 && (servingChanged || tick % 10 == 0)) out.push_back(cellMonitorRecord((tick / 10) % 2 == 1));
-    if (tick > 0 && (pdpChanged || tick % 20 == 0)) out.push_back(pdpContextsRecord((tick / 20) % 2 == 1));
+    if (tick > 0 && (pdpChanged || tick % 20 == 0)) out.push_back(packetContextsRecord(pdp_, (tick / 20) % 2 == 1));
     if (tick > 0 && tick % 60 == 0) out.push_back(simFilesRecord((tick / 60) % 2 == 1));
     if (tick % 25 == 12) out.push_back(malformedRecord(tick));
     return out;
@@ -537,21 +511,6 @@ Bytes UTRANScenario::cellMonitorRecord(bool binary) const {
     return RecordBuilder::extraPropertyList(LogCode::kCellMonitor, Value(cells), binary);
 }
 
-Bytes UTRANScenario::pdpContextsRecord(bool binary) const {
-    // The PDP context list: each dictionary is shown as sent, so every value is a display string.
-    auto contexts = Array::create();
-    for (const PDPContext& p : pdp_) {
-        if (&p != &pdp_[0] && !p.active) continue;  // the WAP context only while it exists
-        auto d = Dictionary::create();
-        d->set("APN", p.apn);
-        d->set("PDP Type", "IP");
-        d->set("PDP Address", p.address);
-        d->set("NSAPI", StringFormat::format("%d", p.nsapi));
-        d->set("State", p.active ? "Active" : "Inactive");
-        contexts->append(Value(d));
-    }
-    return RecordBuilder::extraPropertyList(LogCode::kPDPContexts, Value(contexts), binary);
-}
 
 Bytes UTRANScenario::malformedRecord(uint64_t tick) const {
     switch ((tick / 25) % 3) {
@@ -568,13 +527,10 @@ Bytes UTRANScenario::malformedRecord(uint64_t tick) const {
             .build();
     default: {
         // A SIM-files extra whose XML property list was cut off in transfer.
-        static constexpr std::string_view kCut =
-            "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<plist version=\"1.0\">\n<dict>\n\t<key>kSimFile_ICCID</key>\n\t<str";
-        Bytes payload(kCut.begin(), kCut.end());
-        return RecordBuilder::extra(LogCode::kSimFiles)
-            .timestamp(timestampForTick(tick))
-            .bytes(RecordBuilder::kHeaderLength, ByteView(payload))
-            .build();
+        return cutPropertyListRecord(
+            LogCode::kSimFiles,
+            "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<plist version=\"1.0\">\n<dict>\n\t<key>kSimFile_ICCID</key>\n\t<str",
+            tick);
     }
     }
 }

@@ -44,7 +44,6 @@ public:
 
     std::string technology() const override;
     std::string description() const override;
-    std::vector<Bytes> recordsForTick(uint64_t tick) override;
 
 private:
     // A TD-SCDMA cell: frequency, cell parameter ID (0..127, the "Cell ID" of
@@ -70,17 +69,11 @@ private:
         uint8_t id = 0;
         uint8_t bler = 0;  // percent
     };
-    struct PDPContext {
-        std::string apn;
-        std::string address;
-        int nsapi = 0;
-        bool active = false;
-    };
     static constexpr size_t kNeighbourPool = 9;
     static constexpr size_t kGSMPool = 5;
 
-    void restart();
-    std::vector<Bytes> step();
+    void restart() override;
+    std::vector<Bytes> step() override;
 
     // State changes of one tick; each returns true when the display should hear of it.
     bool evolveRadio();
@@ -99,10 +92,8 @@ private:
     Bytes blerSIRRecord(uint64_t tick);
     Bytes simFilesRecord(bool binary) const;
     Bytes cellMonitorRecord(bool binary) const;
-    Bytes pdpContextsRecord(bool binary) const;
     Bytes malformedRecord(uint64_t tick) const;
 
-    uint64_t nextTick_ = 0;
 
     // Fixed per seed.
     std::string iccid_;
@@ -124,7 +115,7 @@ private:
     std::vector<TransportChannel> trchs_;
     std::vector<uint8_t> cctrchTimeslots_;  // one CCTRCH per entry, its TSNUM
 
-    std::array<PDPContext, 2> pdp_{};
+    std::array<PacketContext, 2> pdp_{};
 };
 
 }  // namespace vantorel
