@@ -84,8 +84,8 @@ void LTEServingCellInfo::updateWithData(ByteView data, int32_t logCode) {
         case LogCode::kLTEMasterInfoBlock:
             if (r.size() < kAntennaMinLength) return;
             setValue("Num Tx Antennas", StringFormat::format("%d", r.u8(20).value_or(0)));
-            // The monitor has always also logged every accepted antenna record as
-            // unknown; kept so that its log reads the same.
+            // Every accepted antenna record is also logged as an unknown code: a
+            // long-standing quirk of this log, kept so that logs compare line for line.
             logUnknownCode(logCode);
             return;
 
