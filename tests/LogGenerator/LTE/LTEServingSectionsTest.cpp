@@ -92,6 +92,7 @@ TEST(LTEIntraFrequencySections, OneRecordFeedsAllThreeAndEntriesStopAtTheRecords
          "[{Physical Cell ID=41, Filtered RSRP=-140.00 dBm, Filtered RSRQ=-20.00 dB}]",
          "[{Physical Cell ID=42}, {Physical Cell ID=43}]"},
         {{two, intraFreq(0, 0, {51, 52, 53}, 35)}, "[]", "[]"},
+        {{intraFreq(0, 0, {}, 29)}, "[]", "[]"},  // the shortest record taken
         {{two, RecordBuilder::ordinary(0xB179, 28).u16(19, 999).build()}, twoNeighbours, "[{Physical Cell ID=13}]"},
     };
     for (const Row& row : rows) {
