@@ -135,20 +135,50 @@ TEST(LTEServingCellMeasurementSection, EveryBitFieldItsConversionAndTheNotPresen
         EXPECT_EQ(Bound<ServingCellMeasurement>().feed(record, 0xB17F).shown(), expected);
 }
 
-// qmdl_example's twelve 0xB0C2 (version 2) records all hold, from offset 13:
-// 02 | 57 00 | 94 16 | E4 5C | 32 | 32 | 0F 0B 6D 08 | 40 87 | 11 00 00 00: PCI 0x57 = 87, downlink
-// E-ARFCN 0x1694 = 5780 and uplink 0x5CE4 = 23780 (band 17's pair), 0x32 = 50 resource blocks =
-// 10 MHz each way, cell identity 0x086D0B0F = 141363983, TAC 0x8740 = 34624, band 0x11 = 17. Its
-// two 0xB0C1 (version 1) records hold 02 at offset 20: two transmit antennas.
-TEST(LTEServingCellInfoSection, TheCapturedServingCellRecordsShowTheServingCell) {
-    const RecordedLog log = QmdlReader::readFile(std::string(VANTOREL_CAPTURES_DIR) + "/qmdl_example.qmdl");
-    ASSERT_TRUE(log.ok() && log.count(0xB0C2) == 12 && log.count(0xB0C1) == 2) << log.error;
-    Bound<LTEServingCellInfo> info;
-    for (const RecordedEntry& e : log.entries)
-        if (e.logCode == 0xB0C2 || e.logCode == 0xB0C1) info.feed(e.record, e.logCode);
-    EXPECT_EQ(info.shown(), "{Physical Cell ID=87, Download Frequency=5780, Upload Frequency=23780, "
-                            "Download Bandwidth=10 MHz, Upload Bandwidth=10 MHz, Cell Identity=141363983, "
-                            "Tracking Area Code=34624, Freq Band Indicator=17, Num Tx Antennas=2}");
+// The last serving-cell records of three real captures, from offset 13:
+// - qmdl_example (twelve 0xB0C2 of version 2, the original layout, all alike):
+//   02 | 57 00 | 94 16 | E4 5C | 32 | 32 | 0F 0B 6D 08 | 40 87 | 11 00 00 00: PCI 0x57 = 87, E-ARFCN
+//   0x1694 = 5780 down and 0x5CE4 = 23780 up (band 17's pair), 0x32 = 50 resource blocks = 10 MHz
+//   each way, cell 0x086D0B0F = 141363983, TAC 0x8740 = 34624, band 0x11 = 17; its two 0xB0C1
+//   (version 1) hold 02 at offset 20: two transmit antennas.
+// - cmcc (the 62nd and last 0xB0C2, version 3): 03 | 51 01 | 0C 94 00 00 | 0C 94 00 00 | 64 | 64 |
+//   03 B9 11 01 | D6 11 | 26 00 00 00 | CC 01 02 00 00: PCI 337, E-ARFCN 0x940C = 37900 both ways
+//   (band 38 is TDD), 100 resource blocks = 20 MHz, cell 0x0111B903 = 17938691, TAC 0x11D6 = 4566,
+//   band 0x26 = 38 (MCC 460, MNC 00); the last 0xB0C1 (version 2): 02 | 51 01 | 0C 94 00 00 | 00 02 |
+//   02 | 64: SFN 512, two antennas.
+// - sprint (the 840th and last 0xB0C2, version 3): 03 | 18 00 | D9 21 00 00 | 29 68 00 00 | 19 | 19 |
+//   01 75 C1 0B | 0A 5E | 19 00 00 00 | ...: PCI 24, E-ARFCN 0x21D9 = 8665 / 0x6829 = 26665, 25
+//   resource blocks = 5 MHz, cell 0x0BC17501 = 197227777, TAC 0x5E0A = 24074, band 25.
+TEST(LTEServingCellInfoSection, TheCapturedServingCellRecordsOfEachLayoutShowTheServingCell) {
+    const std::pair<const char*, const char*> rows[] = {
+        {"qmdl_example.qmdl", "{Physical Cell ID=87, Download Frequency=5780, Upload Frequency=23780, "
+                              "Download Bandwidth=10 MHz, Upload Bandwidth=10 MHz, Cell Identity=141363983, "
+                              "Tracking Area Code=34624, Freq Band Indicator=17, Num Tx Antennas=2}"},
+        {"cmcc.mi2log", "{Num Tx Antennas=2, Physical Cell ID=337, Download Frequency=37900, Upload Frequency=37900, "
+                        "Download Bandwidth=20 MHz, Upload Bandwidth=20 MHz, Cell Identity=17938691, "
+                        "Tracking Area Code=4566, Freq Band Indicator=38}"},
+        {"sprint.mi2log", "{Physical Cell ID=24, Download Frequency=8665, Upload Frequency=26665, "
+                          "Download Bandwidth=5 MHz, Upload Bandwidth=5 MHz, Cell Identity=197227777, "
+                          "Tracking Area Code=24074, Freq Band Indicator=25, Num Tx Antennas=2}"},
+    };
+    for (const auto& [file, expected] : rows) {
+        const RecordedLog log = QmdlReader::readFile(std::string(VANTOREL_CAPTURES_DIR) + "/" + file);
+        ASSERT_TRUE(log.ok()) << log.error;
+        Bound<LTEServingCellInfo> info;
+        for (const RecordedEntry& e : log.entries)
+            if (e.logCode == 0xB0C2 || e.logCode == 0xB0C1) info.feed(e.record, e.logCode);
+        EXPECT_EQ(info.shown(), expected) << file;
+    }
+    // A version-3 payload published with a peer tool: E-ARFCN 1825/19825, band 3, 15 MHz, PCI 77,
+    // TAC 0x9B15 = 39701, cell 0x09B0C833 = 162580531; one byte short of its 42, it is ignored.
+    const Bytes v3 = RecordBuilder::ordinary(0xB0C2, 42)
+                         .bytes(13, {0x03, 0x4d, 0x00, 0x21, 0x07, 0x00, 0x00, 0x71, 0x4d, 0x00, 0x00, 0x4b, 0x4b, 0x33,
+                                     0xc8, 0xb0, 0x09, 0x15, 0x9b, 0x03, 0x00, 0x00, 0x00, 0xcc, 0x01, 0x02, 0x0b, 0x00, 0x00})
+                         .build();
+    EXPECT_EQ(Bound<LTEServingCellInfo>().feed(Bytes(v3.begin(), v3.end() - 1), 0xB0C2).shown(), "{}");
+    EXPECT_EQ(Bound<LTEServingCellInfo>().feed(v3, 0xB0C2).shown(),
+              "{Physical Cell ID=77, Download Frequency=1825, Upload Frequency=19825, Download Bandwidth=15 MHz, "
+              "Upload Bandwidth=15 MHz, Cell Identity=162580531, Tracking Area Code=39701, Freq Band Indicator=3}");
 }
 
 }  // namespace
