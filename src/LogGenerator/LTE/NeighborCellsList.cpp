@@ -20,12 +20,26 @@ constexpr size_t kCountOffset = 19;
 constexpr size_t kFirstEntry = 21;
 constexpr size_t kEntrySize = 20;
 
+// Versions 4 and 5 (today's phones) count the cells as they are, in bits 6-15 of the u16
+// at 19 (version 4) or bits 6-31 of the u32 at 21 (version 5, whose E-ARFCN is a u32),
+// and give each cell 32 bytes from 21 (version 4) or 25 (version 5), levels in 1/16 dB.
+// Cells past the record's end are not read, whatever the count claims.
+struct SixteenthLayout {
+    size_t minLength, countWidth, countOffset, firstEntry;
+};
+constexpr SixteenthLayout kLayoutV4 = {21, 2, 19, 21};
+constexpr SixteenthLayout kLayoutV5 = {25, 4, 21, 25};
+constexpr size_t kSixteenthEntrySize = 32;
+
 enum class Scale {
     Identity,  // "%d", and logged
     Decimal,   // "%d"
     Power,     // x * 0.5 - 140, "%4.2f dBm": half-dB steps, unlike the serving cell's quarter-dB RSRP
     Quality,   // x * 0.25 - 30, "%4.2f dB"
     Srxlev,    // x - 30, "%d dBm"
+    RSSI16,    // x / 16 - 110, "%4.2f dBm"
+    RSRP16,    // x / 16 - 180, "%4.2f dBm"
+    RSRQ16,    // x / 16 - 30, "%4.2f dB"
 };
 
 // A bit field of an entry: bits [shift, shift + bits) of the little-endian 32-bit word
@@ -56,11 +70,23 @@ const Field kEntryFields[] = {
     {"Ant 1 Sample Offset", 12, 11, 19, Scale::Decimal},
 };
 
+// The 32-byte cell of versions 4 and 5; it carries no frequency or timing offsets.
+const Field kSixteenthEntryFields[] = {
+    {"Physical Cell ID", 0, 0, 9, Scale::Identity},
+    {"Measured RSSI", 0, 9, 11, Scale::RSSI16},
+    {"Measured RSRP", 0, 20, 12, Scale::RSRP16},
+    {"Average RSRP", 4, 12, 12, Scale::RSRP16},
+    {"Measured RSRQ", 8, 12, 10, Scale::RSRQ16},
+    {"Average RSRQ", 12, 0, 10, Scale::RSRQ16},
+    {"Srxlev", 12, 20, 6, Scale::Srxlev},
+};
+
 // One row; the identity and every decibel value are also logged. Each decibel line
 // carries the "Measured RSSI" label whatever it measures; the one label is deliberate.
-Value neighbourRow(const ByteReader& entry) {
+template <size_t N>
+Value neighbourRow(const ByteReader& entry, const Field (&fields)[N]) {
     auto row = Dictionary::create();
-    for (const Field& f : kEntryFields) {
+    for (const Field& f : fields) {
         const int x = static_cast<int>((entry.u32(f.offset).value_or(0) >> f.shift) & ((1u << f.bits) - 1));
         std::string text;
         double db = 0;
@@ -76,9 +102,18 @@ Value neighbourRow(const ByteReader& entry) {
                 text = StringFormat::format("%4.2f dB", db);
                 break;
             case Scale::Srxlev: text = StringFormat::format("%d dBm", x - 30); break;
+            case Scale::RSSI16:
+            case Scale::RSRP16:
+                db = x / 16.0 - (f.scale == Scale::RSSI16 ? 110 : 180);
+                text = StringFormat::format("%4.2f dBm", db);
+                break;
+            case Scale::RSRQ16:
+                db = x / 16.0 - 30;
+                text = StringFormat::format("%4.2f dB", db);
+                break;
         }
         row->set(f.key, Value(text));
-        if (f.scale == Scale::Power || f.scale == Scale::Quality)
+        if (f.scale != Scale::Identity && f.scale != Scale::Decimal && f.scale != Scale::Srxlev)
             SystemLog::log(SystemLog::kWarning, "Measured RSSI: %lf\n", db);
         else if (f.scale == Scale::Identity)
             SystemLog::log(SystemLog::kWarning, "Physical Cell ID: %d\n", x);
@@ -98,12 +133,26 @@ void NeighborCellsList::updateWithData(ByteView data, int32_t logCode) {
         logUnknownCode(logCode);
         return;
     }
+    const auto version = ByteReader(data).u8(13);
+    if (version == 4 || version == 5) {
+        const SixteenthLayout& at = version == 4 ? kLayoutV4 : kLayoutV5;
+        rebuildList(data, at.minLength, true, [&at](const ByteReader& r) {
+            const uint32_t field =
+                at.countWidth == 4 ? r.u32(at.countOffset).value_or(0) : r.u16(at.countOffset).value_or(0);
+            const unsigned count = field >> 6;
+            SystemLog::log(SystemLog::kWarning, "Number of neighboring cells being reported: %u\n", count);
+            return readEntries(r, at.firstEntry, kSixteenthEntrySize, kSixteenthEntrySize, count,
+                               [](const ByteReader& entry) { return neighbourRow(entry, kSixteenthEntryFields); });
+        });
+        return;
+    }
     rebuildList(data, kMinLength, true, [](const ByteReader& r) {
         const unsigned count = ((r.u16(kCountOffset).value_or(0) >> 6) & 0x1F) + 1;
         SystemLog::log(SystemLog::kWarning, "Number of neighboring cells being reported: %d\n",
                        static_cast<int>(count));
         // A count past the record's end stops at the last whole entry.
-        return readEntries(r, kFirstEntry, kEntrySize, kEntrySize, count, neighbourRow);
+        return readEntries(r, kFirstEntry, kEntrySize, kEntrySize, count,
+                           [](const ByteReader& entry) { return neighbourRow(entry, kEntryFields); });
     });
 }
 

@@ -7,6 +7,9 @@
 #include "Platform/StringFormat.h"
 #include "Platform/SystemLog.h"
 
+#include <utility>
+#include <vector>
+
 namespace vantorel {
 
 namespace {
@@ -33,6 +36,23 @@ namespace {
 //   w29 bit  25              "Measurement Rules Updated"
 //   w29 bits 26-29           "Measurement Rules"
 constexpr size_t kMinLength = 33;
+
+// Versions 4 and 5 (today's phones) carry only the measurements, in 1/16 dB steps, and
+// the display shows no selection parameters for them (offsets as above):
+//                                       version 4  version 5
+//   "E-ARFCN"                           u16 17     u32 17
+//   u16 bits 0-8 PCI, 9-15 priority     19         21 (then 2 pad bytes)
+//   u32 bits 0-11 "Measured RSRP"       21         25   x/16 - 180 dBm
+//   u32 bits 0-11 "Average RSRP"        25         29
+//   u32 bits 0-9 "Measured RSRQ",       29         33   x/16 - 30 dB
+//       bits 20-29 "Average RSRQ"
+//   u32 bits 10-20 "Measured RSSI"      33         37   x/16 - 110 dBm
+// A record ending inside its layout is ignored.
+struct SixteenthLayout {
+    size_t minLength, earfcn, earfcnWidth, cell, rsrp, averageRsrp, rsrq, rssi;
+};
+constexpr SixteenthLayout kLayoutV4 = {37, 17, 2, 19, 21, 25, 29, 33};
+constexpr SixteenthLayout kLayoutV5 = {41, 17, 4, 21, 25, 29, 33, 37};
 constexpr unsigned kPowerNotPresent = 64;
 constexpr unsigned kSearchNotPresent = 32;
 
@@ -43,6 +63,28 @@ unsigned bits(uint32_t word, unsigned first, unsigned last) {
 // "Not Present" when the field holds its marker, else the value's text.
 std::string presentOr(unsigned field, unsigned notPresent, std::string text) {
     return field == notPresent ? "Not Present" : text;
+}
+
+std::string sixteenths(uint32_t raw, int offset, const char* unit) {
+    return StringFormat::format("%4.2f %s", raw / 16.0 + offset, unit);
+}
+
+// The display values of a version-4 or -5 record, in display order.
+std::vector<std::pair<const char*, std::string>> sixteenthLayoutValues(const ByteReader& r, const SixteenthLayout& at) {
+    const uint32_t earfcn = at.earfcnWidth == 4 ? r.u32(at.earfcn).value_or(0) : r.u16(at.earfcn).value_or(0);
+    const uint32_t cell = r.u16(at.cell).value_or(0);
+    const uint32_t rsrq = r.u32(at.rsrq).value_or(0);
+    return {
+        {"Version", StringFormat::format("%d", r.u8(13).value_or(0))},
+        {"E-ARFCN", StringFormat::format("%u", earfcn)},
+        {"Physical Cell ID", StringFormat::format("%u", bits(cell, 0, 8))},
+        {"Serving Layer Priority", StringFormat::format("%u", bits(cell, 9, 15))},
+        {"Measured RSRP", sixteenths(bits(r.u32(at.rsrp).value_or(0), 0, 11), -180, "dBm")},
+        {"Average RSRP", sixteenths(bits(r.u32(at.averageRsrp).value_or(0), 0, 11), -180, "dBm")},
+        {"Measured RSRQ", sixteenths(bits(rsrq, 0, 9), -30, "dB")},
+        {"Average RSRQ", sixteenths(bits(rsrq, 20, 29), -30, "dB")},
+        {"Measured RSSI", sixteenths(bits(r.u32(at.rssi).value_or(0), 10, 20), -110, "dBm")},
+    };
 }
 
 }  // namespace
@@ -58,6 +100,13 @@ void ServingCellMeasurement::updateWithData(ByteView data, int32_t logCode) {
         return;
     }
     const ByteReader r(data);
+    const auto version = r.u8(13);
+    if (version == 4 || version == 5) {
+        const SixteenthLayout& at = version == 4 ? kLayoutV4 : kLayoutV5;
+        if (r.size() < at.minLength) return;
+        for (const auto& [key, text] : sixteenthLayoutValues(r, at)) setValue(key, text);
+        return;
+    }
     if (r.size() < kMinLength) return;
     const uint32_t cell = r.u32(19).value_or(0);
     const uint32_t quality = r.u32(21).value_or(0);

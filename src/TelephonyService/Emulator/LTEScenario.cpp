@@ -440,7 +440,7 @@ Bytes LTEScenario::servingMeasurementRecord(uint64_t tick) {
                          (static_cast<uint32_t>(rules) << 26);
     return RecordBuilder::ordinary(LogCode::kLTEServingCellMeasurement, 33)
         .timestamp(timestampForTick(tick))
-        .u8(13, 4)                         // 13: record version
+        .u8(13, 1)                         // 13: record version
         .u16(17, carrier.earfcn)           // 17-18: EARFCN
         .u32(19, w19)
         .u32(21, w21)

@@ -17,7 +17,7 @@ using namespace sectiontest;
 struct Neighbour { uint32_t pci, rssi, rsrp, avgRsrp, rsrq, avgRsrq, srxlev, freqOffset, frame, sample; };
 Bytes neighbourRecord(unsigned countField, std::vector<Neighbour> cells, size_t length) {
     RecordBuilder b =
-        RecordBuilder::ordinary(0xB180, length).u8(13, 4).u16(17, 5230).u16(19, (countField << 6) | 0xF83F);
+        RecordBuilder::ordinary(0xB180, length).u8(13, 1).u16(17, 5230).u16(19, (countField << 6) | 0xF83F);
     for (size_t i = 0, at = 21; i < cells.size(); ++i, at += 20) {
         const Neighbour& n = cells[i];
         b.u32(at, n.pci | n.rssi << 9 | n.rsrp << 17)
@@ -50,12 +50,48 @@ TEST(LTENeighbourSections, CountIsTheFieldPlusOneEntriesStopAtTheRecordsEndAndSh
         EXPECT_EQ(Bound<NeighborCellsList>(true).feed(records, 0xB180).shown(), expected);
 
     const std::pair<Bytes, const char*> misc[] = {
-        {both, "{Version=4, E-ARFCN=5230, Qrxlevmin=-14 dBm}"},
+        {both, "{Version=1, E-ARFCN=5230, Qrxlevmin=-14 dBm}"},
         {RecordBuilder::ordinary(0xB180, 21).u8(19, 0xC0).build(), "{Version=0, E-ARFCN=0, Qrxlevmin=-140 dBm}"},
-        {RecordBuilder::ordinary(0xB180, 20).u8(13, 4).build(), "{}"},
+        {RecordBuilder::ordinary(0xB180, 20).u8(13, 1).build(), "{}"},
     };
     for (const auto& [record, expected] : misc)
         EXPECT_EQ(Bound<NeighborMeasurementMisc>().feed(record, 0xB180).shown(), expected);
+}
+
+// Versions 4 and 5: Qrxlevmin 22 (-96 dBm) and the count as it is, then 32-byte cells in 1/16 dB
+// from 21 (version 4, E-ARFCN u16 17) or 25 (version 5, E-ARFCN u32 17, count in the u32 at 21).
+// Cell A: PCI 503, RSSI 800 (-60 dBm), RSRP 1600 / average 1604 (-80, -79.75 dBm), RSRQ 200 /
+// average 184 (-17.5, -18.5 dB), Srxlev 40 (10), every unread bit set; cell B: PCI 1, Srxlev 63.
+Bytes sixteenthNeighbours(uint8_t version, unsigned count, size_t length) {
+    const size_t v5 = version == 5 ? 4 : 0;
+    RecordBuilder b = RecordBuilder::ordinary(0xB180, length).u8(13, version);
+    (v5 ? b.u32(17, 66486).u32(21, count << 6 | 22) : b.u16(17, 1300).u16(19, count << 6 | 22))
+        .u32(21 + v5, 503 | 800 << 9 | 1600u << 20).u32(25 + v5, 0xFF000FFF | 1604 << 12)
+        .u32(29 + v5, 0xFFC00FFF | 200 << 12).u32(33 + v5, 0xFC0FFC00 | 184 | 40 << 20)
+        .u32(53 + v5, 1).u32(65 + v5, 63 << 20);
+    return b.resize(length).build();
+}
+
+TEST(LTENeighbourSections, VersionsFourAndFiveCountCellsAsTheyAreInSixteenthsOfADecibel) {
+    const std::string a = "{Physical Cell ID=503, Measured RSSI=-60.00 dBm, Measured RSRP=-80.00 dBm, "
+                          "Average RSRP=-79.75 dBm, Measured RSRQ=-17.50 dB, Average RSRQ=-18.50 dB, Srxlev=10 dBm}";
+    const std::string ab = "[" + a + ", {Physical Cell ID=1, Measured RSSI=-110.00 dBm, Measured RSRP=-180.00 dBm, "
+                           "Average RSRP=-180.00 dBm, Measured RSRQ=-30.00 dB, Average RSRQ=-30.00 dB, Srxlev=33 dBm}]";
+    const Bytes v5 = sixteenthNeighbours(5, 2, 89);
+    struct Row { std::vector<Bytes> records; std::string list, misc; };
+    const Row rows[] = {
+        {{sixteenthNeighbours(4, 2, 85)}, ab, "{Version=4, E-ARFCN=1300, Qrxlevmin=-96 dBm}"},
+        {{v5}, ab, "{Version=5, E-ARFCN=66486, Qrxlevmin=-96 dBm}"},
+        {{sixteenthNeighbours(5, 1, 89)}, "[" + a + "]", "{Version=5, E-ARFCN=66486, Qrxlevmin=-96 dBm}"},
+        {{sixteenthNeighbours(4, 1023, 84)}, "[" + a + "]", "{Version=4, E-ARFCN=1300, Qrxlevmin=-96 dBm}"},
+        {{v5, sixteenthNeighbours(5, 0, 89)}, "[]", "{Version=5, E-ARFCN=66486, Qrxlevmin=-96 dBm}"},
+        {{v5, sixteenthNeighbours(5, 2, 24)}, ab, "{Version=5, E-ARFCN=66486, Qrxlevmin=-96 dBm}"},
+        {{sixteenthNeighbours(5, 2, 24)}, "[]", "{}"},
+    };
+    for (const Row& row : rows) {
+        EXPECT_EQ(Bound<NeighborCellsList>(true).feed(row.records, 0xB180).shown(), row.list);
+        EXPECT_EQ(Bound<NeighborMeasurementMisc>().feed(row.records, 0xB180).shown(), row.misc);
+    }
 }
 
 // 0xB186: version 3, serving E-ARFCN 1300, cell 65535, the count at 19, then 16-bit words

@@ -111,14 +111,46 @@ uint32_t word(std::initializer_list<std::pair<uint32_t, unsigned>> fields) {
     return w;
 }
 
-TEST(LTEServingCellMeasurementSection, EveryBitFieldItsConversionAndTheNotPresentMarkers) {
-    const std::pair<Bytes, const char*> rows[] = {
-        {RecordBuilder::ordinary(0xB17F, 33).u8(13, 4).u16(17, 6300)
+// Versions 4 and 5: PCI 300 and priority 7, then RSRP 1600 / average 1604 (-80, -79.75 dBm), RSRQ
+// 200 / average 184 (-17.5, -18.5 dB) and RSSI 800 (-60 dBm) in 1/16 dB, with every other bit set.
+Bytes sixteenths(uint8_t version, size_t length) {
+    const size_t v5 = version == 5 ? 4 : 0;  // the u32 E-ARFCN moves PCI 2 bytes on, the rest 4
+    RecordBuilder b = RecordBuilder::ordinary(0xB17F, length).u8(13, version);
+    (v5 ? b.u32(17, 66486) : b.u16(17, 6300)).u16(19 + v5 / 2, 300 | 7 << 9)
+        .u32(21 + v5, 0xFFFFF000 | 1600).u32(25 + v5, 0xFFFFF000 | 1604)
+        .u32(29 + v5, word({{200, 0}, {0x3FF, 10}, {184, 20}, {3, 30}}))
+        .u32(33 + v5, word({{0x3FF, 0}, {800, 10}, {0x7FF, 21}}));
+    return b.resize(length).build();
+}
+
+// The only 0xB17F of offline_log_example.mi2log (version 5), from offset 13: 05 01 00 00 |
+// 94 16 00 00 | 95 01 | 00 00 | 37 75 53 00 | 37 75 53 00 | 27 9D 74 12 | 27 81 0A 00 | ...: E-ARFCN
+// 0x1694 = 5780, 0x195 = PCI 405 and priority 0, RSRP and average 0x537 = 1335: 1335/16 - 180 =
+// -96.5625 dBm, RSRQ 0x127 = 295 (bits 0-9 and 20-29 of 0x12749D27): 295/16 - 30 = -11.5625 dB,
+// RSSI bits 10-20 of 0x000A8127 = 0x2A0 = 672: 672/16 - 110 = -68 dBm (RSRP + 10 log 600 REs).
+TEST(LTEServingCellMeasurementSection, EachLayoutsBitFieldsTheirConversionAndTheNotPresentMarkers) {
+    const RecordedLog log = QmdlReader::readFile(std::string(VANTOREL_CAPTURES_DIR) + "/offline_log_example.mi2log");
+    ASSERT_TRUE(log.ok()) << log.error;
+    Bytes captured;
+    for (const RecordedEntry& e : log.entries)
+        if (e.logCode == 0xB17F) captured = e.record;
+    const char* const built = ", Physical Cell ID=300, Serving Layer Priority=7, Measured RSRP=-80.00 dBm, "
+                              "Average RSRP=-79.75 dBm, Measured RSRQ=-17.50 dB, Average RSRQ=-18.50 dB, "
+                              "Measured RSSI=-60.00 dBm}";
+    const std::pair<Bytes, std::string> rows[] = {
+        {captured, "{Version=5, E-ARFCN=5780, Physical Cell ID=405, Serving Layer Priority=0, "
+                   "Measured RSRP=-96.56 dBm, Average RSRP=-96.56 dBm, Measured RSRQ=-11.56 dB, "
+                   "Average RSRQ=-11.56 dB, Measured RSSI=-68.00 dBm}"},
+        {sixteenths(4, 37), std::string("{Version=4, E-ARFCN=6300") + built},
+        {sixteenths(5, 41), std::string("{Version=5, E-ARFCN=66486") + built},
+        {sixteenths(4, 36), "{}"},
+        {sixteenths(5, 40), "{}"},
+        {RecordBuilder::ordinary(0xB17F, 33).u8(13, 1).u16(17, 6300)
              .u32(19, word({{300, 0}, {9, 9}}))
              .u32(21, word({{400, 0}, {401, 9}, {100, 18}, {101, 25}}))
              .u32(25, word({{300, 0}, {33, 9}, {23, 15}, {63, 22}, {0xF, 28}}))
              .u32(29, word({{127, 0}, {45, 7}, {31, 13}, {32, 19}, {1, 25}, {11, 26}, {3, 30}})).build(),
-         "{Version=4, E-ARFCN=6300, Physical Cell ID=300, Serving Layer Priority=9, Measured RSRP=-40.00 dBm, "
+         "{Version=1, E-ARFCN=6300, Physical Cell ID=300, Serving Layer Priority=9, Measured RSRP=-40.00 dBm, "
          "Average RSRP=-39.75 dBm, Measured RSRQ=-5.00 dB, Average RSRQ=-4.75 dB, Measured RSSI=10.00 dBm, "
          "Qrxlevmin=-74 dBm, P_Max=-7 dBm, Max UE Tx Power=33 dBm, Srxlev=97 dBm, "
          "Num of Consecutive DRX Cycles of S < 0=45, S Intra Search=62 dB, S Non Intra Search=Not Present, "
@@ -129,7 +161,7 @@ TEST(LTEServingCellMeasurementSection, EveryBitFieldItsConversionAndTheNotPresen
          "Qrxlevmin=-140 dBm, P_Max=Not Present, Max UE Tx Power=-30 dBm, Srxlev=-30 dBm, "
          "Num of Consecutive DRX Cycles of S < 0=0, S Intra Search=Not Present, S Non Intra Search=10 dBm, "
          "Measurement Rules Updated=False, Measurement Rules=0}"},
-        {RecordBuilder::ordinary(0xB17F, 32).u8(13, 4).build(), "{}"},
+        {RecordBuilder::ordinary(0xB17F, 32).u8(13, 1).build(), "{}"},
     };
     for (const auto& [record, expected] : rows)
         EXPECT_EQ(Bound<ServingCellMeasurement>().feed(record, 0xB17F).shown(), expected);
