@@ -8,6 +8,34 @@
 
 namespace vantorel {
 
+namespace {
+
+std::string originalRsrp(const ByteReader& r, size_t offset) {
+    return ConnectedModeMeasurementMisc::rsrpText(r.u16(offset).value_or(0));
+}
+std::string originalRsrq(const ByteReader& r, size_t offset) {
+    return ConnectedModeMeasurementMisc::rsrqText(r.u16(offset).value_or(0));
+}
+// Version 4 words carry sixteenths of a dB: RSRP in bits 0-11 above -180 dBm, RSRQ in bits
+// 0-9 above -30 dB (the upper halves of the words repeat the values in the real records).
+std::string sixteenthsRsrp(const ByteReader& r, size_t offset) {
+    return StringFormat::format("%4.2f dBm", (r.u32(offset).value_or(0) & 0xFFF) / 16.0 - 180);
+}
+std::string sixteenthsRsrq(const ByteReader& r, size_t offset) {
+    return StringFormat::format("%4.2f dB", (r.u32(offset).value_or(0) & 0x3FF) / 16.0 - 30);
+}
+
+constexpr ConnectedModeMeasurementMisc::Layout kLayout = {29, 17, 2, 19, 21, 23, 25, 27, 28, 29,
+                                                          6,  2,  4, 2,  originalRsrp, originalRsrq};
+constexpr ConnectedModeMeasurementMisc::Layout kLayoutV4 = {41, 21, 4, 25, 27, 29, 33, 37, 38, 41,
+                                                            12, 2,  6, 16, sixteenthsRsrp, sixteenthsRsrq};
+
+}  // namespace
+
+const ConnectedModeMeasurementMisc::Layout& ConnectedModeMeasurementMisc::layoutOf(const ByteReader& record) {
+    return record.u8(13) == 4 ? kLayoutV4 : kLayout;
+}
+
 std::string ConnectedModeMeasurementMisc::rsrpText(unsigned raw) {
     return StringFormat::format("%4.2f dBm", raw * 0.25 - 140);
 }
@@ -31,12 +59,14 @@ void ConnectedModeMeasurementMisc::updateWithData(ByteView data, int32_t logCode
         return;
     }
     const ByteReader r(data);
-    if (r.size() < kMinLength) return;
-    setValue("E-ARFCN", StringFormat::format("%d", r.u16(17).value_or(0)));
-    setValue("Serving Physical Cell ID", StringFormat::format("%d", r.u16(19).value_or(0)));
-    setValue("Subframe Number", StringFormat::format("%d", r.u16(21).value_or(0)));
-    setValue("Serving Filtered RSRP", rsrpText(r.u16(23).value_or(0)));
-    setValue("Serving Filtered RSRQ", rsrqText(r.u16(25).value_or(0)));
+    const Layout& at = layoutOf(r);
+    if (r.size() < at.minLength) return;
+    const unsigned earfcn = at.earfcnWidth == 4 ? r.u32(at.earfcn).value_or(0) : r.u16(at.earfcn).value_or(0);
+    setValue("E-ARFCN", StringFormat::format("%u", earfcn));
+    setValue("Serving Physical Cell ID", StringFormat::format("%d", r.u16(at.pci).value_or(0)));
+    setValue("Subframe Number", StringFormat::format("%d", r.u16(at.subframe).value_or(0)));
+    setValue("Serving Filtered RSRP", at.rsrpAt(r, at.rsrp));
+    setValue("Serving Filtered RSRQ", at.rsrqAt(r, at.rsrq));
 }
 
 }  // namespace vantorel

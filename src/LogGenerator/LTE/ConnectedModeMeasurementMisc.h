@@ -1,4 +1,4 @@
-// ConnectedModeMeasurementMisc: the "Connected mode LTE Intra-frequency Measurement" section (serving cell of record 0xB179); holds the 0xB179 layout and conversions.
+// ConnectedModeMeasurementMisc: the "Connected mode LTE Intra-frequency Measurement" section (serving cell of record 0xB179); holds the 0xB179 layouts and conversions.
 #pragma once
 
 #include "LogGenerator/Base.h"
@@ -7,25 +7,30 @@ namespace vantorel {
 
 class ConnectedModeMeasurementMisc : public Base {
 public:
-    // Record 0xB179 (offsets from the record's first byte; at least 29 bytes, shorter
-    // records are ignored by all three sections that read it):
-    //   17..18          u16 LE  E-ARFCN
-    //   19..20          u16 LE  serving physical cell identity
-    //   21..22          u16 LE  subframe number
-    //   23..24          u16 LE  serving filtered RSRP (rsrpText)
-    //   25..26          u16 LE  serving filtered RSRQ (rsrqText)
-    //   27              u8      number of measured neighbour cells n
-    //   28              u8      number of detected cells d
-    //   29 + 6i         neighbour entry i, i < n: PCI u16, filtered RSRP u16, filtered RSRQ u16
-    //   29 + 6n + 2j    detected-cell entry j, j < d: PCI u16
-    // The counts are the modem's word: entries that do not lie wholly inside the record
-    // are not read.
-    static constexpr size_t kMinLength = 29;
-    static constexpr size_t kNeighbourCount = 27;
-    static constexpr size_t kDetectedCount = 28;
-    static constexpr size_t kFirstEntry = 29;
-    static constexpr size_t kNeighbourEntrySize = 6;
-    static constexpr size_t kDetectedEntrySize = 2;
+    // Record 0xB179. Byte 13 is the record's layout version; version 4 (today's phones) has
+    // its own layout, every other version keeps the original one. Offsets from the record's
+    // first byte, little-endian:
+    //                                original     version 4
+    //   E-ARFCN                      u16 17       u32 21
+    //   serving physical cell id     u16 19       u16 25
+    //   subframe number              u16 21       u16 27
+    //   serving filtered RSRP        u16 23       bits 0-11 of u32 29
+    //   serving filtered RSRQ        u16 25       bits 0-9 of u32 33
+    //   neighbour count n            u8  27       u8  37
+    //   detected-cell count d        u8  28       u8  38
+    //   first neighbour entry        29           41
+    //   neighbour entry i            6 bytes      12 bytes: PCI u16 0, RSRP u32 2, RSRQ u32 6
+    //   then detected-cell entry j   2 bytes      16 bytes: PCI u16 0
+    // Records shorter than the first entry's offset are ignored by all three sections that
+    // read them. The counts are the modem's word: entries that do not lie wholly inside the
+    // record are not read.
+    struct Layout {
+        size_t minLength, earfcn, earfcnWidth, pci, subframe, rsrp, rsrq, neighbourCount, detectedCount, firstEntry;
+        size_t neighbourSize, neighbourRsrp, neighbourRsrq, detectedSize;
+        std::string (*rsrpAt)(const ByteReader& r, size_t offset);  // "%4.2f dBm"
+        std::string (*rsrqAt)(const ByteReader& r, size_t offset);  // "%4.2f dB"
+    };
+    static const Layout& layoutOf(const ByteReader& record);
 
     // RSRP in quarter dB above -140 dBm, "%4.2f dBm" (the idle-mode record uses it too).
     static std::string rsrpText(unsigned raw);

@@ -12,10 +12,9 @@ namespace vantorel {
 
 namespace {
 
-using Layout = ConnectedModeMeasurementMisc;  // the 0xB179 layout is described there
+using Misc = ConnectedModeMeasurementMisc;  // the 0xB179 layouts are described there
 
-// Detected-cell entry (offsets from the entry's first byte):
-//   0..1  u16 LE  "Physical Cell ID"
+// Detected-cell entry: "Physical Cell ID" u16 at its first byte.
 
 }  // namespace
 
@@ -29,18 +28,18 @@ void DetectedCells::updateWithData(ByteView data, int32_t logCode) {
         logUnknownCode(logCode);
         return;
     }
-    rebuildList(data, Layout::kMinLength, true, [](const ByteReader& r) -> ArrayRef {
-        const unsigned count = r.u8(Layout::kDetectedCount).value_or(0);
+    const Misc::Layout& at = Misc::layoutOf(ByteReader(data));
+    rebuildList(data, at.minLength, true, [&at](const ByteReader& r) -> ArrayRef {
+        const unsigned count = r.u8(at.detectedCount).value_or(0);
         if (count == 0) return nullptr;
         // The detected cells follow all n neighbour entries the record announces.
-        const unsigned neighbours = r.u8(Layout::kNeighbourCount).value_or(0);
-        const size_t first = Layout::kFirstEntry + Layout::kNeighbourEntrySize * neighbours;
-        return readEntries(r, first, Layout::kDetectedEntrySize, Layout::kDetectedEntrySize, count,
-                           [](const ByteReader& e) {
-                               auto row = Dictionary::create();
-                               row->set("Physical Cell ID", Value(StringFormat::format("%d", e.u16(0).value_or(0))));
-                               return Value(row);
-                           });
+        const unsigned neighbours = r.u8(at.neighbourCount).value_or(0);
+        const size_t first = at.firstEntry + at.neighbourSize * neighbours;
+        return readEntries(r, first, at.detectedSize, at.detectedSize, count, [](const ByteReader& e) {
+            auto row = Dictionary::create();
+            row->set("Physical Cell ID", Value(StringFormat::format("%d", e.u16(0).value_or(0))));
+            return Value(row);
+        });
     });
 }
 

@@ -12,12 +12,10 @@ namespace vantorel {
 
 namespace {
 
-using Layout = ConnectedModeMeasurementMisc;  // the 0xB179 layout is described there
+using Misc = ConnectedModeMeasurementMisc;  // the 0xB179 layouts are described there
 
-// Neighbour entry (offsets from the entry's first byte):
-//   0..1  u16 LE  "Physical Cell ID"
-//   2..3  u16 LE  "Filtered RSRP"
-//   4..5  u16 LE  "Filtered RSRQ"
+// Neighbour entry: "Physical Cell ID" u16 at its first byte, then "Filtered RSRP" and
+// "Filtered RSRQ" where the record's layout puts them.
 
 }  // namespace
 
@@ -32,17 +30,17 @@ void MeasuredNeighborCells::updateWithData(ByteView data, int32_t logCode) {
         return;
     }
     // Every record empties the list first; with no neighbours it stays empty.
-    rebuildList(data, Layout::kMinLength, true, [](const ByteReader& r) -> ArrayRef {
-        const unsigned count = r.u8(Layout::kNeighbourCount).value_or(0);
+    const Misc::Layout& at = Misc::layoutOf(ByteReader(data));
+    rebuildList(data, at.minLength, true, [&at](const ByteReader& r) -> ArrayRef {
+        const unsigned count = r.u8(at.neighbourCount).value_or(0);
         if (count == 0) return nullptr;
-        return readEntries(r, Layout::kFirstEntry, Layout::kNeighbourEntrySize, Layout::kNeighbourEntrySize, count,
-                           [](const ByteReader& e) {
-                               auto row = Dictionary::create();
-                               row->set("Physical Cell ID", Value(StringFormat::format("%d", e.u16(0).value_or(0))));
-                               row->set("Filtered RSRP", Value(Layout::rsrpText(e.u16(2).value_or(0))));
-                               row->set("Filtered RSRQ", Value(Layout::rsrqText(e.u16(4).value_or(0))));
-                               return Value(row);
-                           });
+        return readEntries(r, at.firstEntry, at.neighbourSize, at.neighbourSize, count, [&at](const ByteReader& e) {
+            auto row = Dictionary::create();
+            row->set("Physical Cell ID", Value(StringFormat::format("%d", e.u16(0).value_or(0))));
+            row->set("Filtered RSRP", Value(at.rsrpAt(e, at.neighbourRsrp)));
+            row->set("Filtered RSRQ", Value(at.rsrqAt(e, at.neighbourRsrq)));
+            return Value(row);
+        });
     });
 }
 

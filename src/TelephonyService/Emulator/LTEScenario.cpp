@@ -398,7 +398,7 @@ Bytes LTEScenario::connectedMeasurementRecord(uint64_t tick, bool withPrefix) co
     const uint16_t subframe = static_cast<uint16_t>((tick * 500 + serving_.pci) % 10240);  // SFN x 10 + subframe
     RecordBuilder b = RecordBuilder::ordinary(LogCode::kLTEIntraFreqMeasurement, 29 + 6 * n + 2 * d);
     b.timestamp(timestampForTick(tick))
-        .u8(13, 4)                                          // 13: record version
+        .u8(13, 1)                                          // 13: record version (the original layout)
         .u16(17, kCarriers[serving_.carrier].earfcn)        // 17-18: EARFCN
         .u16(19, serving_.pci)                              // 19-20: serving PCI
         .u16(21, subframe)                                  // 21-22: subframe number

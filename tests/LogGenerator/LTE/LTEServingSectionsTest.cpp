@@ -104,6 +104,51 @@ TEST(LTEIntraFrequencySections, OneRecordFeedsAllThreeAndEntriesStopAtTheRecords
     }
 }
 
+// Version 4 (byte 13 = 4): E-ARFCN u32 21, PCI 25, subframe 27, RSRP bits 0-11 of u32 29 (x/16 - 180),
+// RSRQ bits 0-9 of u32 33 (x/16 - 30), n 37, d 38; 12-byte neighbours (PCI, RSRP u32 2, RSRQ u32 6)
+// from 41, then 16-byte detected cells. The real row is the 4th of the 11 0xB179 records of
+// offline_log_example, from offset 13: 04 | 00 x7 | 94 16 00 00 | 95 01 | FF 16 | 46 05 46 05 |
+// 2A 01 2A 01 | 02 | 01 | 00 00 | 9A 00 30 04 30 04 46 00 46 00 00 00 | EE 01 03 04 03 04 00 x6 |
+// EE 01 ...: E-ARFCN 0x1694 = 5780, PCI 0x195 = 405, subframe 0x16FF = 5887, RSRP 0x546 = 1350 ->
+// 84.375 - 180 = -95.625, RSRQ 0x12A = 298 -> 18.625 - 30 = -11.375; neighbour 0x9A = 154: 0x430 =
+// 1072 -> -113, 0x46 = 70 -> -25.625; neighbour 0x1EE = 494: 0x403 = 1027 -> -115.8125, 0 -> -30;
+// detected 494.
+TEST(LTEIntraFrequencySections, Version4RecordsFromACaptureAndBuilt) {
+    const RecordedLog log = QmdlReader::readFile(std::string(VANTOREL_CAPTURES_DIR) + "/offline_log_example.mi2log");
+    ASSERT_TRUE(log.ok()) << log.error;
+    std::vector<Bytes> real;
+    for (const RecordedEntry& e : log.entries)
+        if (e.logCode == 0xB179) real.push_back(e.record);
+    ASSERT_EQ(real.size(), 11u);
+    // Built: E-ARFCN 66486, RSRP 0x700 -> -68 and RSRQ 0x1A0 -> -4 under set upper bits; neighbours
+    // 0x640 -> -80 / 0xF0 -> -15 and 0x500 -> -100 / 0xA0 -> -20; three detected claimed, one fits.
+    auto built = [](size_t length) {
+        return RecordBuilder::ordinary(0xB179, 81).u8(13, 4).u32(21, 66486).u16(25, 503).u16(27, 10239)
+            .u32(29, 0xABCF700).u32(33, 0xFFFFFDA0).u8(37, 2).u8(38, 3).u16(41, 7).u32(43, 0x640).u32(47, 0xF0)
+            .u16(53, 8).u32(55, 0x500).u32(59, 0xA0).u16(65, 9).resize(length).build();
+    };
+    const char* const builtServing = "{E-ARFCN=66486, Serving Physical Cell ID=503, Subframe Number=10239, "
+                                     "Serving Filtered RSRP=-68.00 dBm, Serving Filtered RSRQ=-4.00 dB}";
+    const char* const seven = "{Physical Cell ID=7, Filtered RSRP=-80.00 dBm, Filtered RSRQ=-15.00 dB}";
+    struct Row { Bytes record; std::string serving, neighbours, detected; };
+    const Row rows[] = {
+        {real[3], "{E-ARFCN=5780, Serving Physical Cell ID=405, Subframe Number=5887, "
+                  "Serving Filtered RSRP=-95.62 dBm, Serving Filtered RSRQ=-11.38 dB}",
+         "[{Physical Cell ID=154, Filtered RSRP=-113.00 dBm, Filtered RSRQ=-25.62 dB}, "
+         "{Physical Cell ID=494, Filtered RSRP=-115.81 dBm, Filtered RSRQ=-30.00 dB}]", "[{Physical Cell ID=494}]"},
+        {built(81), builtServing,
+         std::string("[") + seven + ", {Physical Cell ID=8, Filtered RSRP=-100.00 dBm, Filtered RSRQ=-20.00 dB}]",
+         "[{Physical Cell ID=9}]"},
+        {built(64), builtServing, std::string("[") + seven + "]", "[]"},  // the second neighbour is cut off
+        {built(40), "{}", "[]", "[]"},                                    // shorter than the first entry's offset
+    };
+    for (const Row& row : rows) {
+        EXPECT_EQ(Bound<ConnectedModeMeasurementMisc>().feed(row.record, 0xB179).shown(), row.serving);
+        EXPECT_EQ(Bound<MeasuredNeighborCells>(true).feed(row.record, 0xB179).shown(), row.neighbours);
+        EXPECT_EQ(Bound<DetectedCells>(true).feed(row.record, 0xB179).shown(), row.detected);
+    }
+}
+
 // One little-endian word from (value, first bit) pairs.
 uint32_t word(std::initializer_list<std::pair<uint32_t, unsigned>> fields) {
     uint32_t w = 0;
