@@ -4,6 +4,7 @@
 #include "Platform/ByteReader.h"
 #include "Platform/LogCodes.h"
 #include "Platform/ResourceBundle.h"
+#include "Platform/RecordVersions.h"
 #include "Platform/SystemLog.h"
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
@@ -56,6 +57,8 @@ void MVKLogGenerator2::updateWithData(ByteView data) {
 
     const SectionList* subscribers = cIndex ? cIndex->getSubscribers(code) : nullptr;
     if (!subscribers) return;
+    // A record of a layout version newer than any the sections know is skipped whole.
+    if (!RecordVersions::readable(record, code)) return;
     for (Base* section : *subscribers) {
         // A section's raised error ends that section's handling of this record only;
         // the others still get it, and the stream goes on.

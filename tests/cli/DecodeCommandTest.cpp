@@ -70,6 +70,7 @@ TEST(VantorelCli, CommandsAreDispatchedInfoAccountsForEveryFrameAndBadUseIsAClea
         {{"-h"}, 0, "Usage: vantorel-cli COMMAND"},
         {{"info", VANTOREL_CAPTURES_DIR "/qmdl_example.qmdl"}, 0, "QMDL, technology unknown, 336 messages"},
         {{"info", VANTOREL_CAPTURES_DIR "/cmcc.mi2log"}, 0, "frames 5500, log packets 5483, other packets 17, bad CRC 1"},
+        {{"info", VANTOREL_CAPTURES_DIR "/cmcc.mi2log"}, 0, "\n0xB0C2  62  (version 3: 62)\n"},
         {{"frobnicate"}, 2, "vantorel-cli: unknown command 'frobnicate'"},
         {{"decode", VANTOREL_CAPTURES_DIR "/qmdl_example.qmdl"}, 1, "does not say its technology: add --technology (ifx, gsm, cdma, lte, utran)"},
         {{"decode", "--format", "yaml", "x"}, 2, "unknown --format 'yaml'"},

@@ -1,6 +1,7 @@
 // RecordedLog: entries and counters shared by the recorded-stream readers, with the file loader and the per-code summary.
 #include "TelephonyService/Replay/RecordedLog.h"
 
+#include "Platform/RecordVersions.h"
 #include "Platform/StringFormat.h"
 
 #include <QFile>
@@ -19,6 +20,8 @@ void RecordedLog::addEntry(uint16_t logCode, uint64_t timeStamp, Bytes record) {
     entries.push_back(RecordedEntry{logCode, timeStamp, std::move(record)});
     ++logPackets;
     ++codeCounts[logCode];
+    const auto& stored = entries.back().record;
+    if (const auto version = RecordVersions::versionOf(stored, logCode)) ++versionCounts[logCode][*version];
 }
 
 void RecordedLog::addProblem(uint64_t offset, const std::string& what, const std::string& why) {
@@ -33,7 +36,17 @@ std::string RecordedLog::summary() const {
     out += StringFormat::format(
         "frames %zu, log packets %zu, other packets %zu, bad CRC %zu, malformed %zu, truncated %zu\n", frames,
         logPackets, otherPackets, badCrc, malformed, truncated);
-    for (const auto& [code, n] : codeCounts) out += StringFormat::format("0x%04X  %zu\n", code, n);
+    for (const auto& [code, n] : codeCounts) {
+        out += StringFormat::format("0x%04X  %zu", code, n);
+        const auto versions = versionCounts.find(code);
+        if (versions != versionCounts.end()) {
+            std::string list;
+            for (const auto& [version, count] : versions->second)
+                list += StringFormat::format("%sversion %u: %zu", list.empty() ? "" : ", ", unsigned{version}, count);
+            out += "  (" + list + ")";
+        }
+        out += "\n";
+    }
     for (const auto& p : problems) out += p + "\n";
     const size_t allProblems = badCrc + malformed + truncated;
     if (allProblems > problems.size())

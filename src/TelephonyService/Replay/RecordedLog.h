@@ -35,6 +35,8 @@ public:
     size_t malformed = 0;     // bad HDLC frames, log packets whose lengths do not hold, DLF len < 12
     size_t truncated = 0;     // unclosed last frame, DLF record running past the end
     std::map<uint16_t, size_t> codeCounts;  // entries per log code
+    // Entries per layout version (byte 13) of the codes whose layout varies (RecordVersions).
+    std::map<uint16_t, std::map<uint8_t, size_t>> versionCounts;
 
     // "<what> at byte <offset>: <why>", the first kMaxProblems of them.
     std::vector<std::string> problems;
@@ -51,7 +53,8 @@ public:
     void addProblem(uint64_t offset, const std::string& what, const std::string& why);
 
     // Multi-line report: the counters on one line, then one line "0x%04X  %zu" per log
-    // code in ascending order; the error or the problems, when there are any.
+    // code in ascending order (for a code whose layout varies, followed by its versions:
+    // "  (version 2: 12, version 3: 1729)"); the error or the problems, when there are any.
     std::string summary() const;
 
     // The whole file at path, or nothing with *error set to "<path>: <reason>".

@@ -2,6 +2,7 @@
 #include "LogGenerator/LogGenerator.h"
 #include "LogGenerator/SectionTesting.h"
 #include "Platform/LogCodes.h"
+#include "Platform/RecordVersions.h"
 #include "TelephonyService/Emulator/LTEScenario.h"
 #include "TelephonyService/Replay/RecordedStream.h"
 
@@ -52,6 +53,22 @@ TEST(LTEDecoder, TheEmulatorsStreamFillsEveryPane) {
     std::vector<std::string> missing;
     unfilled(Value(display), "", missing);
     EXPECT_TRUE(missing.empty()) << ::testing::PrintToString(missing);
+}
+
+TEST(LTEDecoder, ARecordOfALayoutVersionNewerThanAnyKnownIsSkippedCountedAndSaidOnce) {
+    auto g = LogGenerator::generatorFromTechnology(kTSLogChannelTechnology_Morvek_LTE);
+    Dictionary state;
+    g->generateLogUsingState(state);
+    SystemLogCapture log;
+    for (uint8_t version : {3, 7, 7, 0}) {  // 0 and 3 have layouts (the original one and 3)
+        g->updateState(state, RecordBuilder::ordinary(0xB0C2, 42).u8(13, version).u16(14, 70 + version).build());
+        const DictionaryRef display = g->generateLogUsingState(state);
+        EXPECT_EQ(sectiontest::render(display->get("1;Serving Cell").asDictionary()->get("Serving Cell Info")
+                                          .asDictionary()->get("Physical Cell ID")),
+                  std::to_string(version == 7 ? 73 : 70 + version));
+    }
+    EXPECT_EQ(log.count(SystemLog::kWarning, "0xB0C2 version 7: layout unknown, record skipped"), 1);
+    EXPECT_EQ((RecordVersions::skipped()[{0xB0C2, 7}]), 2u);
 }
 
 TEST(LTEDecoder, EveryRealCaptureDecodesWithoutAFault) {
