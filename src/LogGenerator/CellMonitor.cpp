@@ -10,15 +10,12 @@
 
 namespace vantorel {
 
-bool CellMonitor::showServingCell(ByteView record, std::initializer_list<const char*> technologies, Pick pick,
-                                  std::span<const Field> fields, const SetValue& setValue) {
+CellMonitor::Outcome CellMonitor::showServingCell(ByteView record, std::initializer_list<const char*> technologies,
+                                                  Pick pick, std::span<const Field> fields, const SetValue& setValue) {
     const PropertyListResult parsed = Base::parseExtraPayload(record);
-    if (!parsed) {
-        SystemLog::log(SystemLog::kError, "%s", "Cell Info Array data could not be constructed");
-        return false;
-    }
+    if (!parsed) return Outcome::NotParsed;
     const ArrayRef cells = parsed.value->asArray();
-    if (!cells) return true;
+    if (!cells) return Outcome::NoArray;
 
     for (const Value& cell : *cells) {
         if (!matches(cell, technologies, kTSCellMonitorCellTypeServing)) continue;
@@ -35,7 +32,7 @@ bool CellMonitor::showServingCell(ByteView record, std::initializer_list<const c
         // With LastCell every later serving cell overwrites the same keys.
         if (pick == Pick::FirstCell) break;
     }
-    return true;
+    return Outcome::Read;
 }
 
 bool CellMonitor::matches(const Value& cell, std::initializer_list<const char*> technologies, const char* cellType) {

@@ -28,12 +28,13 @@ public:
     // Which of several matching serving cells the display shows.
     enum class Pick { FirstCell, LastCell };
     using SetValue = std::function<void(const std::string& key, const std::string& text)>;
+    // What showServingCell found; each section logs the failures in its own words.
+    enum class Outcome { NotParsed, NoArray, Read };
 
     // Parses the record and shows the fields of its serving cells of one of
-    // `technologies` through setValue, as decimal text. Returns false, after logging
-    // "Cell Info Array data could not be constructed", when the payload is not a
-    // property list; a root that is not an array holds no cells and changes nothing.
-    static bool showServingCell(ByteView record, std::initializer_list<const char*> technologies, Pick pick,
+    // `technologies` through setValue, as decimal text. A payload that is not a
+    // property list (NotParsed) or whose root is not an array (NoArray) changes nothing.
+    static Outcome showServingCell(ByteView record, std::initializer_list<const char*> technologies, Pick pick,
                                 std::span<const Field> fields, const SetValue& setValue);
 
 private:

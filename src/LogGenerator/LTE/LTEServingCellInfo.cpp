@@ -111,10 +111,11 @@ void LTEServingCellInfo::updateWithData(ByteView data, int32_t logCode) {
 
         case LogCode::kCellMonitor: {
             // Unlike the UTRAN section, the first serving LTE cell of the array wins.
-            const bool parsed = CellMonitor::showServingCell(
+            // Any payload without an array of cells, unparsable or not, says the same.
+            const auto outcome = CellMonitor::showServingCell(
                 data, {kTSCellMonitorRadioAccessTechnologyLTE}, CellMonitor::Pick::FirstCell, kCellMonitorFields,
                 [this](const std::string& key, const std::string& text) { setValue(key, text); });
-            if (!parsed) SystemLog::log(SystemLog::kError, "%s", "Failed to get Cell Array\n");
+            if (outcome != CellMonitor::Outcome::Read) SystemLog::log(SystemLog::kError, "%s", "Failed to get Cell Array\n");
             return;
         }
 

@@ -84,10 +84,14 @@ void ServingPLMN::updateFromCellMonitor(ByteView data) const {
         {kTSCellMonitorMNC, "Mobile Network Code", nullptr, "ServingPLMN: Failed to retrieve MNC\n"},
         {kTSCellMonitorLAC, "Location Area Code", nullptr, "ServingPLMN: Failed to retrieve LAC\n"},
     };
-    const bool parsed = CellMonitor::showServingCell(
+    const auto outcome = CellMonitor::showServingCell(
         data, {kTSCellMonitorRadioAccessTechnologyUMTS, kTSCellMonitorRadioAccessTechnologyGSM},
         CellMonitor::Pick::FirstCell, kFields, [this](const std::string& key, const std::string& text) { setValue(key, text); });
-    if (!parsed) SystemLog::log(SystemLog::kError, "%s", "Failed to get Cell Array\n");
+    // A payload that does not parse leaves no list: both lines.
+    if (outcome == CellMonitor::Outcome::NotParsed) {
+        SystemLog::log(SystemLog::kError, "%s", "Cell Info Array data could not be constructed");
+        SystemLog::log(SystemLog::kError, "%s", "Failed to get Cell Array\n");
+    }
 }
 
 }  // namespace vantorel

@@ -57,9 +57,11 @@ void UTRANServingCellInfo::updateWithData(ByteView data, int32_t logCode) {
 
     if (logCode != LogCode::kCellMonitor) return;
     // Every serving UTRAN cell overwrites the same keys: the last one wins.
-    CellMonitor::showServingCell(data, {kTSCellMonitorRadioAccessTechnologyUTRAN2}, CellMonitor::Pick::LastCell,
-                                 kCellMonitorFields,
-                                 [this](const std::string& key, const std::string& text) { setValue(key, text); });
+    const auto outcome = CellMonitor::showServingCell(
+        data, {kTSCellMonitorRadioAccessTechnologyUTRAN2}, CellMonitor::Pick::LastCell, kCellMonitorFields,
+        [this](const std::string& key, const std::string& text) { setValue(key, text); });
+    if (outcome == CellMonitor::Outcome::NotParsed)
+        SystemLog::log(SystemLog::kError, "%s", "Cell Info Array data could not be constructed");
 }
 
 }  // namespace vantorel

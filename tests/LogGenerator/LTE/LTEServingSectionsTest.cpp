@@ -57,15 +57,17 @@ TEST(LTEServingCellInfoSection, TheFirstServingLTECellWinsAndTheNextConfiguratio
         "{Tracking Area Code=34624, Cell Identity=-1, Physical Cell ID=503, Freq Band Indicator=17, "
         "Download Frequency=65535, Upload Frequency=0, Download Bandwidth=10 MHz, Upload Bandwidth=Unknown";
     EXPECT_EQ(info.feed(servingCell(50, 7), 0xB0C2).shown(), configured + "}");
-    // A serving cell lacking values keeps the earlier ones; no cells or no property list change nothing.
+    // A serving cell lacking values keeps the earlier ones; no cells, no array or no property
+    // list change nothing, the last two saying there is no array.
     info.feed(cellMonitor({cell(lte, serving, {{kTSCellMonitorUARFCN, 8}}), full(lte, serving, 3)}), 0xFF0001)
         .feed(cellMonitor({}), 0xFF0001)
+        .feed(RecordBuilder::extraPropertyList(1, cell(lte, serving, {{kTSCellMonitorPID, 9}})), 0xFF0001)
         .feed(RecordBuilder::extra(1, 20).bytes(13, {'n', 'o', 't'}).build(), 0xFF0001);
     EXPECT_EQ(info.shown(), configured + ", UARFCN=8}");
     const std::string failed = "Serving Cell Info: Failed to retrieve ";
     const std::vector<std::string> expected = {
         failed + "TAC\n", failed + "Cell ID\n", failed + "Physical Cell ID\n", failed + "Freq Band Indicator\n",
-        "Cell Info Array data could not be constructed", "Failed to get Cell Array\n"};
+        "Failed to get Cell Array\n", "Failed to get Cell Array\n"};
     EXPECT_EQ(errorLines(capture), expected);
 }
 
