@@ -12,16 +12,10 @@ namespace vantorel {
 
 CellMonitor::Outcome CellMonitor::showServingCell(ByteView record, std::initializer_list<const char*> technologies,
                                                   Pick pick, std::span<const Field> fields, const SetValue& setValue) {
-    const PropertyListResult parsed = Base::parseExtraPayload(record);
-    if (!parsed) return Outcome::NotParsed;
-    const ArrayRef cells = parsed.value->asArray();
-    if (!cells) return Outcome::NoArray;
-
-    for (const Value& cell : *cells) {
-        if (!matches(cell, technologies, kTSCellMonitorCellTypeServing)) continue;
+    return forEachCell(record, technologies, kTSCellMonitorCellTypeServing, [&](const Value& cell) {
         // Every field is read even when an earlier one is missing.
         for (const Field& field : fields) {
-            if (const auto v = int32(cell, field.cellKey)) {
+            if (const auto v = number(cell, field.cellKey)) {
                 const std::string text = StringFormat::format("%d", *v);
                 setValue(field.displayKey, text);
                 if (field.secondDisplayKey) setValue(field.secondDisplayKey, text);
@@ -30,8 +24,18 @@ CellMonitor::Outcome CellMonitor::showServingCell(ByteView record, std::initiali
             }
         }
         // With LastCell every later serving cell overwrites the same keys.
-        if (pick == Pick::FirstCell) break;
-    }
+        return pick == Pick::LastCell;
+    });
+}
+
+CellMonitor::Outcome CellMonitor::forEachCell(ByteView record, std::initializer_list<const char*> technologies,
+                                              const char* cellType, const Visit& visit) {
+    const PropertyListResult parsed = Base::parseExtraPayload(record);
+    if (!parsed) return Outcome::NotParsed;
+    const ArrayRef cells = parsed.value->asArray();
+    if (!cells) return Outcome::NoArray;
+    for (const Value& cell : *cells)
+        if (matches(cell, technologies, cellType) && !visit(cell)) break;
     return Outcome::Read;
 }
 
@@ -47,7 +51,7 @@ bool CellMonitor::matches(const Value& cell, std::initializer_list<const char*> 
     return false;
 }
 
-std::optional<int32_t> CellMonitor::int32(const Value& cell, const char* key) {
+std::optional<int32_t> CellMonitor::number(const Value& cell, const char* key) {
     auto dict = cell.asDictionary();
     if (!dict) return std::nullopt;
     const Value* v = dict->find(key);

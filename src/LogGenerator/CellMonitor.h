@@ -37,14 +37,22 @@ public:
     static Outcome showServingCell(ByteView record, std::initializer_list<const char*> technologies, Pick pick,
                                 std::span<const Field> fields, const SetValue& setValue);
 
+    // Parses the record and hands each cell of one of `technologies` whose cell type is
+    // `cellType` to visit, in list order, until visit returns false. NotParsed and
+    // NoArray as for showServingCell; visit is then never called.
+    using Visit = std::function<bool(const Value& cell)>;
+    static Outcome forEachCell(ByteView record, std::initializer_list<const char*> technologies, const char* cellType,
+                               const Visit& visit);
+
+    // The cell's value under key as a signed 32-bit integer; empty when missing or
+    // not a number.
+    static std::optional<int32_t> number(const Value& cell, const char* key);
+
 private:
     // True when the cell is a dictionary whose radio access technology is one of
     // `technologies` and whose cell type equals `cellType`; a cell lacking either key
     // (or not a dictionary) does not match.
     static bool matches(const Value& cell, std::initializer_list<const char*> technologies, const char* cellType);
-    // The cell's value under key as a signed 32-bit integer; empty when missing or
-    // not a number.
-    static std::optional<int32_t> int32(const Value& cell, const char* key);
 };
 
 }  // namespace vantorel

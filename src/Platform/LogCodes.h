@@ -17,6 +17,30 @@ inline constexpr int32_t kSimFiles = 0xFF0000;     // extra 0: SIM elementary fi
 inline constexpr int32_t kCellMonitor = 0xFF0001;  // extra 1: cell-monitor array of dictionaries
 inline constexpr int32_t kPDPContexts = 0xFF0002;  // extra 2: packet-data contexts
 
+// UMTS (WCDMA) access stratum.
+inline constexpr int32_t kUMTSReselectionRanking = 0x4005;  // ranked UMTS and GSM cells of cell reselection
+inline constexpr int32_t kUMTSTransmitPower = 0x4031;       // uplink transmit power samples
+inline constexpr int32_t kUMTSBLER = 0x4116;                // transport-channel block error counts
+inline constexpr int32_t kUMTSRRCState = 0x4125;            // RRC state
+inline constexpr int32_t kUMTSCellIdentity = 0x4127;        // uplink and downlink UARFCN, cell ID, URA ID
+inline constexpr int32_t kUMTSCiphering = 0x4157;           // ciphering on or off
+inline constexpr int32_t kUMTSSearcher = 0x417A;            // searcher cells: scrambling code, set, Ec/Io energies
+inline constexpr int32_t kHSDPADecodeStatistics = 0x4221;   // HSDPA HARQ processes: bits, new transmissions, errors
+
+// GSM access stratum.
+inline constexpr int32_t kGSMChannelParameters = 0x5072;      // dedicated channel parameters: DTX
+inline constexpr int32_t kGSMDedicatedAllocation = 0x5076;    // dedicated-mode mobile allocation ARFCN
+inline constexpr int32_t kGSMRRState = 0x512C;                // RR state, sub-state, status, mode
+inline constexpr int32_t kGSMServingCellIdentity = 0x5134;    // serving ARFCN, BSIC, cell ID
+inline constexpr int32_t kGSMServingMeasurement = 0x5137;     // serving level, C1/C2, quality, neighbours
+inline constexpr int32_t kGPRSSI13Position = 0x51F4;          // where SI13 is broadcast
+inline constexpr int32_t kGPRSCellOptions = 0x51F5;           // PFC, priority access threshold, NC order
+inline constexpr int32_t kGPRSGeneralParameters = 0x51F6;     // T3192, DRX timer max, access burst type
+inline constexpr int32_t kGSMMobileAllocation = 0x51F8;       // hopping sequence number and ARFCN list
+inline constexpr int32_t kGPRSPBCCHDescription = 0x51FB;      // PBCCH present
+inline constexpr int32_t kGPRSPacketSystemInfo = 0x51FD;      // PSI/SI status, measurement order, counts
+inline constexpr int32_t kGSMBSICReport = 0x51FF;             // ARFCN to BSIC of the neighbours
+
 // GSM/UMTS non-access stratum.
 inline constexpr int32_t kGMMState = 0x7130;             // GMM state, sub-state, update status
 inline constexpr int32_t kMMState = 0x7131;              // MM state, sub-state, update status
