@@ -2,6 +2,7 @@
 #include "LogGenerator/LogGenerator.h"
 
 #include "LogGenerator/LTE/LTELogGenerator.h"
+#include "LogGenerator/MVK_GSM/MVK_GSMLogGenerator.h"
 #include "LogGenerator/UTRAN/UTRANLogGenerator.h"
 #include "Platform/DateDescription.h"
 #include "Platform/ProgrammingError.h"
@@ -83,7 +84,7 @@ struct TechnologyRow {
 // of their own yet give none.
 const TechnologyRow kTechnologies[] = {
     {kTSLogChannelTechnology_IFX, nullptr},
-    {kTSLogChannelTechnology_Morvek_GSM, nullptr},
+    {kTSLogChannelTechnology_Morvek_GSM, &MVK_GSMLogGenerator::generator},
     {kTSLogChannelTechnology_Morvek_CDMA, nullptr},
     {kTSLogChannelTechnology_Morvek_LTE, &LTELogGenerator::generator},
     {kTSLogChannelTechnology_Morvek_UTRAN2, &UTRANLogGenerator::generator},

@@ -31,6 +31,29 @@ inline std::string render(const Value& v) {
     return std::string("<") + v.typeName() + ">";
 }
 
+// Every leaf of a display that still shows the template's "-", and every empty list, by path.
+inline void unfilled(const Value& v, const std::string& path, std::vector<std::string>& out) {
+    if (const std::string* s = v.asString()) {
+        if (*s == "-") out.push_back(path);
+    } else if (DictionaryRef d = v.asDictionary()) {
+        for (const auto& [key, item] : *d) unfilled(item, path + "/" + key, out);
+    } else if (ArrayRef a = v.asArray()) {
+        if (a->empty()) out.push_back(path + " (empty)");
+    }
+}
+
+// The display value at a path of keys ("1;Serving Cell", "GSM Serving Cell", "RSSI"), rendered;
+// "<missing>" when a step is not there.
+inline std::string at(const DictionaryRef& display, const std::vector<std::string>& path) {
+    Value v(display);
+    for (const std::string& key : path) {
+        DictionaryRef d = v.asDictionary();
+        if (!d || !d->find(key)) return "<missing>";
+        v = *d->find(key);
+    }
+    return render(v);
+}
+
 // A section bound to a dictionary and an array of its own (it writes to the one its
 // display kind needs; the other stays empty).
 template <class Section>

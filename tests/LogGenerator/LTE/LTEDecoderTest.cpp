@@ -19,17 +19,6 @@ std::vector<int64_t> integers(const Value& list) {
     return out;
 }
 
-// Every leaf of the display that still shows the template's "-", and every empty list, by path.
-void unfilled(const Value& v, const std::string& path, std::vector<std::string>& out) {
-    if (const std::string* s = v.asString()) {
-        if (*s == "-") out.push_back(path);
-    } else if (DictionaryRef d = v.asDictionary()) {
-        for (const auto& [key, item] : *d) unfilled(item, path + "/" + key, out);
-    } else if (ArrayRef a = v.asArray()) {
-        if (a->empty()) out.push_back(path + " (empty)");
-    }
-}
-
 TEST(LTEDecoder, TheStartCommandAsksForTheLTERecordsTheSimThePdpContextsAndTheCellMonitor) {
     auto g = LogGenerator::generatorFromTechnology(kTSLogChannelTechnology_Morvek_LTE);
     ASSERT_TRUE(g);
@@ -51,7 +40,7 @@ TEST(LTEDecoder, TheEmulatorsStreamFillsEveryPane) {
     const DictionaryRef display = g->generateLogUsingState(state);
     ASSERT_TRUE(display);
     std::vector<std::string> missing;
-    unfilled(Value(display), "", missing);
+    sectiontest::unfilled(Value(display), "", missing);
     EXPECT_TRUE(missing.empty()) << ::testing::PrintToString(missing);
 }
 
