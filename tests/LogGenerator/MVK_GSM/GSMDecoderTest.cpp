@@ -66,7 +66,9 @@ TEST(GSMDecoder, SharedCodesReachTheirSectionsInOrderAndOthersNone) {
         for (const auto& line : log.lines())
             if (line.priority == SystemLog::kWarning) entered.push_back(line.text);
         EXPECT_EQ(entered, row.entered);
-        if (row.entered.empty()) EXPECT_EQ(sectiontest::render(Value(d.display())), before);
+        if (row.entered.empty()) {
+            EXPECT_EQ(sectiontest::render(Value(d.display())), before);
+        }
     }
 }
 
