@@ -116,11 +116,11 @@ void LTEScenario::restart() {
     drawSubscriber(sim_, "894901", 12, "+49151");
     sim_.plmn = "62F210";  // 262-01
     sim_.lac = static_cast<int>(kLAC);
-    sim_.hpplmn = "05";                           // 5 x 6 min
+    sim_.hpplmn = "05";  // 5 x 6 min
     sim_.ptmsiSignature = "5E7A01";
-    sim_.acc = "0008";                            // access class 3
-    sim_.fplmn = "62F22062F230FFFFFFFFFFFF";      // 262-02, 262-03 forbidden
-    sim_.oplmnAcT = "62F2104000";                 // 262-01 with E-UTRAN
+    sim_.acc = "0008";  // access class 3
+    sim_.fplmn = "62F22062F230FFFFFFFFFFFF";  // 262-02, 262-03 forbidden
+    sim_.oplmnAcT = "62F2104000";  // 262-01 with E-UTRAN
     enodeBase_ = uniform(0x10000, 0xF0000);
 
     // The serving cell on a random carrier and a pool of neighbours on the same one.

@@ -79,10 +79,10 @@ void UTRANScenario::restart() {
     drawSubscriber(sim_, "898600", 13, "+86138");
     sim_.plmn = "64F000";  // 460-00
     sim_.lac = static_cast<int>(kLAC);
-    sim_.hpplmn = "0A";                           // 10 x 6 min
+    sim_.hpplmn = "0A";  // 10 x 6 min
     sim_.ptmsiSignature = "A1B2C3";
-    sim_.acc = "0040";                            // access class 6
-    sim_.fplmn = "64F01064F030FFFFFFFFFFFF";      // 460-01, 460-03 forbidden
+    sim_.acc = "0040";  // access class 6
+    sim_.fplmn = "64F01064F030FFFFFFFFFFFF";  // 460-01, 460-03 forbidden
 
     // The serving cell and a pool of TD-SCDMA neighbours under the same RNC.
     int32_t rnc = uniform(100, 4000);
