@@ -4,6 +4,7 @@
 #include "Platform/LogCodes.h"
 #include "Platform/RecordBuilder.h"
 #include "Platform/StringFormat.h"
+#include "Platform/TelephonyIdentifiers.h"
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
 
@@ -70,6 +71,41 @@ Bytes EmulatorScenario::packetContextsRecord(std::span<const PacketContext> cont
         list->append(Value(d));
     }
     return RecordBuilder::extraPropertyList(LogCode::kPDPContexts, Value(list), binary);
+}
+
+void EmulatorScenario::drawSubscriber(SimFiles& sim, const std::string& iccidPrefix, int iccidDigits,
+                                      const std::string& msisdnPrefix) {
+    sim.iccid = iccidPrefix;
+    for (int i = 0; i < iccidDigits; ++i) sim.iccid += static_cast<char>('0' + uniform(0, 9));
+    sim.iccid += luhnDigit(sim.iccid);
+    sim.msisdn = msisdnPrefix;
+    for (int i = 0; i < 8; ++i) sim.msisdn += static_cast<char>('0' + uniform(0, 9));
+    sim.tmsi = StringFormat::format("%08X", random());
+    sim.ptmsi = StringFormat::format("%08X", random() | 0xC0000000u);  // P-TMSI: top two bits set
+}
+
+Bytes EmulatorScenario::simFilesRecord(const SimFiles& sim, bool binary) {
+    // The files as hex or text strings the way the service reads them; LAI = PLMN + LAC.
+    const std::string lai = sim.plmn + StringFormat::format("%04X", static_cast<unsigned>(sim.lac));
+    auto files = Dictionary::create();
+    files->set("kSimFile_ICCID", sim.iccid);
+    files->set("kSimFile_MSISDN", sim.msisdn);
+    files->set("kSimFile_HPPLMN", sim.hpplmn);
+    files->set("kSimFile_LOCI", sim.tmsi + lai + "FF00");                             // TMSI, LAI, RFU, updated
+    files->set("kSimFile_PSLOCI", sim.ptmsi + sim.ptmsiSignature + lai + "01" + "00");  // P-TMSI, signature, RAI, updated
+    files->set("kSimFile_ACC", sim.acc);
+    files->set("kSimFile_AD", "00000002");  // normal operation, 2-digit MNC
+    files->set("kSimFile_FPLMN", sim.fplmn);
+    files->set("kSimFile_AHPLMN", sim.plmn);
+    if (!sim.oplmnAcT.empty()) files->set("kSimFile_OPLMNAcT", sim.oplmnAcT);
+    return RecordBuilder::extraPropertyList(LogCode::kSimFiles, Value(files), binary);
+}
+
+DictionaryRef EmulatorScenario::monitorCell(const char* technology, const char* type) {
+    auto cell = Dictionary::create();
+    cell->set(kTSCellMonitorCellRadioAccessTechnology, technology);
+    cell->set(kTSCellMonitorCellType, type);
+    return cell;
 }
 
 Bytes EmulatorScenario::cutPropertyListRecord(int32_t code, std::string_view text, uint64_t tick) const {

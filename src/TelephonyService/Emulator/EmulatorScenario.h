@@ -53,6 +53,20 @@ protected:
         int nsapi = 0;
         bool active = false;
     };
+    // The SIM's elementary files as the 0xFF0000 extra record lists them (hex strings).
+    struct SimFiles {
+        std::string iccid;
+        std::string msisdn;
+        std::string tmsi;            // 8 hex digits
+        std::string ptmsi;           // 8 hex digits
+        std::string plmn;            // home PLMN, 3 BCD bytes as 6 hex digits ("62F210" for 262-01)
+        int lac = 0;                 // the location area of LOCI and PS-LOCI
+        std::string hpplmn;          // search period, 1 byte
+        std::string ptmsiSignature;  // 3 bytes
+        std::string acc;             // access control class, 2 bytes
+        std::string fplmn;           // forbidden PLMNs
+        std::string oplmnAcT;        // operator PLMN with access technology; empty: not on this SIM
+    };
 
     // The walk: back to the state of tick 0 (reseed() included, nextTick_ = 0), and
     // the records of tick nextTick_ (which it then advances).
@@ -74,6 +88,13 @@ protected:
     // The 0xFF0002 extra record: the first context always, the others while active;
     // each dictionary is shown as sent, so every value is a display string.
     static Bytes packetContextsRecord(std::span<const PacketContext> contexts, bool binary);
+    // Draws the subscriber of sim: ICCID iccidPrefix + iccidDigits random digits + Luhn
+    // digit, MSISDN msisdnPrefix + 8 random digits, then TMSI and P-TMSI.
+    void drawSubscriber(SimFiles& sim, const std::string& iccidPrefix, int iccidDigits, const std::string& msisdnPrefix);
+    // The 0xFF0000 extra record.
+    static Bytes simFilesRecord(const SimFiles& sim, bool binary);
+    // A cell of the 0xFF0001 extra record, its technology and type (serving or neighbour) set.
+    static DictionaryRef monitorCell(const char* technology, const char* type);
     // An extra record whose XML property list was cut off in transfer (`text`).
     Bytes cutPropertyListRecord(int32_t code, std::string_view text, uint64_t tick) const;
     // The Luhn check digit that ends an ICCID (ITU-T E.118).

@@ -113,13 +113,14 @@ void LTEScenario::restart() {
     drxBelowZero_ = 0;
 
     // SIM identity: ICCID 89 49 01 (telecom, Germany, issuer) + 12 digits + Luhn.
-    iccid_ = "894901";
-    for (int i = 0; i < 12; ++i) iccid_ += static_cast<char>('0' + uniform(0, 9));
-    iccid_ += luhnDigit(iccid_);
-    msisdn_ = "+49151";
-    for (int i = 0; i < 8; ++i) msisdn_ += static_cast<char>('0' + uniform(0, 9));
-    tmsi_ = StringFormat::format("%08X", random());
-    ptmsi_ = StringFormat::format("%08X", random() | 0xC0000000u);  // P-TMSI: top two bits set
+    drawSubscriber(sim_, "894901", 12, "+49151");
+    sim_.plmn = "62F210";  // 262-01
+    sim_.lac = static_cast<int>(kLAC);
+    sim_.hpplmn = "05";  // 5 x 6 min
+    sim_.ptmsiSignature = "5E7A01";
+    sim_.acc = "0008";  // access class 3
+    sim_.fplmn = "62F22062F230FFFFFFFFFFFF";  // 262-02, 262-03 forbidden
+    sim_.oplmnAcT = "62F2104000";  // 262-01 with E-UTRAN
     enodeBase_ = uniform(0x10000, 0xF0000);
 
     // The serving cell on a random carrier and a pool of neighbours on the same one.
@@ -337,7 +338,7 @@ std::vector<Bytes> LTEScenario::step() {
     std::vector<Bytes> out;
     if (tick == 0) {
         // The extras first, so the display fills at once.
-        out.push_back(simFilesRecord(false));
+        out.push_back(simFilesRecord(sim_, false));
         out.push_back(cellMonitorRecord(false));
         out.push_back(packetContextsRecord(bearers_, false));
     }
@@ -352,7 +353,7 @@ std::vector<Bytes> LTEScenario::step() {
     }
     if (tick > 0 && (cellChanged || tick % 10 == 0)) out.push_back(cellMonitorRecord((tick / 10) % 2 == 1));
     if (tick > 0 && (bearersChanged || tick % 20 == 0)) out.push_back(packetContextsRecord(bearers_, (tick / 20) % 2 == 1));
-    if (tick > 0 && tick % 60 == 0) out.push_back(simFilesRecord((tick / 60) % 2 == 1));
+    if (tick > 0 && tick % 60 == 0) out.push_back(simFilesRecord(sim_, (tick / 60) % 2 == 1));
     if (tick % kMalformedPeriod == 12) out.push_back(malformedRecord(tick));
     return out;
 }
@@ -525,29 +526,9 @@ Bytes LTEScenario::reselectionCandidatesRecord(uint64_t tick) const {
     return b.build();
 }
 
-Bytes LTEScenario::simFilesRecord(bool binary) const {
-    // The SIM's elementary files, as hex or text strings the way the service reads them.
-    // BCD PLMN 262-01 is 62 F2 10; LAI = PLMN + LAC.
-    const std::string lai = StringFormat::format("62F210%04X", static_cast<unsigned>(kLAC));
-    auto sim = Dictionary::create();
-    sim->set("kSimFile_ICCID", iccid_);
-    sim->set("kSimFile_MSISDN", msisdn_);
-    sim->set("kSimFile_HPPLMN", "05");                                   // 5 x 6 min
-    sim->set("kSimFile_LOCI", tmsi_ + lai + "FF00");                     // TMSI, LAI, RFU, updated
-    sim->set("kSimFile_PSLOCI", ptmsi_ + "5E7A01" + lai + "01" + "00");  // P-TMSI, signature, RAI, updated
-    sim->set("kSimFile_ACC", "0008");                                    // access class 3
-    sim->set("kSimFile_AD", "00000002");                                 // normal operation, 2-digit MNC
-    sim->set("kSimFile_FPLMN", "62F22062F230FFFFFFFFFFFF");              // 262-02, 262-03 forbidden
-    sim->set("kSimFile_AHPLMN", "62F210");
-    sim->set("kSimFile_OPLMNAcT", "62F2104000");                         // 262-01 with E-UTRAN
-    return RecordBuilder::extraPropertyList(LogCode::kSimFiles, Value(sim), binary);
-}
-
 Bytes LTEScenario::cellMonitorRecord(bool binary) const {
     auto cells = Array::create();
-    auto serving = Dictionary::create();
-    serving->set(kTSCellMonitorCellRadioAccessTechnology, kTSCellMonitorRadioAccessTechnologyLTE);
-    serving->set(kTSCellMonitorCellType, kTSCellMonitorCellTypeServing);
+    auto serving = monitorCell(kTSCellMonitorRadioAccessTechnologyLTE, kTSCellMonitorCellTypeServing);
     serving->set(kTSCellMonitorMCC, Value::integer(kMCC));
     serving->set(kTSCellMonitorMNC, Value::integer(kMNC));
     serving->set(kTSCellMonitorTAC, Value::integer(kTAC));
@@ -566,9 +547,7 @@ Bytes LTEScenario::cellMonitorRecord(bool binary) const {
                      [](const LTECell* a, const LTECell* b) { return a->rsrp > b->rsrp; });
     if (strongest.size() > 3) strongest.resize(3);
     for (const LTECell* c : strongest) {
-        auto n = Dictionary::create();
-        n->set(kTSCellMonitorCellRadioAccessTechnology, kTSCellMonitorRadioAccessTechnologyLTE);
-        n->set(kTSCellMonitorCellType, kTSCellMonitorCellTypeNeighbor);
+        auto n = monitorCell(kTSCellMonitorRadioAccessTechnologyLTE, kTSCellMonitorCellTypeNeighbor);
         n->set(kTSCellMonitorPID, Value::integer(c->pci));
         n->set(kTSCellMonitorUARFCN, Value::integer(kCarriers[c->carrier].earfcn));
         cells->append(Value(n));

@@ -91,16 +91,12 @@ private:
     Bytes servingMeasurementRecord(uint64_t tick);
     Bytes neighbourMeasurementRecord(uint64_t tick);
     Bytes reselectionCandidatesRecord(uint64_t tick) const;
-    Bytes simFilesRecord(bool binary) const;
     Bytes cellMonitorRecord(bool binary) const;
     Bytes malformedRecord(uint64_t tick) const;
 
 
     // Fixed per seed.
-    std::string iccid_;
-    std::string msisdn_;
-    std::string tmsi_;
-    std::string ptmsi_;
+    SimFiles sim_;
     int32_t enodeBase_ = 0;  // the eNodeB IDs of the area start here
 
     // The radio picture.

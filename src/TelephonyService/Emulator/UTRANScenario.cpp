@@ -76,13 +76,13 @@ void UTRANScenario::restart() {
     cctrchTimeslots_.clear();
 
     // SIM identity: ICCID 89 86 00 (telecom, China, China Mobile) + 13 digits + Luhn.
-    iccid_ = "898600";
-    for (int i = 0; i < 13; ++i) iccid_ += static_cast<char>('0' + uniform(0, 9));
-    iccid_ += luhnDigit(iccid_);
-    msisdn_ = "+86138";
-    for (int i = 0; i < 8; ++i) msisdn_ += static_cast<char>('0' + uniform(0, 9));
-    tmsi_ = StringFormat::format("%08X", random());
-    ptmsi_ = StringFormat::format("%08X", random() | 0xC0000000u);  // P-TMSI: top two bits set
+    drawSubscriber(sim_, "898600", 13, "+86138");
+    sim_.plmn = "64F000";  // 460-00
+    sim_.lac = static_cast<int>(kLAC);
+    sim_.hpplmn = "0A";  // 10 x 6 min
+    sim_.ptmsiSignature = "A1B2C3";
+    sim_.acc = "0040";  // access class 6
+    sim_.fplmn = "64F01064F030FFFFFFFFFFFF";  // 460-01, 460-03 forbidden
 
     // The serving cell and a pool of TD-SCDMA neighbours under the same RNC.
     int32_t rnc = uniform(100, 4000);
@@ -310,7 +310,7 @@ std::vector<Bytes> UTRANScenario::step() {
     std::vector<Bytes> out;
     if (tick == 0) {
         // The extras first, so the display fills at once.
-        out.push_back(simFilesRecord(false));
+        out.push_back(simFilesRecord(sim_, false));
         out.push_back(cellMonitorRecord(false));
         out.push_back(packetContextsRecord(pdp_, false));
     }
@@ -321,7 +321,7 @@ std::vector<Bytes> UTRANScenario::step() {
     if (rrc_ == kCellFach || rrc_ == kCellDCH) out.push_back(blerSIRRecord(tick));
     if (tick > 0 && (servingChanged || tick % 10 == 0)) out.push_back(cellMonitorRecord((tick / 10) % 2 == 1));
     if (tick > 0 && (pdpChanged || tick % 20 == 0)) out.push_back(packetContextsRecord(pdp_, (tick / 20) % 2 == 1));
-    if (tick > 0 && tick % 60 == 0) out.push_back(simFilesRecord((tick / 60) % 2 == 1));
+    if (tick > 0 && tick % 60 == 0) out.push_back(simFilesRecord(sim_, (tick / 60) % 2 == 1));
     if (tick % 25 == 12) out.push_back(malformedRecord(tick));
     return out;
 }
@@ -440,29 +440,10 @@ Bytes UTRANScenario::blerSIRRecord(uint64_t tick) {
     return b.build();
 }
 
-Bytes UTRANScenario::simFilesRecord(bool binary) const {
-    // The SIM's elementary files, as hex or text strings the way the service reads them.
-    // BCD PLMN 460-00 is 64 F0 00; LAI = PLMN + LAC.
-    const std::string lai = StringFormat::format("64F000%04X", static_cast<unsigned>(kLAC));
-    auto sim = Dictionary::create();
-    sim->set("kSimFile_ICCID", iccid_);
-    sim->set("kSimFile_MSISDN", msisdn_);
-    sim->set("kSimFile_HPPLMN", "0A");                                  // 10 x 6 min
-    sim->set("kSimFile_LOCI", tmsi_ + lai + "FF00");                     // TMSI, LAI, RFU, updated
-    sim->set("kSimFile_PSLOCI", ptmsi_ + "A1B2C3" + lai + "01" + "00");  // P-TMSI, signature, RAI, updated
-    sim->set("kSimFile_ACC", "0040");                                    // access class 6
-    sim->set("kSimFile_AD", "00000002");                                 // normal operation, 2-digit MNC
-    sim->set("kSimFile_FPLMN", "64F01064F030FFFFFFFFFFFF");              // 460-01, 460-03 forbidden
-    sim->set("kSimFile_AHPLMN", "64F000");
-    return RecordBuilder::extraPropertyList(LogCode::kSimFiles, Value(sim), binary);
-}
-
 Bytes UTRANScenario::cellMonitorRecord(bool binary) const {
     auto cells = Array::create();
 
-    auto serving = Dictionary::create();
-    serving->set(kTSCellMonitorCellRadioAccessTechnology, kTSCellMonitorRadioAccessTechnologyUTRAN2);
-    serving->set(kTSCellMonitorCellType, kTSCellMonitorCellTypeServing);
+    auto serving = monitorCell(kTSCellMonitorRadioAccessTechnologyUTRAN2, kTSCellMonitorCellTypeServing);
     serving->set(kTSCellMonitorMCC, Value::integer(kMCC));
     serving->set(kTSCellMonitorMNC, Value::integer(kMNC));
     serving->set(kTSCellMonitorLAC, Value::integer(kLAC));
@@ -482,9 +463,7 @@ Bytes UTRANScenario::cellMonitorRecord(bool binary) const {
     if (strongest.size() > 4) strongest.resize(4);
     for (const TDCell* cell : strongest) {
         const TDCell& c = *cell;
-        auto n = Dictionary::create();
-        n->set(kTSCellMonitorCellRadioAccessTechnology, kTSCellMonitorRadioAccessTechnologyUTRAN2);
-        n->set(kTSCellMonitorCellType, kTSCellMonitorCellTypeNeighbor);
+        auto n = monitorCell(kTSCellMonitorRadioAccessTechnologyUTRAN2, kTSCellMonitorCellTypeNeighbor);
         n->set(kTSCellMonitorUARFCN, Value::integer(c.uarfcn));
         n->set(kTSCellMonitorSCN, Value::integer(c.cellParameterId));
         n->set(kTSCellMonitorRSCP, Value::integer(c.rscp));
@@ -497,9 +476,7 @@ Bytes UTRANScenario::cellMonitorRecord(bool binary) const {
         if (g.present && (!best || g.rssi > best->rssi)) best = &g;
     }
     if (best) {
-        auto g = Dictionary::create();
-        g->set(kTSCellMonitorCellRadioAccessTechnology, kTSCellMonitorRadioAccessTechnologyGSM);
-        g->set(kTSCellMonitorCellType, kTSCellMonitorCellTypeNeighbor);
+        auto g = monitorCell(kTSCellMonitorRadioAccessTechnologyGSM, kTSCellMonitorCellTypeNeighbor);
         g->set(kTSCellMonitorMCC, Value::integer(kMCC));
         g->set(kTSCellMonitorMNC, Value::integer(kMNC));
         g->set(kTSCellMonitorLAC, Value::integer(kGSMLAC));

@@ -90,16 +90,12 @@ private:
     Bytes neighbourListRecord(uint64_t tick, bool withPrefix) const;
     Bytes gsmNeighbourListRecord(uint64_t tick) const;
     Bytes blerSIRRecord(uint64_t tick);
-    Bytes simFilesRecord(bool binary) const;
     Bytes cellMonitorRecord(bool binary) const;
     Bytes malformedRecord(uint64_t tick) const;
 
 
     // Fixed per seed.
-    std::string iccid_;
-    std::string msisdn_;
-    std::string tmsi_;
-    std::string ptmsi_;
+    SimFiles sim_;
 
     // The radio picture.
     TDCell serving_;
