@@ -13,7 +13,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size);
 int main(int argc, char** argv) {
     namespace fs = std::filesystem;
     std::vector<fs::path> files;
-    for (const fs::path arg : argc > 1 ? std::vector<fs::path>(argv + 1, argv + argc)
+    for (const fs::path& arg : argc > 1 ? std::vector<fs::path>(argv + 1, argv + argc)
                                        : std::vector<fs::path>{VANTOREL_FUZZ_CORPUS}) {
         if (!fs::is_directory(arg)) files.push_back(arg);
         else
