@@ -10,6 +10,7 @@
 #include <QElapsedTimer>
 #include <gtest/gtest.h>
 
+#include <string>
 #include <vector>
 
 namespace vantorel {
@@ -82,6 +83,21 @@ TEST(ReplayBackend, ALoopingReplayWaitsWhilePausedAndStartsOverAtItsEnd) {
     ReplayBackend empty(streamOf({}), 0, true);  // an empty loop must not spin
     empty.start();
     ASSERT_TRUE(waitUntil([&] { return empty.state() == State::Finished; }));
+}
+
+TEST(EmulatorScenarios, ASeedAndATickAlwaysGiveTheSameBytesWhateverTheOrder) {
+    for (const char* technology : {"gsm", "lte", "utran"}) {
+        std::string error;
+        auto one = EmulatorBackend::scenarioFor(technology, &error, 1), again = EmulatorBackend::scenarioFor(technology, &error, 1),
+             other = EmulatorBackend::scenarioFor(technology, &error, 2);
+        ASSERT_TRUE(one && again && other) << error;
+        std::vector<std::vector<Bytes>> a;
+        for (uint64_t t = 0; t < 120; ++t) a.push_back(one->recordsForTick(t));
+        for (uint64_t t : {79, 3, 78, 119, 0}) EXPECT_EQ(again->recordsForTick(t), a[t]) << technology << " " << t;
+        bool differs = false;
+        for (uint64_t t = 0; t < 120; ++t) differs |= other->recordsForTick(t) != a[t];
+        EXPECT_TRUE(differs) << technology;
+    }
 }
 
 TEST(EmulatorBackend, TicksComeAtOnceThenEveryIntervalAndGoOnCountingAfterAStop) {

@@ -1,4 +1,4 @@
-// Tests UTRANScenario: the same bytes for a seed whatever the order of the ticks, and a hundred ticks that the UTRAN decoders take in without complaint except for the deliberately malformed records.
+// Tests UTRANScenario: a hundred ticks that the UTRAN decoders take in without complaint except for the deliberately malformed records.
 #include "TelephonyService/Emulator/UTRANScenario.h"
 
 #include "LogGenerator/LogGenerator.h"
@@ -17,16 +17,6 @@
 
 namespace vantorel {
 namespace {
-
-TEST(UTRANScenario, ASeedAndATickAlwaysGiveTheSameBytesWhateverTheOrder) {
-    UTRANScenario one(1), again(1), other(2);
-    std::vector<std::vector<Bytes>> a;
-    for (uint64_t t = 0; t < 120; ++t) a.push_back(one.recordsForTick(t));
-    for (uint64_t t : {50, 3, 49, 119, 0}) EXPECT_EQ(again.recordsForTick(t), a[t]) << t;
-    bool differs = false;
-    for (uint64_t t = 0; t < 120; ++t) differs |= other.recordsForTick(t) != a[t];
-    EXPECT_TRUE(differs);
-}
 
 // The record as the decoders see it: the optional 0x81 xx prefix removed.
 ByteReader withoutPrefix(const Bytes& m) {

@@ -661,14 +661,17 @@ Bytes GSMScenario::searcherRecord(uint64_t tick) {
 }
 
 Bytes GSMScenario::rankingRecord(uint64_t tick) const {
-    // Ranked UMTS neighbours (monitored set), and the GSM cells while the serving Ec/Io
-    // is below the inter-RAT search threshold. The GSM entries follow the UMTS ones.
+    // Ranked UMTS neighbours (monitored set) while the serving Ec/Io is good; below the
+    // inter-RAT search threshold (or with no UMTS neighbour) the GSM cells instead. The
+    // modem would list GSM entries after UMTS ones, but the display reads both lists from
+    // offset 15, so this modem never reports both kinds in one record.
     std::vector<const UMTSCell*> ranked;
+    std::vector<const GSMCell*> gsm;
     for (size_t k = 1; k < kUMTSPool; ++k) {
         if (umts_[k].set == 1) ranked.push_back(&umts_[k]);
     }
-    std::vector<const GSMCell*> gsm;
     if (umts_[0].ecio < -7 || ranked.empty()) {
+        ranked.clear();
         for (const GSMCell& g : gsm_) {
             if (g.present) gsm.push_back(&g);
         }
