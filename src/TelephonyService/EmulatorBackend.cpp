@@ -5,6 +5,7 @@
 #include "Platform/TechnologyNames.h"
 #include "Platform/TelephonyIdentifiers.h"
 #include "TelephonyService/Emulator/GSMScenario.h"
+#include "TelephonyService/Emulator/IFXScenario.h"
 #include "TelephonyService/Emulator/LTEScenario.h"
 #include "TelephonyService/Emulator/UTRANScenario.h"
 
@@ -22,6 +23,7 @@ std::unique_ptr<EmulatorScenario> EmulatorBackend::scenarioFor(const std::string
                                                                uint64_t seed) {
     const std::optional<std::string> identifier = technologyIdentifier(technology, error);
     if (!identifier) return nullptr;
+    if (*identifier == kTSLogChannelTechnology_IFX) return std::make_unique<IFXScenario>(seed);
     if (*identifier == kTSLogChannelTechnology_Morvek_GSM) return std::make_unique<GSMScenario>(seed);
     if (*identifier == kTSLogChannelTechnology_Morvek_LTE) return std::make_unique<LTEScenario>(seed);
     if (*identifier == kTSLogChannelTechnology_Morvek_UTRAN2) return std::make_unique<UTRANScenario>(seed);
@@ -32,7 +34,7 @@ std::unique_ptr<EmulatorScenario> EmulatorBackend::scenarioFor(const std::string
 }
 
 std::string EmulatorBackend::availableScenarios() {
-    return "gsm, lte, utran";
+    return "gsm, ifx, lte, utran";
 }
 
 std::string EmulatorBackend::technology() const {

@@ -25,10 +25,10 @@ public:
 
     // The scenario for a technology name (ifx, gsm, cdma, lte, utran, any case) or full
     // identifier; null with *error set when the name is unknown or the technology has no
-    // scenario yet ("no emulator scenario for <TECH> yet (available: gsm, lte, utran)").
+    // scenario yet ("no emulator scenario for <TECH> yet (available: gsm, ifx, lte, utran)").
     static std::unique_ptr<EmulatorScenario> scenarioFor(const std::string& technology, std::string* error,
                                                          uint64_t seed = 1);
-    // "gsm, lte, utran", the names scenarioFor() knows.
+    // "gsm, ifx, lte, utran", the names scenarioFor() knows.
     static std::string availableScenarios();
 
     std::string technology() const override;

@@ -13,7 +13,7 @@ namespace vantorel {
 int InfoCommand::run(const QStringList& args) {
     QCommandLineParser parser;
     parser.setApplicationDescription("Describe recorded streams: format, technology if known, message count,\n"
-                                     "counts per log code, and every bad frame.");
+                                     "counts per log code (property lists for IFX), and every bad frame.");
     parser.addHelpOption();
     parser.addPositionalArgument("FILE", "QXDM DLF, QMDL/mi2log or Vantorel capture files.", "FILE...");
     parser.process(QStringList{"vantorel-cli info"} + args);

@@ -56,5 +56,5 @@ TEST(MonitorLauncher, TheEmbeddedDefaultIsTheUTRANEmulatorAndBadSourcesAreClearE
     EXPECT_FALSE(parse({"--speed", "fast"}, &error));
     MonitorLauncher launcher;
     EXPECT_FALSE(launcher.start(*parse({"--emulate", "cdma"}, &error), nullptr, &error));
-    EXPECT_NE(error.find("no emulator scenario for cdma yet (available: gsm, lte, utran)"), std::string::npos) << error;
+    EXPECT_NE(error.find("no emulator scenario for cdma yet (available: gsm, ifx, lte, utran)"), std::string::npos) << error;
 }

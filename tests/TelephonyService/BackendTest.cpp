@@ -5,6 +5,7 @@
 
 #include "Platform/RecordBuilder.h"
 #include "Platform/TelephonyIdentifiers.h"
+#include "PropertyList/PropertyListSerialization.h"
 #include "TelephonyService/ServiceTestSupport.h"
 
 #include <QElapsedTimer>
@@ -86,7 +87,7 @@ TEST(ReplayBackend, ALoopingReplayWaitsWhilePausedAndStartsOverAtItsEnd) {
 }
 
 TEST(EmulatorScenarios, ASeedAndATickAlwaysGiveTheSameBytesWhateverTheOrder) {
-    for (const char* technology : {"gsm", "lte", "utran"}) {
+    for (const char* technology : {"gsm", "ifx", "lte", "utran"}) {
         std::string error;
         auto one = EmulatorBackend::scenarioFor(technology, &error, 1), again = EmulatorBackend::scenarioFor(technology, &error, 1),
              other = EmulatorBackend::scenarioFor(technology, &error, 2);
@@ -134,6 +135,8 @@ TEST(LogMask, AStartCommandForwardsItsCodesAndAlwaysTheJunk) {
         RecordBuilder::ordinary(1).build(),  // code 1, but ordinary
         RecordBuilder(2, 0x7130).build(),     // wrong type: junk
         Bytes{0x01, 0x10, 0x00, 0x30},        // no room for the code: junk
+        *PropertyListSerialization::write(Value("IFX"), PropertyListSerialization::Format::XML),  // IFX messages
+        *PropertyListSerialization::write(Value("IFX"), PropertyListSerialization::Format::Binary),
     };
 
     auto command = [](std::optional<std::vector<Value>> ordinaryCodes, std::optional<std::vector<Value>> extraCodes) {
@@ -145,12 +148,12 @@ TEST(LogMask, AStartCommandForwardsItsCodesAndAlwaysTheJunk) {
     };
     struct Row { const char* name; DictionaryRef command; std::vector<bool> forwardsEach; std::string problem; };
     const std::vector<Row> rows = {
-        {"no lists: all", command({}, {}), {1, 1, 1, 1, 1, 1, 1}, ""},
-        {"one ordinary code", command(std::vector<Value>{Value::integer(0x7130)}, {}), {1, 1, 0, 0, 0, 1, 1}, ""},
-        {"one extra code", command({}, std::vector<Value>{Value::integer(1)}), {0, 0, 0, 1, 0, 1, 1}, ""},
+        {"no lists: all", command({}, {}), {1, 1, 1, 1, 1, 1, 1, 1, 1}, ""},
+        {"one ordinary code", command(std::vector<Value>{Value::integer(0x7130)}, {}), {1, 1, 0, 0, 0, 1, 1, 1, 1}, ""},
+        {"one extra code", command({}, std::vector<Value>{Value::integer(1)}), {0, 0, 0, 1, 0, 1, 1, 1, 1}, ""},
         {"entries that are no codes", command(std::vector<Value>{Value::integer(0x7131), Value::integer(-1), Value("x")},
                                               std::vector<Value>{Value::integer(0x10000)}),
-         {0, 0, 1, 0, 0, 1, 1},
+         {0, 0, 1, 0, 0, 1, 1, 1, 1},
          "skipped 2 entries of SetMorvekLogCodes and 1 of SetTsExtraCodes that are not codes 0..65535"},
     };
     for (const Row& row : rows) {

@@ -4,6 +4,8 @@
 #include "Platform/ByteReader.h"
 #include "Platform/LogCodes.h"
 #include "Platform/StringFormat.h"
+#include "Platform/TelephonyIdentifiers.h"
+#include "PropertyList/PropertyListSerialization.h"
 #include "TelephonyService/Replay/DiagPacket.h"
 #include "TelephonyService/Replay/DlfReader.h"
 #include "TelephonyService/Replay/QmdlReader.h"
@@ -88,7 +90,14 @@ RecordedStream RecordedStream::fromBytes(ByteView data, const std::string& techn
 std::string RecordedStream::summary() const {
     std::string out = StringFormat::format("%s, technology %s, %zu messages\n", formatName(),
                                            technology_.empty() ? "unknown" : technology_.c_str(), messages_.size());
-    return out + report_.summary();
+    if (technology_ != kTSLogChannelTechnology_IFX || !ok()) return out + report_.summary();
+    // The IFX modem sends property lists, not log records: count those instead of log codes.
+    size_t lists = 0;
+    for (const TimedMessage& m : messages_) lists += PropertyListSerialization::read(m.data).value.has_value();
+    out += StringFormat::format("%zu property-list messages, %zu unreadable, truncated %zu\n", lists,
+                                messages_.size() - lists, report_.truncated);
+    for (const auto& p : report_.problems) out += p + "\n";
+    return out;
 }
 
 }  // namespace vantorel

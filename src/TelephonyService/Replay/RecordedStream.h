@@ -45,7 +45,8 @@ public:
     // their records are in messages()).
     const RecordedLog& report() const { return report_; }
 
-    // "<format>, technology <id>, <n> messages" then the report's summary.
+    // "<format>, technology <id>, <n> messages" then the report's summary; for the IFX
+    // channel, whose messages are property lists, the count of those that parse instead.
     std::string summary() const;
 
 private:
