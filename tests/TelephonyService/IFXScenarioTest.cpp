@@ -11,7 +11,6 @@
 #include <QTemporaryDir>
 #include <gtest/gtest.h>
 
-#include <functional>
 #include <set>
 
 namespace vantorel {
@@ -19,18 +18,10 @@ namespace {
 
 // True when every leaf is a string and nothing is empty once each array loses its first element.
 bool displayable(const Value& v) {
-    if (v.isString()) return true;
-    if (auto d = v.asDictionary()) {
-        bool ok = d->size() > 0;
-        for (const auto& entry : *d) ok = ok && displayable(entry.second);
-        return ok;
-    }
-    if (auto a = v.asArray()) {
-        bool ok = a->size() > 1;
-        for (const Value& e : *a) ok = ok && displayable(e);
-        return ok;
-    }
-    return false;
+    bool ok = v.isString() || (v.asDictionary() && v.asDictionary()->size() > 0) || (v.asArray() && v.asArray()->size() > 1);
+    if (auto d = v.asDictionary()) for (const auto& entry : *d) ok = ok && displayable(entry.second);
+    if (auto a = v.asArray()) for (const Value& e : *a) ok = ok && displayable(e);
+    return ok;
 }
 
 TEST(IFXScenario, EveryTickIsOneDisplayListExceptTheRefusedOnesAndTheServingCellMoves) {
