@@ -86,6 +86,7 @@ TEST(RankingSets, UMTSAndGSMSetsDecodeTheSameBytesTheirOwnWay) {
     const std::tuple<std::vector<Bytes>, std::string, std::string> rows[] = {
         {{ranking(1, 1)}, u, g},
         {{ranking(0, 1)}, "[]", g},
+        {{ranking(1, 1), ranking(0, 1)}, "[]", g},  // a count of 0 empties the list
         {{ranking(1, 1), ranking(9, 2)}, u, g},  // counts beyond the record: only whole entries
         {{ranking(1, 1), ranking(0, 0, 14)}, u, g},
         {{ranking(1, 1), ranking(1, 0, 15)}, "[]", "[]"},
