@@ -1,6 +1,7 @@
 // LogGenerator: the abstract decoder, its snapshot history and the choice of decoder by technology.
 #include "LogGenerator/LogGenerator.h"
 
+#include "LogGenerator/GSM/GSMLogGenerator.h"
 #include "LogGenerator/LTE/LTELogGenerator.h"
 #include "LogGenerator/MVK_GSM/MVK_GSMLogGenerator.h"
 #include "LogGenerator/UTRAN/UTRANLogGenerator.h"
@@ -83,7 +84,7 @@ struct TechnologyRow {
 // Channel technology to decoder, first match wins; the technologies without a decoder
 // of their own yet give none.
 const TechnologyRow kTechnologies[] = {
-    {kTSLogChannelTechnology_IFX, nullptr},
+    {kTSLogChannelTechnology_IFX, &GSMLogGenerator::generator},
     {kTSLogChannelTechnology_Morvek_GSM, &MVK_GSMLogGenerator::generator},
     {kTSLogChannelTechnology_Morvek_CDMA, nullptr},
     {kTSLogChannelTechnology_Morvek_LTE, &LTELogGenerator::generator},
