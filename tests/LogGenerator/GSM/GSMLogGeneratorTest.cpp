@@ -1,9 +1,13 @@
 // Tests the IFX GSM decoder: message objects to displays, refused messages, start command and save contents.
 #include "LogGenerator/GSM/GSMLogGenerator.h"
 #include "LogGenerator/SectionTesting.h"
+#include "Platform/TelephonyIdentifiers.h"
 #include "PropertyList/PropertyListSerialization.h"
+#include "TelephonyService/Emulator/IFXScenario.h"
 
 #include <gtest/gtest.h>
+
+#include <set>
 
 namespace vantorel {
 namespace {
@@ -82,6 +86,28 @@ TEST(GSMLogGenerator, StartsStreamingAndSavesTheHistoryWithoutADlf) {
     EXPECT_EQ(contents, state.get("History"));
     ASSERT_EQ(contents.asArray()->size(), 2u);
     EXPECT_EQ(render(contents.asArray()->at(1).asDictionary()->get("Display")), "{v=2}");
+}
+
+TEST(GSMLogGenerator, TheEmulatorsStreamShowsEveryGroupAndRefusesOnlyItsBrokenMessages) {
+    std::unique_ptr<LogGenerator> g = LogGenerator::generatorFromTechnology(kTSLogChannelTechnology_IFX);
+    ASSERT_TRUE(g);
+    IFXScenario scenario(4);
+    Dictionary state;
+    SystemLogCapture log;
+    std::set<std::string> servingCells;
+    for (uint64_t tick = 0; tick < 120; ++tick) {
+        for (const Bytes& message : scenario.recordsForTick(tick)) g->updateState(state, message);
+        const DictionaryRef display = g->generateLogUsingState(state);
+        ASSERT_TRUE(display);
+        servingCells.insert(sectiontest::at(display, {"Serving Cell", "Identity", "Cell ID"}));
+        std::vector<std::string> empty;
+        sectiontest::unfilled(Value(display), "", empty);
+        EXPECT_TRUE(empty.empty()) << tick << ": " << ::testing::PrintToString(empty);
+        for (const char* group : {"Serving Cell", "Neighbours", "Radio Resource", "Registration"})
+            EXPECT_NE(sectiontest::at(display, {group}), "<missing>") << tick;
+    }
+    EXPECT_EQ(sectiontest::errorLines(log).size(), 120 / IFXScenario::kRefusedPeriod);
+    EXPECT_GE(servingCells.size(), 3u);
 }
 
 }  // namespace
