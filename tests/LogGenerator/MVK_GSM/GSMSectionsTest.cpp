@@ -133,6 +133,8 @@ TEST(GSMCellMonitor, ServingAndNeighbourCellsShowWhatTheyCarryAndSayWhatIsMissin
     const char *gsm = kTSCellMonitorRadioAccessTechnologyGSM, *serving = kTSCellMonitorCellTypeServing,
                *neighbour = kTSCellMonitorCellTypeNeighbor;
     const Bytes cells = cellMonitor({
+        // A technology that is a number, not a name, matches nothing.
+        cell(nullptr, serving, {{kTSCellMonitorCellRadioAccessTechnology, 1}, {kTSCellMonitorCellId, 7}}),
         cell(kTSCellMonitorRadioAccessTechnologyUMTS, neighbour, {{kTSCellMonitorARFCN, 1}}),
         cell(gsm, neighbour, {{kTSCellMonitorARFCN, 0x10000 + 12}, {kTSCellMonitorRSSI, 32767}}),
         cell(gsm, serving, {{kTSCellMonitorCellId, 99}, {kTSCellMonitorARFCN, 20}}),
