@@ -81,6 +81,9 @@ protected:
     int32_t uniform(int32_t low, int32_t high);
     // True with the given probability in percent (0 never, 100 always).
     bool chance(uint32_t percent);
+    // One step of a random walk pulled gently back towards target, so values wander
+    // without piling up at the limits.
+    static int32_t pulled(int32_t value, int32_t step, int32_t target) { return value + step + (target - value) / 10; }
     // The record time stamp (bytes 5..12, never read by the decoders) of tick n,
     // in the modem's format: 1.25 ms units since start in bits 16..63, bits 0..15 zero.
     uint64_t timestampForTick(uint64_t tick) const;

@@ -72,11 +72,6 @@ uint32_t ecioEnergy(int32_t dB) {
     return static_cast<uint32_t>(e);
 }
 
-// A random walk step pulled gently back towards target.
-int32_t pulled(int32_t value, int32_t step, int32_t target) {
-    return value + step + (target - value) / 10;
-}
-
 }  // namespace
 
 GSMScenario::GSMScenario(uint64_t seed) : EmulatorScenario(seed) {

@@ -39,11 +39,6 @@ Value wrapped(const char* key, Value value) {
     return Value(d);
 }
 
-// A GSM random walk step pulled gently back towards target.
-int32_t pulled(int32_t value, int32_t step, int32_t target) {
-    return value + step + (target - value) / 10;
-}
-
 }  // namespace
 
 IFXScenario::IFXScenario(uint64_t seed) : EmulatorScenario(seed) {

@@ -54,12 +54,6 @@ constexpr int32_t kRSRPMax = -65 * 4;
 constexpr int32_t kRSRQMin = -19 * 4;
 constexpr int32_t kRSRQMax = -4 * 4;
 
-// A random walk step pulled gently back towards target, so values wander
-// without piling up at the limits.
-int32_t pulled(int32_t value, int32_t step, int32_t target) {
-    return value + step + (target - value) / 10;
-}
-
 uint32_t clampRaw(int32_t raw, uint32_t bits) {
     return static_cast<uint32_t>(std::clamp(raw, 0, static_cast<int32_t>((1u << bits) - 1)));
 }

@@ -37,12 +37,6 @@ int32_t clampRSCP(int32_t dBm) {
     return std::clamp(dBm, kRSCPMin, kRSCPMax);
 }
 
-// A random walk step pulled gently back towards target, so values wander
-// without piling up at the limits.
-int32_t pulled(int32_t value, int32_t step, int32_t target) {
-    return value + step + (target - value) / 10;
-}
-
 // P-CCPCH RSCP in the raw unit of the 8-bit "Filter RSCP" field: the 3GPP TS 25.123
 // reporting range PCCPCH_RSCP_LEV = RSCP + 116 (0 = below -115 dBm, 91 = -25 dBm and up).
 uint8_t rawRSCP(int32_t dBm) {
