@@ -17,6 +17,16 @@ inline constexpr int32_t kSimFiles = 0xFF0000;     // extra 0: SIM elementary fi
 inline constexpr int32_t kCellMonitor = 0xFF0001;  // extra 1: cell-monitor array of dictionaries
 inline constexpr int32_t kPDPContexts = 0xFF0002;  // extra 2: packet-data contexts
 
+// CDMA2000 1x and EV-DO (HDR).
+inline constexpr int32_t kC2KFingerCI = 0x108A;          // searcher fingers: PN offset and C/I
+inline constexpr int32_t kC2KHDRStatus = 0x1183;         // EV-DO channel, AGC, pilot, device and session state, UATI
+inline constexpr int32_t kC2KForwardDataRate = 0x1192;   // EV-DO forward-link packet counters
+inline constexpr int32_t kC2K1xStatus = 0x119C;          // 1x status subpackets: state, RF, active set, fingers
+inline constexpr int32_t kC2KTrafficFER = 0x119D;        // 1x traffic demodulation: frame in error
+inline constexpr int32_t kC2KReverseDataRate = 0x127E;   // EV-DO reverse-link packet counters
+inline constexpr int32_t kC2KHDRActiveSet = 0x12B6;      // EV-DO active-set pilots and strengths
+inline constexpr int32_t kC2KSystemIdentity = 0x134F;    // roaming indicator, SID, NID, packet zone, base ID
+
 // UMTS (WCDMA) access stratum.
 inline constexpr int32_t kUMTSReselectionRanking = 0x4005;  // ranked UMTS and GSM cells of cell reselection
 inline constexpr int32_t kUMTSTransmitPower = 0x4031;       // uplink transmit power samples
