@@ -1,6 +1,7 @@
 // LogGenerator: the abstract decoder, its snapshot history and the choice of decoder by technology.
 #include "LogGenerator/LogGenerator.h"
 
+#include "LogGenerator/C2K/C2KLogGenerator.h"
 #include "LogGenerator/GSM/GSMLogGenerator.h"
 #include "LogGenerator/LTE/LTELogGenerator.h"
 #include "LogGenerator/MVK_GSM/MVK_GSMLogGenerator.h"
@@ -41,6 +42,7 @@ void LogGenerator::forgetDisplay(Dictionary& state) {
     state.remove("Display");
     state.remove("Template");
     state.remove("ExtraInfo");
+    state.remove("Lookup");  // the CDMA decoder's bindings into its display
 }
 
 void LogGenerator::updateHistoryInState(Dictionary& state) {
@@ -78,15 +80,14 @@ using Factory = std::unique_ptr<LogGenerator> (*)();
 
 struct TechnologyRow {
     const char* identifier;
-    Factory generator;  // null until the technology's decoder is built
+    Factory generator;
 };
 
-// Channel technology to decoder, first match wins; the technologies without a decoder
-// of their own yet give none.
+// Channel technology to decoder, compared by value, first match wins.
 const TechnologyRow kTechnologies[] = {
     {kTSLogChannelTechnology_IFX, &GSMLogGenerator::generator},
     {kTSLogChannelTechnology_Morvek_GSM, &MVK_GSMLogGenerator::generator},
-    {kTSLogChannelTechnology_Morvek_CDMA, nullptr},
+    {kTSLogChannelTechnology_Morvek_CDMA, &C2KLogGenerator::generator},
     {kTSLogChannelTechnology_Morvek_LTE, &LTELogGenerator::generator},
     {kTSLogChannelTechnology_Morvek_UTRAN2, &UTRANLogGenerator::generator},
 };
@@ -96,7 +97,6 @@ const TechnologyRow kTechnologies[] = {
 std::unique_ptr<LogGenerator> LogGenerator::generatorFromTechnology(const std::string& technology) {
     for (const auto& row : kTechnologies) {
         if (technology != row.identifier) continue;
-        if (!row.generator) return nullptr;
         // A decoder that could not set itself up (no display template resource) is
         // unusable: the model gets none, as for an unknown identifier.
         std::unique_ptr<LogGenerator> generator = row.generator();

@@ -28,7 +28,7 @@ public:
     virtual Value getSaveContentsFromState(Dictionary& state);
 
     // Drops the display this or any earlier decoder kept in the state ("Display",
-    // "Template", "ExtraInfo"), called when the model chooses a new decoder. A display
+    // "Template", "ExtraInfo", "Lookup"), called when the model chooses a new decoder. A display
     // dictionary is bound to the sections of the decoder that built it: left in place,
     // the new decoder's sections would never be bound to it and the display would
     // freeze. "History" and the rest of the state stay.

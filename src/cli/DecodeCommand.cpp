@@ -77,7 +77,7 @@ int DecodeCommand::run(const QStringList& args) {
             decoder = LogGenerator::generatorFromTechnology(stream.technology());
             decoderTechnology = stream.technology();
             if (!decoder) {
-                std::fprintf(stderr, "vantorel-cli decode: no decoder for %s yet\n",
+                std::fprintf(stderr, "vantorel-cli decode: no decoder for %s\n",
                              TechnologyNames::shortName(stream.technology()).c_str());
                 return 1;
             }
