@@ -3,6 +3,9 @@
 
 #include "PropertyList/Value.h"
 
+#include <cstdint>
+#include <optional>
+
 namespace vantorel {
 
 class Dictionary;
@@ -14,6 +17,11 @@ public:
     static void oneXStatus(ByteView record, Dictionary& state, const DictionaryRef& lookup);      // 0x119C
     static void trafficFER(ByteView record, Dictionary& state, const DictionaryRef& lookup);      // 0x119D
     static void systemIdentity(ByteView record, Dictionary& state, const DictionaryRef& lookup);  // 0x134F
+
+private:
+    // Offset of the first subpacket with that identifier in the record's list, or none
+    // (a size that runs past the list's bound is logged).
+    static std::optional<size_t> findSubpacket(ByteView record, uint8_t identifier);
 };
 
 }  // namespace vantorel
