@@ -4,6 +4,7 @@
 #include "Platform/StringFormat.h"
 #include "Platform/TechnologyNames.h"
 #include "Platform/TelephonyIdentifiers.h"
+#include "TelephonyService/Emulator/CDMAScenario.h"
 #include "TelephonyService/Emulator/GSMScenario.h"
 #include "TelephonyService/Emulator/IFXScenario.h"
 #include "TelephonyService/Emulator/LTEScenario.h"
@@ -23,18 +24,16 @@ std::unique_ptr<EmulatorScenario> EmulatorBackend::scenarioFor(const std::string
                                                                uint64_t seed) {
     const std::optional<std::string> identifier = technologyIdentifier(technology, error);
     if (!identifier) return nullptr;
+    // Every known technology has a scenario; technologyIdentifier() rejected the rest.
     if (*identifier == kTSLogChannelTechnology_IFX) return std::make_unique<IFXScenario>(seed);
     if (*identifier == kTSLogChannelTechnology_Morvek_GSM) return std::make_unique<GSMScenario>(seed);
+    if (*identifier == kTSLogChannelTechnology_Morvek_CDMA) return std::make_unique<CDMAScenario>(seed);
     if (*identifier == kTSLogChannelTechnology_Morvek_LTE) return std::make_unique<LTEScenario>(seed);
-    if (*identifier == kTSLogChannelTechnology_Morvek_UTRAN2) return std::make_unique<UTRANScenario>(seed);
-    if (error)
-        *error = StringFormat::format("no emulator scenario for %s yet (available: %s)", technology.c_str(),
-                                      availableScenarios().c_str());
-    return nullptr;
+    return std::make_unique<UTRANScenario>(seed);  // kTSLogChannelTechnology_Morvek_UTRAN2, the one left
 }
 
 std::string EmulatorBackend::availableScenarios() {
-    return "gsm, ifx, lte, utran";
+    return "cdma, gsm, ifx, lte, utran";
 }
 
 std::string EmulatorBackend::technology() const {

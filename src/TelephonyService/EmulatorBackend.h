@@ -24,11 +24,10 @@ public:
     ~EmulatorBackend() override;
 
     // The scenario for a technology name (ifx, gsm, cdma, lte, utran, any case) or full
-    // identifier; null with *error set when the name is unknown or the technology has no
-    // scenario yet ("no emulator scenario for <TECH> yet (available: gsm, ifx, lte, utran)").
+    // identifier; null with *error set when the name is unknown.
     static std::unique_ptr<EmulatorScenario> scenarioFor(const std::string& technology, std::string* error,
                                                          uint64_t seed = 1);
-    // "gsm, ifx, lte, utran", the names scenarioFor() knows.
+    // "cdma, gsm, ifx, lte, utran", the names scenarioFor() knows.
     static std::string availableScenarios();
 
     std::string technology() const override;

@@ -108,7 +108,7 @@ public:
     ~TelephonyService() override;
 
     // The backend the options ask for; null with *error set (unknown technology, file
-    // missing or unreadable, no scenario yet, a QMDL / DLF file without --technology, ...).
+    // missing or unreadable, a QMDL / DLF file without --technology, ...).
     static std::unique_ptr<ModemBackend> createBackend(const TelephonyServiceOptions& options, std::string* error);
 
     // Builds the backend and the recorder and listens on the well-known port; false with

@@ -87,7 +87,7 @@ TEST(ReplayBackend, ALoopingReplayWaitsWhilePausedAndStartsOverAtItsEnd) {
 }
 
 TEST(EmulatorScenarios, ASeedAndATickAlwaysGiveTheSameBytesWhateverTheOrder) {
-    for (const char* technology : {"gsm", "ifx", "lte", "utran"}) {
+    for (const char* technology : {"cdma", "gsm", "ifx", "lte", "utran"}) {
         std::string error;
         auto one = EmulatorBackend::scenarioFor(technology, &error, 1), again = EmulatorBackend::scenarioFor(technology, &error, 1),
              other = EmulatorBackend::scenarioFor(technology, &error, 2);
