@@ -47,7 +47,9 @@ TEST(C2KDecoder, FramingDecidesWhatIsDecodedAndWhatIsKeptForTheLog) {
     typeTwo[0] = 2;
     Bytes wide = status;
     wide[0] = 0xFF;
-    const Bytes prefixedShort = RecordBuilder::ordinary(0x1183, 11).buildWithPrefix();
+    // 13 bytes with the 0x81 0x00 prefix: an 11-byte record reaches the routine.
+    Bytes prefixedShort = RecordBuilder::ordinary(0x1183).buildWithPrefix();
+    prefixedShort.resize(13);
     struct Row {
         Bytes record;
         std::string channel;  // "kChannel" afterwards
@@ -76,7 +78,8 @@ TEST(C2KDecoder, FramingDecidesWhatIsDecodedAndWhatIsKeptForTheLog) {
 
 TEST(C2KDecoder, TheStartCommandAsksForTheEightCodesInOrder) {
     std::vector<int64_t> codes;
-    for (const Value& v : *C2KLogGenerator::generator()->getStartCommand()->get("SetMorvekLogCodes").asArray())
+    const DictionaryRef command = C2KLogGenerator::generator()->getStartCommand();
+    for (const Value& v : *command->get("SetMorvekLogCodes").asArray())
         codes.push_back(*v.asInteger());
     EXPECT_EQ(codes, (std::vector<int64_t>{0x108a, 0x1183, 0x1192, 0x12b6, 0x119c, 0x119d, 0x127e, 0x134f}));
 }
