@@ -1,4 +1,4 @@
-// RoutingBench: records/s through a decoder's updateState (framing, routing to the sections, section decoding) for 2,000 ticks of its emulator scenario (UTRAN, LTE, GSM/UMTS), with the model's display snapshot every 4 ticks; and the cost of one snapshot.
+// RoutingBench: records/s through a decoder's updateState (framing, routing to the sections, section decoding) for 2,000 ticks of its emulator scenario (UTRAN, LTE, GSM/UMTS, CDMA, IFX), with the model's display snapshot every 4 ticks; and the cost of one snapshot.
 #include "LogGenerator/LogGenerator.h"
 #include "PropertyList/Dictionary.h"
 #include "TelephonyService/EmulatorBackend.h"
@@ -91,6 +91,8 @@ void BM_Routing(benchmark::State& state, const char* technology) {
 BENCHMARK_CAPTURE(BM_Routing, UTRANScenario, "utran")->ArgName("syslogMasked")->Arg(0)->Arg(1)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(BM_Routing, LTEScenario, "lte")->ArgName("syslogMasked")->Arg(0)->Arg(1)->Unit(benchmark::kMillisecond);
 BENCHMARK_CAPTURE(BM_Routing, GSMScenario, "gsm")->ArgName("syslogMasked")->Arg(0)->Arg(1)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Routing, CDMAScenario, "cdma")->ArgName("syslogMasked")->Arg(0)->Arg(1)->Unit(benchmark::kMillisecond);
+BENCHMARK_CAPTURE(BM_Routing, IFXScenario, "ifx")->ArgName("syslogMasked")->Arg(0)->Arg(1)->Unit(benchmark::kMillisecond);
 
 // One generateLogUsingState on a display filled by the whole stream: the 4-tick
 // snapshot (DisplayState hand-over, History trim, deep copies of Display and ExtraInfo).
