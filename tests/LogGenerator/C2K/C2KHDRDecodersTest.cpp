@@ -131,5 +131,19 @@ TEST(C2KHDRDecoders, RatesPrimeOnTheFirstRecordAndAdvanceOnlyWithTheSequenceNumb
     }
 }
 
+TEST(C2KHDRDecoders, EveryPacketCounterCountsWithItsPacketSize) {
+    // Every counter at 1000 after a record of zeros, one sequence step apart: forward 1000 x
+    // 48,896 bits (the 56 sizes summed) / 1024; reverse 1000 x 24 counters x 40,064 bits / 1024.
+    for (const bool forward : {true, false}) {
+        Bench bench({forward ? "kFLDataRate" : "kRLDataRate"});
+        const auto rates = forward ? C2KHDRDecoders::forwardDataRate : C2KHDRDecoders::reverseDataRate;
+        RecordBuilder record = RecordBuilder::ordinary(forward ? 0x1192 : 0x127E, forward ? 241 : 1750);
+        rates(record.u32(forward ? 13 : 14, 1).build(), bench.state, bench.lookup);
+        for (size_t at = forward ? 17 : 18; at + 4 <= (forward ? 241u : 1750u); at += 4) record.u32(at, 1000);
+        rates(record.u32(forward ? 13 : 14, 2).build(), bench.state, bench.lookup);
+        EXPECT_EQ(bench.shown(), forward ? "47750.00 kbps" : "939000.00 kbps");
+    }
+}
+
 }  // namespace
 }  // namespace vantorel
