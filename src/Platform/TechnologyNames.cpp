@@ -12,13 +12,14 @@ namespace {
 struct Row {
     const char* name;
     const char* identifier;
+    const char* displayName;
 };
 const Row kRows[] = {
-    {"ifx", kTSLogChannelTechnology_IFX},
-    {"gsm", kTSLogChannelTechnology_Morvek_GSM},
-    {"cdma", kTSLogChannelTechnology_Morvek_CDMA},
-    {"lte", kTSLogChannelTechnology_Morvek_LTE},
-    {"utran", kTSLogChannelTechnology_Morvek_UTRAN2},
+    {"ifx", kTSLogChannelTechnology_IFX, "GSM (IFX)"},
+    {"gsm", kTSLogChannelTechnology_Morvek_GSM, "GSM/UMTS"},
+    {"cdma", kTSLogChannelTechnology_Morvek_CDMA, "CDMA2000"},
+    {"lte", kTSLogChannelTechnology_Morvek_LTE, "LTE"},
+    {"utran", kTSLogChannelTechnology_Morvek_UTRAN2, "UTRAN (TD-SCDMA)"},
 };
 }  // namespace
 
@@ -40,6 +41,25 @@ std::string TechnologyNames::listing() {
     std::string out;
     for (const Row& row : kRows) out += (out.empty() ? "" : ", ") + std::string(row.name);
     return out;
+}
+
+std::string TechnologyNames::displayName(const std::string& identifier) {
+    for (const Row& row : kRows)
+        if (identifier == row.identifier) return row.displayName;
+    return identifier;
+}
+
+std::optional<std::string> TechnologyNames::identifierForLogCode(int32_t code) {
+    // The diagnostic log code's top nibble is its equipment (subsystem) ID.
+    switch ((code >> 12) & 0xF) {
+        case 0x1: return std::string(kTSLogChannelTechnology_Morvek_CDMA);
+        case 0x4:
+        case 0x5:
+        case 0x7: return std::string(kTSLogChannelTechnology_Morvek_GSM);
+        case 0xB: return std::string(kTSLogChannelTechnology_Morvek_LTE);
+        case 0xD: return std::string(kTSLogChannelTechnology_Morvek_UTRAN2);
+        default: return std::nullopt;
+    }
 }
 
 }  // namespace vantorel
