@@ -3,6 +3,7 @@
 #include "Platform/QuitOnSignal.h"
 #include "Platform/SystemLog.h"
 #include "Monitor/MonitorLauncher.h"
+#include "Monitor/TerminalFallback.h"
 #include "Monitor/TerminalView.h"
 
 #include <QApplication>
@@ -13,15 +14,6 @@
 #include <cstdlib>
 
 namespace {
-
-// A display to open a window on: X11, Wayland, or a Qt platform chosen explicitly.
-bool haveDisplay() {
-    for (const char* variable : {"DISPLAY", "WAYLAND_DISPLAY", "QT_QPA_PLATFORM"}) {
-        const char* value = std::getenv(variable);
-        if (value && *value) return true;
-    }
-    return false;
-}
 
 // Reads the options with `app` (a QCoreApplication or QApplication); prints the
 // problem and gives nothing on bad use.
@@ -48,11 +40,12 @@ std::optional<vantorel::MonitorLauncher::Source> parseOptions(QCoreApplication& 
 int main(int argc, char** argv) {
     using namespace vantorel;
     QCommandLineParser parser;
-    if (!haveDisplay()) {
+    // Asked before QApplication exists: Qt aborts the process on a display that does not answer.
+    if (const auto why = TerminalFallback::reason()) {
         QCoreApplication app(argc, argv);
         auto source = parseOptions(app, parser);
         if (!source) return 2;
-        std::fprintf(stderr, "vantorel: no display (DISPLAY and WAYLAND_DISPLAY are unset): showing the terminal view\n");
+        std::fprintf(stderr, "vantorel: %s: showing the terminal view\n", why->c_str());
         return TerminalView::run(*source, "vantorel");
     }
 

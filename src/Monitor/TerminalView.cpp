@@ -1,12 +1,14 @@
-// TerminalView: the status line and the display tree as text, reprinted on every refresh.
+// TerminalView: the status line and the display tree as text, redrawn on every refresh; on a terminal, one level at a time with a cursor moved by keys.
 #include "Monitor/TerminalView.h"
 
 #include "Model/VantorelModel.h"
-#include "Platform/QuitOnSignal.h"
+#include "Monitor/TerminalRawMode.h"
 #include "Monitor/TreeFormatter.h"
+#include "Platform/QuitOnSignal.h"
 
 #include <QCoreApplication>
 #include <QDateTime>
+#include <QSocketNotifier>
 #include <QTimer>
 
 #include <sys/ioctl.h>
@@ -14,25 +16,39 @@
 
 namespace vantorel {
 
-TerminalView::TerminalView(std::FILE* out) : out_(out), interactive_(isatty(fileno(out)) == 1) {}
+TerminalView::TerminalView(std::FILE* out)
+    : out_(out), interactive_(isatty(fileno(out)) == 1 && isatty(STDIN_FILENO) == 1) {}
 
 TerminalView::~TerminalView() = default;
 
 void TerminalView::setModel(VantorelModel* model) {
     model_ = model;
     if (!connectionTimer_) {
-        // "Connecting..." while the channel is down, said once per loss.
+        // "Connecting..." while the channel is down, said once per loss; on a
+        // terminal, the same tick notices a resized window.
         connectionTimer_ = new QTimer(this);
         connectionTimer_->setInterval(500);
         connect(connectionTimer_, &QTimer::timeout, this, [this] { watchConnection(); });
         connectionTimer_->start();
+    }
+    if (interactive_ && !rawMode_) {
+        rawMode_ = std::make_unique<TerminalRawMode>(STDIN_FILENO);
+        keys_ = new QSocketNotifier(STDIN_FILENO, QSocketNotifier::Read, this);
+        connect(keys_, &QSocketNotifier::activated, this, [this] { readKeys(); });
+        navigator_.setRoot(model_ ? model_->topLevelNodes() : nullptr);
+        draw();
     }
 }
 
 void TerminalView::watchConnection() {
     if (!model_) return;
     const bool connected = model_->isConnected();
-    if (!connected && wasConnected_) {
+    if (interactive_) {
+        winsize size{};
+        const bool resized = ::ioctl(fileno(out_), TIOCGWINSZ, &size) == 0 && (size.ws_col != width_ || size.ws_row != height_);
+        if (!connected && wasConnected_) status_ = StatusText::kConnecting;
+        if (resized || connected != wasConnected_) draw();
+    } else if (!connected && wasConnected_) {
         status_ = StatusText::kConnecting;
         std::fprintf(out_, "%s\n", status_.c_str());
         std::fflush(out_);
@@ -40,40 +56,68 @@ void TerminalView::watchConnection() {
     wasConnected_ = connected;
 }
 
-std::string TerminalView::screen() const {
+std::string TerminalView::statusLine() const {
     std::string text = "Vantorel";
     if (model_ && model_->logGenerator()) {
         text += " - ";
         text += model_->isConnected() ? status_ : StatusText::kConnecting;
         text += " - " + std::to_string(model_->messagesDecoded()) + " messages decoded";
     }
-    text += "\n\n";
+    return text;
+}
+
+std::string TerminalView::screen() const {
+    std::string text = statusLine() + "\n\n";
     if (model_) text += TreeFormatter::compactTree(model_->topLevelNodes());
     return text;
+}
+
+void TerminalView::readKeys() {
+    char buffer[256];
+    const ssize_t n = ::read(STDIN_FILENO, buffer, sizeof buffer);
+    if (n <= 0) {  // the terminal is gone: keys end, the display goes on until a signal
+        keys_->setEnabled(false);
+        return;
+    }
+    pendingKeys_.append(buffer, static_cast<size_t>(n));
+    const int rows = std::max(1, height_ - TerminalNavigator::kHeaderLines - TerminalNavigator::kFooterLines);
+    for (TerminalKeys::Key key : TerminalKeys::take(pendingKeys_)) {
+        if (!navigator_.handle(key, rows)) {
+            QCoreApplication::exit(0);
+            return;
+        }
+    }
+    draw();
+}
+
+void TerminalView::draw() {
+    winsize size{};
+    const bool known = ::ioctl(fileno(out_), TIOCGWINSZ, &size) == 0 && size.ws_col > 0 && size.ws_row > 0;
+    width_ = known ? size.ws_col : 80;
+    height_ = known ? size.ws_row : 24;
+    // Home, then every line cleared to its end; the last line without a newline so
+    // that the window never scrolls; the rest of the screen cleared.
+    std::string text = "\x1b[H";
+    const auto lines = navigator_.render(statusLine(), width_, height_);
+    for (size_t i = 0; i < lines.size(); ++i) {
+        const bool cursor = lines[i].starts_with("> ") && i >= TerminalNavigator::kHeaderLines;
+        text += cursor ? "\x1b[7m" + lines[i] + "\x1b[0m" : lines[i];
+        text += i + 1 < lines.size() ? "\x1b[K\n" : "\x1b[K";
+    }
+    text += "\x1b[J";
+    std::fwrite(text.data(), 1, text.size(), out_);
+    std::fflush(out_);
 }
 
 void TerminalView::updateViewControllerFromModel() {
     ++refreshes_;
     status_ = StatusText::updated(QDateTime::currentDateTime());
-    std::string text = screen();
     if (interactive_) {
-        // Keep the top of the display in view: cut to the window's height.
-        winsize size{};
-        if (::ioctl(fileno(out_), TIOCGWINSZ, &size) == 0 && size.ws_row > 2) {
-            size_t rows = 0, pos = 0;
-            while (pos != std::string::npos && rows + 1 < size.ws_row) {
-                pos = text.find('\n', pos);
-                if (pos != std::string::npos) ++pos, ++rows;
-            }
-            if (pos != std::string::npos && pos < text.size()) {
-                size_t hidden = 0;
-                for (size_t i = pos; i < text.size(); ++i) hidden += text[i] == '\n';
-                text = text.substr(0, pos) + "... " + std::to_string(hidden) + " more rows (a taller window shows them)";
-            }
-        }
-        std::fprintf(out_, "\x1b[H\x1b[2J%s", text.c_str());  // home, clear, then the screen
-    } else
-        std::fprintf(out_, "----\n%s", text.c_str());
+        navigator_.setRoot(model_ ? model_->topLevelNodes() : nullptr);
+        draw();
+        return;
+    }
+    std::fprintf(out_, "----\n%s", screen().c_str());
     std::fflush(out_);
 }
 
@@ -85,9 +129,10 @@ int TerminalView::run(const MonitorLauncher::Source& source, const char* program
         std::fprintf(stderr, "%s: %s\n", program, error.c_str());
         return 1;
     }
-    view.setModel(launcher.model());
-    std::fprintf(stderr, "%s: %s; Ctrl-C ends\n", program, launcher.description().c_str());
+    std::fprintf(stderr, "%s: %s; %s ends\n", program, launcher.description().c_str(),
+                 view.interactive_ ? "q or Ctrl-C" : "Ctrl-C");
     QuitOnSignal quit;
+    view.setModel(launcher.model());
     return QCoreApplication::exec();
 }
 

@@ -1,25 +1,32 @@
-// TerminalView: the monitor in a terminal: plays the application object and prints the status line and the display tree on every refresh.
+// TerminalView: the monitor in a terminal: plays the application object and shows the status line and the display tree on every refresh, navigable with keys on a terminal.
 #pragma once
 
 #include "Model/ApplicationObject.h"
-#include "Monitor/StatusText.h"
 #include "Monitor/MonitorLauncher.h"
+#include "Monitor/StatusText.h"
+#include "Monitor/TerminalNavigator.h"
 
 #include <QObject>
 
 #include <cstdio>
+#include <memory>
 #include <string>
 
+class QSocketNotifier;
 class QTimer;
 
 namespace vantorel {
 
+class TerminalRawMode;
 class VantorelModel;
 
 class TerminalView : public QObject, public ApplicationObject {
     Q_OBJECT
 public:
-    // Writes to `out`; clears the screen before each display when `out` is a terminal.
+    // Writes to `out`. When `out` and standard input are both a terminal, the view
+    // takes the keys (arrows, Enter, Backspace, PgUp/PgDn, Home/End, q) and draws
+    // one level of the tree in the window; otherwise it prints plain screens one
+    // after another.
     explicit TerminalView(std::FILE* out = stdout);
     ~TerminalView() override;
 
@@ -27,15 +34,19 @@ public:
     void updateViewControllerFromModel() override;
     int refreshes() const { return refreshes_; }
 
-    // The text of one screen: the status line, then the tree.
+    // The status line: "Vantorel - Updated ... - 12 messages decoded".
+    std::string statusLine() const;
+    // The text of one plain screen: the status line, then the tree.
     std::string screen() const;
 
-    // The terminal view on `source` until Ctrl-C (SIGINT, SIGTERM); `program` prefixes
-    // messages. Needs a running QCoreApplication. Returns the exit code.
+    // The terminal view on `source` until q (on a terminal) or SIGINT/SIGTERM;
+    // `program` prefixes messages. Needs a running QCoreApplication. Returns the exit code.
     static int run(const MonitorLauncher::Source& source, const char* program);
 
 private:
     void watchConnection();
+    void readKeys();
+    void draw();
 
     std::FILE* out_;
     bool interactive_;
@@ -44,6 +55,11 @@ private:
     bool wasConnected_ = true;
     int refreshes_ = 0;
     std::string status_ = StatusText::kConnecting;
+    TerminalNavigator navigator_;
+    std::unique_ptr<TerminalRawMode> rawMode_;
+    QSocketNotifier* keys_ = nullptr;
+    std::string pendingKeys_;
+    int width_ = 0, height_ = 0;
 };
 
 }  // namespace vantorel

@@ -1,0 +1,112 @@
+// Tests of the terminal view's keys, its screen in a small terminal, moving through a changing tree, and the X display probe.
+#include "Monitor/TerminalFallback.h"
+#include "Monitor/TerminalKeys.h"
+#include "Monitor/TerminalNavigator.h"
+#include "PropertyList/Array.h"
+#include "PropertyList/Dictionary.h"
+
+#include <gtest/gtest.h>
+
+#include <arpa/inet.h>
+#include <chrono>
+#include <sys/socket.h>
+#include <thread>
+#include <unistd.h>
+
+using namespace vantorel;
+using Key = TerminalKeys::Key;
+
+namespace {
+
+// "Cells" holds `cells` rows (none: no "Cells"), each two values; `before` adds a value row first.
+NodeRef tree(int cells, const std::string& before = "") {
+    auto root = Dictionary::create();
+    auto list = Array::create();
+    for (int i = 0; i < cells; ++i) {
+        auto cell = Dictionary::create();
+        cell->set("UARFCN", std::to_string(10000 + i));
+        cell->set("Note", std::string(100, 'x') + "×");
+        list->append(Value(cell));
+    }
+    if (!before.empty()) root->set(before, "new");
+    root->set("Technology", "UTRAN (TD-SCDMA)");
+    if (cells >= 0) root->set("Cells", Value(list));
+    root->set("Span", "3×4 " + std::string(72, '-') + "×");  // 85 columns with its name
+    PathDictionary paths;
+    return VantorelModelNode::makeTreeFromObject(Value(root), paths);
+}
+
+}  // namespace
+
+TEST(TerminalView, KeySequencesSplitAcrossReadsAndUnknownBytesDropped) {
+    std::string pending = "\x1b[A\x1b[B\r\x7f\x1b[5~\x1b[6~\x1b[H\x1bOF\x1b[C\x1b[Dzq\x1b[1;5";
+    const std::vector<Key> keys{Key::Up,  Key::Down, Key::Enter, Key::Back, Key::PageUp, Key::PageDown,
+                                Key::Home, Key::End, Key::Enter, Key::Back, Key::Quit};
+    EXPECT_EQ(TerminalKeys::take(pending), keys);
+    EXPECT_EQ(pending, "\x1b[1;5");  // the rest of the sequence is still to come
+    pending += "B";
+    EXPECT_EQ(TerminalKeys::take(pending), std::vector<Key>{Key::Down});
+    EXPECT_TRUE(pending.empty());
+}
+
+TEST(TerminalView, An80x24ScreenKeepsTheHeaderCutsLinesAndScrollsToTheCursor) {
+    TerminalNavigator nav;
+    nav.setRoot(tree(40));
+    auto screen = nav.render("Vantorel - Updated 2016-06-28 at 22:01:10 - 12 messages decoded", 80, 24);
+    ASSERT_EQ(screen.size(), 24u);
+    EXPECT_EQ(screen[0].rfind("Vantorel - Updated", 0), 0u);
+    EXPECT_EQ(screen[4], "  Span: 3×4 " + std::string(67, '-') + "…");  // cut to 80 columns, "×" is one
+    for (const auto& line : screen) EXPECT_LE(TerminalNavigator::columns(line), 80) << line;
+
+    ASSERT_TRUE(nav.handle(Key::Down, 21) && nav.handle(Key::Enter, 21));
+    for (int i = 0; i < 25; ++i) nav.handle(Key::Down, 21);
+    screen = nav.render("status", 80, 24);
+    EXPECT_EQ(screen[1], "Vantorel / Cells  (26 of 40)");
+    EXPECT_EQ(screen[22].rfind("> 25 > UARFCN 10025 | Note xxx", 0), 0u);  // the cursor row on the last body line
+    EXPECT_EQ(screen[23].rfind("rows 6-26 of 40", 0), 0u);
+    nav.handle(Key::PageDown, 21), nav.handle(Key::PageDown, 21), nav.handle(Key::Home, 21);
+    EXPECT_EQ(nav.render("status", 80, 24)[2].rfind("> 0 > ", 0), 0u);
+    nav.handle(Key::Enter, 21), nav.handle(Key::Down, 21), nav.handle(Key::Enter, 21);  // a value row: stays
+    EXPECT_EQ(nav.path(), (std::vector<std::string>{"Cells", "0"}));
+    EXPECT_EQ(nav.cursorName(), "Note");
+    nav.handle(Key::Back, 21), nav.handle(Key::Back, 21), nav.handle(Key::Back, 21);
+    EXPECT_TRUE(nav.path().empty());
+    EXPECT_EQ(nav.cursorName(), "Cells");  // back on the row it came from
+    EXPECT_FALSE(nav.handle(Key::Quit, 21));
+}
+
+TEST(TerminalView, ARefreshKeepsTheLevelAndTheCursorRowByName) {
+    TerminalNavigator nav;
+    nav.setRoot(tree(5));
+    nav.handle(Key::Down, 21), nav.handle(Key::Enter, 21), nav.handle(Key::End, 21);
+    nav.setRoot(tree(8, "Alarm"));  // a row above, more rows: still Cells, still "4"
+    EXPECT_EQ(nav.path(), std::vector<std::string>{"Cells"});
+    EXPECT_EQ(nav.cursorName(), "4");
+    nav.setRoot(tree(-1));  // Cells gone: its parent
+    EXPECT_TRUE(nav.path().empty());
+}
+
+TEST(TerminalView, AnXDisplayAnswersOnlyWhenAServerRepliesToTheSetup) {
+    const int listener = ::socket(AF_INET, SOCK_STREAM, 0);
+    sockaddr_in address{AF_INET, 0, {htonl(INADDR_LOOPBACK)}, {}};
+    int n = 59;  // a free port 6000 + n on the loopback
+    do address.sin_port = htons(static_cast<uint16_t>(6000 + ++n));
+    while (::bind(listener, reinterpret_cast<sockaddr*>(&address), sizeof address) != 0);
+    ASSERT_EQ(::listen(listener, 4), 0);
+    const std::string tcp = "127.0.0.1:" + std::to_string(n) + ".0";
+    const auto start = std::chrono::steady_clock::now();
+    for (const std::string& nothing : {":" + std::to_string(n + 9000), "127.0.0.1:" + std::to_string(n + 1), std::string("junk")})
+        EXPECT_FALSE(TerminalFallback::displayAnswers(nothing, 2000)) << nothing;
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(500));  // refused at once
+    EXPECT_FALSE(TerminalFallback::displayAnswers(tcp, 200));  // a proxy that accepts and never replies
+    ::close(::accept(listener, nullptr, nullptr));
+    std::thread server([&] {
+        const int c = ::accept(listener, nullptr, nullptr);
+        char request[12];
+        EXPECT_TRUE(::recv(c, request, sizeof request, MSG_WAITALL) == 12 && ::send(c, "\0", 1, 0) == 1);
+        ::close(c);
+    });
+    EXPECT_TRUE(TerminalFallback::displayAnswers(tcp, 2000));  // "failed" is a reply too
+    server.join();
+    ::close(listener);
+}
