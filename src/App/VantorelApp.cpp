@@ -7,8 +7,11 @@
 #include "Model/VantorelModel.h"
 #include "Monitor/StatusText.h"
 #include "Platform/Preferences.h"
+#include "Platform/TechnologyNames.h"
 
 #include <QDateTime>
+#include <QFileInfo>
+#include <QTimer>
 #include <QGuiApplication>
 #include <QMainWindow>
 #include <QScreen>
@@ -51,7 +54,18 @@ bool VantorelApp::applicationDidFinishLaunching(std::string* error) {
 
     // Creates the model and queues restartMonitor on the main queue: connecting
     // starts after launch returns.
-    return launcher_->start(options_.source, this, error);
+    if (!launcher_->start(options_.source, this, error)) return false;
+    // The in-process service's source is known here; a running service names its own.
+    const MonitorLauncher::Source& source = options_.source;
+    if (!source.replay.empty())
+        model()->setSource("replay " + QFileInfo(QString::fromStdString(source.replay)).fileName().toStdString(), true, true);
+    else if (!source.emulate.empty())
+        model()->setSource(
+            "emulator " + TechnologyNames::displayName(TechnologyNames::identifierFor(source.emulate).value_or(source.emulate)),
+            false, true);
+    else
+        model()->setSource("service " + source.service, false, false);
+    return true;
 }
 
 void VantorelApp::applicationWillTerminate() {
@@ -98,17 +112,27 @@ void VantorelApp::updateViewControllerFromModel() {
         }
         panes[i]->reloadWithNode(node);
     }
-    if (m->isConnected()) _updateMessage = StatusText::updated(QDateTime::currentDateTime());
+    // "Updated" moves only with new data, not with a change of the stream's state.
+    if (m->isConnected() && (m->messagesDecoded() != messagesShown_ || !updatedAt_.isValid())) {
+        messagesShown_ = m->messagesDecoded();
+        updatedAt_ = QDateTime::currentDateTime();
+    }
     updateStatusForViewController(_navController->topPane());
 }
 
 void VantorelApp::updateStatusForViewController(VantorelPaneController* pane) {
     if (!pane) return;
     VantorelModel* m = model();
-    if (m && m->isConnected())
-        pane->setStatus(_updateMessage, false);
-    else
-        pane->setStatus(std::string(StatusText::kConnecting), true);
+    SourceStatus status = m ? m->sourceStatus() : SourceStatus();
+    status.firstConnect = false;
+    status.updatedAt = updatedAt_;
+    // Closed on purpose or not yet open: connecting; lost: stale until it is back.
+    if (!(m && m->isConnected()) && status.phase != SourceStatus::Phase::Disconnected)
+        status.phase = SourceStatus::Phase::Connecting;
+    _updateMessage = savedPath_.empty() ? StatusText::line(status) : "Saved " + savedPath_;
+    pane->setStatus(_updateMessage, status.phase == SourceStatus::Phase::Connecting ||
+                                        status.phase == SourceStatus::Phase::Disconnected);
+    pane->setStale(StatusText::isStale(status));
 }
 
 void VantorelApp::navigationControllerWillShow(NavigationController&, VantorelPaneController& pane) {
@@ -123,6 +147,16 @@ void VantorelApp::showSaveView() {
 
 void VantorelApp::closeSaveView() {
     if (!_saveViewController) return;
+    if (!_saveViewController->lastWritePath().empty() && !_saveViewController->errorAlert()) {
+        savedPath_ = _saveViewController->lastWritePath();
+        const int notice = ++saveNotices_;
+        QTimer::singleShot(kSavedPathMilliseconds, this, [this, notice] {
+            if (notice != saveNotices_) return;
+            savedPath_.clear();
+            if (_navController) updateStatusForViewController(_navController->topPane());
+        });
+        if (_navController) updateStatusForViewController(_navController->topPane());
+    }
     _saveViewController->hide();
     _saveViewController->deleteLater();
     _saveViewController = nullptr;

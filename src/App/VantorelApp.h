@@ -6,6 +6,7 @@
 #include "Model/ApplicationObject.h"
 #include "Monitor/MonitorLauncher.h"
 
+#include <QDateTime>
 #include <QObject>
 
 #include <memory>
@@ -46,6 +47,8 @@ public:
 
     void updateViewControllerFromModel() override;
     void updateStatusForViewController(VantorelPaneController* pane);
+    // How long the saved file's path stays on the status line.
+    static constexpr int kSavedPathMilliseconds = 5000;
     void navigationControllerWillShow(NavigationController& navigationController,
                                       VantorelPaneController& pane) override;
     void showSaveView() override;
@@ -67,6 +70,10 @@ private:
     bool _allowSaveButton = false;
     std::string _updateMessage;
     Options options_;
+    uint64_t messagesShown_ = 0;   // the model's count when "Updated" was last set
+    QDateTime updatedAt_;
+    std::string savedPath_;        // shown instead of the status for a few seconds after a save
+    int saveNotices_ = 0;          // the newest notice's number, so an older timer leaves it alone
 };
 
 }  // namespace vantorel

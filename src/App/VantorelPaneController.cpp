@@ -99,10 +99,33 @@ void VantorelPaneController::setStatus(const std::string* status, bool isLoading
 }
 
 void VantorelPaneController::reloadWithNode(NodeRef node) {
+    // The refresh replaces every row: the keyboard's place is kept by the row's name,
+    // since rows come and go and an index would land on another row.
+    const QModelIndex current = table_->currentIndex();
+    const bool selected = current.isValid() && table_->selectionModel()->isRowSelected(current.row(), QModelIndex());
+    std::optional<std::string> currentName;
+    if (current.isValid() && current.row() < numberOfRowsInSection())
+        currentName = _nodes->childNodes()->at(std::size_t(current.row()))->displayName();
+
     _nodes = std::move(node);
     updateTitle();
     reloadData();
     createToolbarItems();
+
+    const std::vector<NodeRef>* children = _nodes ? _nodes->childNodes() : nullptr;
+    for (std::size_t row = 0; currentName && children && row < children->size(); ++row) {
+        if ((*children)[row]->displayName() != *currentName) continue;
+        const QModelIndex index = table_->model()->index(int(row), 0);
+        table_->selectionModel()->setCurrentIndex(
+            index, selected ? QItemSelectionModel::ClearAndSelect | QItemSelectionModel::Rows : QItemSelectionModel::NoUpdate);
+        break;
+    }
+}
+
+void VantorelPaneController::setStale(bool stale) {
+    if (stale == stale_) return;
+    stale_ = stale;
+    for (VantorelCell* cell : rowCells_) cell->setEnabled(!stale_);
 }
 
 void VantorelPaneController::createToolbarItems() {
@@ -130,7 +153,7 @@ void VantorelPaneController::createToolbarItems() {
     palette.setColor(QPalette::WindowText, Qt::black);
     statusLabel_->setPalette(palette);
     statusLabel_->setAutoFillBackground(false);
-    statusLabel_->adjustSize();
+    fitStatus();
     toolbar_->addWidget(statusLabel_);
 
     // 3. The flexible space.
@@ -145,6 +168,22 @@ void VantorelPaneController::createToolbarItems() {
         PaneApplication* application = application_;
         connect(saveItem_, &QAction::triggered, this, [application] { application->showSaveView(); });
     }
+}
+
+void VantorelPaneController::fitStatus() {
+    if (!statusLabel_) return;
+    const QString full = QString::fromStdString(_status);
+    // The room the indicator, the save button and the toolbar's margins leave.
+    const int reserved = 24 + (_isLoading ? 32 : 0) + (application_ && application_->allowSaveButton() ? 96 : 0);
+    const int room = std::max(80, width() - reserved);
+    statusLabel_->setText(statusLabel_->fontMetrics().elidedText(full, Qt::ElideRight, room));
+    statusLabel_->setToolTip(statusLabel_->text() == full ? QString() : full);
+    statusLabel_->adjustSize();
+}
+
+void VantorelPaneController::resizeEvent(QResizeEvent* event) {
+    QWidget::resizeEvent(event);
+    fitStatus();
 }
 
 int VantorelPaneController::numberOfRowsInSection() const {
@@ -211,6 +250,7 @@ void VantorelPaneController::reloadData() {
         layout->setContentsMargins(0, 0, 0, 0);
         layout->addWidget(cell);
         cell->show();
+        cell->setEnabled(!stale_);
         table_->setCellWidget(row, 0, holder);
         rowCells_.push_back(cell);
     }

@@ -42,6 +42,9 @@ public:
     const std::string& title() const { return title_; }
     const std::string& status() const { return _status; }
     bool isLoading() const { return _isLoading; }
+    // Stale values (the stream is lost): the rows are greyed until it is back.
+    void setStale(bool stale);
+    bool isStale() const { return stale_; }
 
     // The platform's appearance calls, sent by the navigation controller.
     void viewWillAppear();
@@ -51,7 +54,7 @@ public:
     void setStatus(const std::string* status, bool isLoading);
     void setStatus(const std::string& status, bool isLoading) { setStatus(&status, isLoading); }
     // `reloadWithNode:`: replaces the node (nullptr allowed), the title, the rows and
-    // the toolbar.
+    // the toolbar. The current row follows its name, not its index.
     void reloadWithNode(NodeRef node);
     // Rebuilds the toolbar: activity indicator, status label, flexible space, and the
     // save button only when the application allows it.
@@ -87,14 +90,19 @@ signals:
 
 protected:
     bool eventFilter(QObject* watched, QEvent* event) override;
+    void resizeEvent(QResizeEvent* event) override;
 
 private:
     void updateTitle();
+    // Fits the status into the toolbar's room (elided, whole in the tooltip), so that
+    // a long status never pushes the save button into the toolbar's overflow menu.
+    void fitStatus();
 
     NodeRef _nodes;
     std::string _keyPath;
     std::string _status;
     bool _isLoading = true;
+    bool stale_ = false;
 
     PaneApplication* application_;
     NavigationController* navigationController_ = nullptr;

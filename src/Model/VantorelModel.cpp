@@ -7,10 +7,13 @@
 #include "Platform/RemoteMessagePort.h"
 #include "Platform/SystemLog.h"
 #include "Platform/TelephonyServiceConnection.h"
+#include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
 #include "PropertyList/PropertyListSerialization.h"
 
 #include <QMetaObject>
+
+#include <algorithm>
 #include <QTimer>
 #include <QUuid>
 
@@ -99,11 +102,76 @@ std::optional<Bytes> VantorelModel::receiveCallback(int32_t messageId, const Byt
 
 void VantorelModel::invalidationCallback(LocalMessagePort* port) {
     SystemLog::log(SystemLog::kError, " ***** INVALIDATED %p *****", static_cast<void*>(port));
+    // The values on screen are now stale: say so at once, before any reconnection.
+    status_.phase = SourceStatus::Phase::Disconnected;
+    status_.disconnectedAt = QDateTime::fromMSecsSinceEpoch(
+        std::chrono::duration_cast<std::chrono::milliseconds>(MonitorClock::current().now().time_since_epoch()).count());
+    tellApplication();
     // The port is inside its own callback: restart once it has returned.
     QMetaObject::invokeMethod(this, [this] { restartMonitor(); }, Qt::QueuedConnection);
 }
 
-void VantorelModel::serviceNotificationCallback(const std::string&, const Value&) { refresh(); }
+void VantorelModel::serviceNotificationCallback(const std::string&, const Value& info) {
+    readBackendState(info);
+    refresh();
+}
+
+// The backend's state notification: any key may be missing or of the wrong type
+// (an older or foreign service); what is readable is taken, the rest is kept.
+void VantorelModel::readBackendState(const Value& info) {
+    const DictionaryRef d = info.asDictionary();
+    if (!d) return;
+    auto integer = [&](const char* key) { const Value* v = d->find(key); return v ? v->asInteger() : std::nullopt; };
+    const Value* state = d->find("State");
+    const std::string* stateName = state ? state->asString() : nullptr;
+    if (stateName && *stateName == "Finished" && _displayUpdateTimer) status_.phase = SourceStatus::Phase::Finished;
+    if (stateName && *stateName == "Streaming" && status_.phase == SourceStatus::Phase::Finished)
+        status_.phase = SourceStatus::Phase::Streaming;  // a looping replay started again
+    const Value* source = d->find("Source");
+    if (!sourceFixed_ && source && source->asString() && !source->asString()->empty()) {
+        status_.source = *source->asString();
+        status_.isReplay = status_.source.rfind("replay ", 0) == 0;
+    }
+    status_.sent = integer("Sent");
+    status_.total = integer("Total");
+    const std::optional<int64_t> recorded = integer("RecordedTime");
+    status_.recordedAt = recorded ? QDateTime::fromMSecsSinceEpoch(*recorded / 1000) : QDateTime();
+    status_.logTechnologies.clear();
+    const Value* codes = d->find("LogTechnologies");
+    if (const ArrayRef list = codes ? codes->asArray() : ArrayRef())
+        for (const Value& element : *list)
+            if (element.asString()) status_.logTechnologies.push_back(*element.asString());
+    statusChanged_ = true;
+}
+
+void VantorelModel::setSource(std::string description, bool isReplay, bool authoritative) {
+    status_.source = std::move(description);
+    status_.isReplay = isReplay;
+    sourceFixed_ = authoritative;
+}
+
+bool VantorelModel::noRecordForDecoder() const {
+    if (status_.phase != SourceStatus::Phase::Streaming || !_displayUpdateTimer) return false;
+    if (MonitorClock::current().now() - streamingSince_ < kNoRecordWait) return false;
+    if (messagesDecoded_ == 0) return true;
+    // Messages arrive; whether any is this decoder's, the service's list of the
+    // stream's technologies tells (without it, arriving messages count as read).
+    const auto& seen = status_.logTechnologies;
+    return !seen.empty() && std::find(seen.begin(), seen.end(), status_.decoderTechnology) == seen.end();
+}
+
+SourceStatus VantorelModel::sourceStatus() const {
+    SourceStatus status = status_;
+    status.forDecoder = messagesDecoded_;
+    status.noRecordForDecoder = noRecordForDecoder();
+    return status;
+}
+
+void VantorelModel::tellApplication() {
+    if (application_)
+        QMetaObject::invokeMethod(
+            this, [this] { if (application_) application_->updateViewControllerFromModel(); }, Qt::QueuedConnection);
+}
 
 // ---- Start-up and refresh -------------------------------------------------
 
@@ -153,6 +221,10 @@ void VantorelModel::startMonitor() {
     _displayUpdateTimer->setInterval(MonitorClock::current().displayUpdateInterval());
     connect(_displayUpdateTimer, &QTimer::timeout, this, [this] { refresh(); });
     _displayUpdateTimer->start();
+    // Back from a lost channel: the stale mark goes at the next tick, data or not.
+    if (status_.phase == SourceStatus::Phase::Disconnected) statusChanged_ = true;
+    status_.phase = SourceStatus::Phase::Streaming;
+    streamingSince_ = MonitorClock::current().now();
 }
 
 void VantorelModel::restartMonitor() {
@@ -197,6 +269,7 @@ void VantorelModel::configureGenerator() {
     // The state (and its history) outlives decoders; the display a previous decoder
     // built in it is bound to that decoder's sections, so a new decoder starts its own.
     if (chosen) LogGenerator::forgetDisplay(*_state);
+    if (chosen) status_.decoderTechnology = *technology->asString();
     _logGenerator = std::move(chosen);
     SystemLog::log(SystemLog::kError, "Got log generated: %p", static_cast<void*>(_logGenerator.get()));
 }
@@ -206,13 +279,18 @@ void VantorelModel::refresh() {
     // logs and restarts the monitor.
     if (_recvPort && _sendPort && !_sendPort->isValid()) _recvPort->invalidate();
 
-    if (!_updated) return;
+    const bool noRecord = noRecordForDecoder();
+    if (noRecord != status_.noRecordForDecoder) statusChanged_ = true;
+    status_.noRecordForDecoder = noRecord;
+
+    if (!_updated && !statusChanged_) return;
+    if (_updated) {
+        _nodes.reset();
+        _nodesByPath.clear();
+    }
     _updated = false;
-    _nodes.reset();
-    _nodesByPath.clear();
-    if (application_)
-        QMetaObject::invokeMethod(
-            this, [this] { if (application_) application_->updateViewControllerFromModel(); }, Qt::QueuedConnection);
+    statusChanged_ = false;
+    tellApplication();
 }
 
 void VantorelModel::updateWithData(ByteView data) {

@@ -2,11 +2,13 @@
 #pragma once
 
 #include "LogGenerator/LogGenerator.h"
+#include "Model/SourceStatus.h"
 #include "Model/VantorelModelNode.h"
 #include "PropertyList/Value.h"
 
 #include <QObject>
 
+#include <chrono>
 #include <memory>
 #include <string>
 
@@ -25,6 +27,8 @@ public:
     // Each request to the channel waits at most this long for its send and its reply.
     // The retry delay and the display tick come from MonitorClock.
     static constexpr double kRequestTimeoutSeconds = 1.0;
+    // A stream that has run this long without a record the decoder reads is reported.
+    static constexpr std::chrono::seconds kNoRecordWait{10};
 
     // `init`: an empty state, nothing connected. `application` receives
     // updateViewControllerFromModel; `serviceName` is the telephony service's port.
@@ -56,12 +60,21 @@ public:
     const std::string& receivePortName() const { return receivePortName_; }
     uint64_t messagesDecoded() const { return messagesDecoded_; }
 
+    // The source and the stream's state for the status line (updatedAt left to the view).
+    // `authoritative`: the launcher knows the source (in-process service); otherwise the
+    // service's notifications name it.
+    void setSource(std::string description, bool isReplay, bool authoritative);
+    SourceStatus sourceStatus() const;
+
 private:
     // The receive port's message and invalidation callbacks and the service's notifications.
     std::optional<Bytes> receiveCallback(int32_t messageId, const Bytes& data);
     void invalidationCallback(LocalMessagePort* port);
     void serviceNotificationCallback(const std::string& name, const Value& info);
     void scheduleRetry();
+    void readBackendState(const Value& info);
+    bool noRecordForDecoder() const;
+    void tellApplication();
 
     // Ports are QObjects that may be inside their own callback when closed: they are
     // deleted from the event loop (deleteLater), never in place.
@@ -85,6 +98,11 @@ private:
     std::string serviceName_;
     std::string receivePortName_;
     uint64_t messagesDecoded_ = 0;
+
+    SourceStatus status_;
+    bool sourceFixed_ = false;
+    bool statusChanged_ = false;
+    std::chrono::system_clock::time_point streamingSince_;
 };
 
 }  // namespace vantorel

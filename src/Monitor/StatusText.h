@@ -1,6 +1,8 @@
 // StatusText: the status line's texts, the same in the window's panes and in the terminal view.
 #pragma once
 
+#include "Model/SourceStatus.h"
+
 #include <QDateTime>
 
 #include <string>
@@ -17,6 +19,14 @@ public:
 
     // "Updated 2016-06-28 at 22:01:10": when the last new data was shown.
     static std::string updated(const QDateTime& at);
+
+    // The whole status line for a stream's state: "Connecting...", "Updated ... · replay
+    // x.qmdl · recorded 22:01:09 · 45%", "disconnected since 22:03:00 · service NAME",
+    // "replay finished: 120 messages, 80 for this decoder · replay x.qmdl", or why the
+    // decoder has read nothing and which --technology would.
+    static std::string line(const SourceStatus& status);
+    // True when the values on screen no longer follow the stream.
+    static bool isStale(const SourceStatus& status) { return status.phase == SourceStatus::Phase::Disconnected; }
 };
 
 }  // namespace vantorel

@@ -118,3 +118,17 @@ TEST(PaneNavigation, TheToolbarShowsTheIndicatorWhileLoadingAndTheSaveButtonOnly
         EXPECT_EQ(s.application.showSaveViewCalls, allowSave ? 1 : 0);
     }
 }
+
+TEST(PaneSelection, ARefreshKeepsTheSelectedRowByItsNameWhereverItMoves) {
+    FakeApplication application;
+    VantorelPaneController pane(makeTree(dict({{"Cell", "1"}, {"Mode", "Idle"}})), "/", &application);
+    showAt(pane, 320, 400);
+    pane.tableView()->selectRow(rowOf(pane, "Mode"));
+    pane.reloadWithNode(makeTree(dict({{"Alpha", "0"}, {"Beta", "0"}, {"Cell", "1"}, {"Mode", "Connected"}})));
+    const int moved = rowOf(pane, "Mode");
+    ASSERT_NE(moved, 1);
+    EXPECT_EQ(pane.tableView()->currentIndex().row(), moved);
+    EXPECT_TRUE(pane.tableView()->selectionModel()->isRowSelected(moved, QModelIndex()));
+    pane.reloadWithNode(makeTree(dict({{"Cell", "1"}})));  // its row went: nothing selected
+    EXPECT_FALSE(pane.tableView()->selectionModel()->hasSelection());
+}

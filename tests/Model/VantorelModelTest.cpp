@@ -151,3 +151,43 @@ TEST_F(VantorelModelTest, ARestartKeepsTheHistoryAndTheNewDecoderBuildsADisplayO
     NodeRef state = model->nodeAtPath("/Serving Cell/RRC Info/State");
     EXPECT_TRUE(state && *state->value() == "Cell Fach");
 }
+
+TEST_F(VantorelModelTest, TheSourceStateFollowsTheBackendAndALostChannelAtOnce) {
+    using Phase = SourceStatus::Phase;
+    FastMonitorClock& clock = FastMonitorClock::installed();
+    auto model = runningModel();
+    model->setSource("service vt", false, false);
+    auto info = Dictionary::create();
+    auto codes = Array::create();
+    codes->append(Value(kTSLogChannelTechnology_Morvek_LTE));
+    info->set("State", "Streaming");
+    info->set("Source", "replay lte.qmdl");
+    info->set("Sent", Value::integer(40));
+    info->set("Total", Value::integer(80));
+    info->set("LogTechnologies", Value(codes));
+    service.notify("BackendStateChanged", Value(info));
+    ASSERT_TRUE(waitUntil([&] { return model->sourceStatus().sent == 40; }, 2000));
+    EXPECT_EQ(model->sourceStatus().source, "replay lte.qmdl");
+    EXPECT_FALSE(model->sourceStatus().noRecordForDecoder);
+
+    // Ten seconds of LTE records for the UTRAN decoder: reported, and the view told.
+    const int updates = app.updates;
+    clock.frozen = std::chrono::system_clock::now() + VantorelModel::kNoRecordWait + std::chrono::seconds(1);
+    ASSERT_TRUE(waitUntil([&] { return app.updates > updates; }, 2000));
+    EXPECT_TRUE(model->sourceStatus().noRecordForDecoder);
+    clock.frozen.reset();
+
+    service.send(rrcRecord(3));
+    ASSERT_TRUE(waitUntil([&] { return model->messagesDecoded() == 1; }, 2000));
+    info->set("State", "Finished");
+    service.notify("BackendStateChanged", Value(info));
+    ASSERT_TRUE(waitUntil([&] { return model->sourceStatus().phase == Phase::Finished; }, 2000));
+    EXPECT_EQ(model->sourceStatus().forDecoder, 1u);
+
+    service.setBehaviour({.channelErrorCode = 5});  // the service will not take us back
+    service.closeChannelPort();
+    ASSERT_TRUE(waitUntil([&] { return model->sourceStatus().phase == Phase::Disconnected; }, 2000));
+    EXPECT_TRUE(model->sourceStatus().disconnectedAt.isValid());
+    spin(300);  // retries fail: still stale
+    EXPECT_EQ(model->sourceStatus().phase, Phase::Disconnected);
+}

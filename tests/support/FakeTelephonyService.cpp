@@ -104,12 +104,12 @@ void FakeTelephonyService::dropClient() {
     onServiceThread([this] { if (!clients_.empty()) clients_.back()->invalidate(); });
 }
 
-void FakeTelephonyService::notify(const std::string& name) {
-    auto info = Dictionary::create();
-    info->set("State", "Streaming");
+void FakeTelephonyService::notify(const std::string& name, const Value& info) {
+    auto streaming = Dictionary::create();
+    streaming->set("State", "Streaming");
     auto notification = Dictionary::create();
     notification->set("Name", name);
-    notification->set("Info", Value(info));
+    notification->set("Info", info.asDictionary() ? info : Value(streaming));
     onServiceThread([&] { if (server_) server_->broadcastNotification(0, xml(notification)); });
 }
 

@@ -48,8 +48,9 @@ public:
     // Drops the connection to the newest client's receive port (the model's receive
     // port is invalidated from outside).
     void dropClient();
-    // Pushes a notification to every server connection.
-    void notify(const std::string& name);
+    // Pushes a notification to every server connection; its Info is `info` (the
+    // backend's "State", "Source", "Sent", "Total", ...) or {"State": "Streaming"}.
+    void notify(const std::string& name, const Value& info = Value());
 
     int channelsCreated() const { return channelCount_.load(); }
     // The start commands received, as parsed dictionaries.

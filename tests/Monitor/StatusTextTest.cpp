@@ -1,0 +1,45 @@
+// Tests for StatusText::line: what the status line says in each state of a stream.
+#include "Monitor/StatusText.h"
+
+#include "Platform/TelephonyIdentifiers.h"
+
+#include <gtest/gtest.h>
+
+using namespace vantorel;
+using Phase = SourceStatus::Phase;
+
+TEST(StatusText, EachStateOfTheStreamReadsAsTheUserNeedsIt) {
+    const QDateTime at(QDate(2016, 6, 28), QTime(22, 1, 10));
+    const std::string lte = kTSLogChannelTechnology_Morvek_LTE, gsm = kTSLogChannelTechnology_Morvek_GSM;
+    auto make = [&](Phase phase, auto&& change) {
+        SourceStatus s;
+        s.phase = phase;
+        s.firstConnect = false;
+        s.source = "replay sprint.qmdl";
+        s.isReplay = true;
+        s.decoderTechnology = kTSLogChannelTechnology_Morvek_UTRAN2;
+        change(s);
+        return s;
+    };
+    const struct {
+        SourceStatus status;
+        std::string line;
+    } rows[] = {
+        {make(Phase::Connecting, [](SourceStatus& s) { s.firstConnect = true; }), "Connecting"},
+        {make(Phase::Connecting, [](SourceStatus&) {}), "Connecting..."},
+        {make(Phase::Streaming, [&](SourceStatus& s) { s.updatedAt = at; }),
+         "Updated 2016-06-28 at 22:01:10 \u00b7 replay sprint.qmdl"},
+        {make(Phase::Streaming, [&](SourceStatus& s) { s.updatedAt = at; s.recordedAt = at.addSecs(-60); s.sent = 45; s.total = 100; }),
+         "Updated 2016-06-28 at 22:01:10 \u00b7 replay sprint.qmdl \u00b7 recorded 22:00:10 \u00b7 45%"},
+        {make(Phase::Disconnected, [&](SourceStatus& s) { s.disconnectedAt = at; s.source = "service vt"; }),
+         "disconnected since 22:01:10 \u00b7 service vt"},
+        {make(Phase::Finished, [](SourceStatus& s) { s.sent = 120; s.total = 120; s.forDecoder = 80; }),
+         "replay finished: 120 messages, 80 for this decoder \u00b7 replay sprint.qmdl"},
+        {make(Phase::Streaming, [&](SourceStatus& s) { s.noRecordForDecoder = true; s.logTechnologies = {lte, gsm}; }),
+         "no record for the UTRAN (TD-SCDMA) decoder; this file holds LTE and GSM/UMTS codes: try --technology lte "
+         "\u00b7 replay sprint.qmdl"},
+        {make(Phase::Streaming, [](SourceStatus& s) { s.noRecordForDecoder = true; s.isReplay = false; s.source.clear(); }),
+         "no record for the UTRAN (TD-SCDMA) decoder; this stream has sent no log codes yet"},
+    };
+    for (const auto& row : rows) EXPECT_EQ(StatusText::line(row.status), row.line);
+}
