@@ -4,6 +4,7 @@
 #include "Model/VantorelModel.h"
 #include "Platform/TechnologyNames.h"
 #include "TelephonyService/EmulatorBackend.h"
+#include "TelephonyService/Replay/CaptureReader.h"
 
 #include <QCommandLineParser>
 #include <QMetaObject>
@@ -44,6 +45,28 @@ std::optional<MonitorLauncher::Source> MonitorLauncher::sourceFrom(const QComman
         *error = "choose one of --emulate, --replay and --service";
         return std::nullopt;
     }
+    // Options that only shape a replay mean nothing without one: say so rather than ignore them.
+    if (s.replay.empty()) {
+        for (const char* option : {"technology", "speed", "loop"}) {
+            if (!parser.isSet(option)) continue;
+            *error = std::string("--") + option + " applies to a replay: add --replay FILE";
+            return std::nullopt;
+        }
+    }
+    if (!s.technology.empty()) {
+        const auto id = TechnologyNames::identifierFor(s.technology);
+        if (!id) {
+            *error = "unknown technology '" + s.technology + "' (" + TechnologyNames::listing() + ")";
+            return std::nullopt;
+        }
+        // A capture says its technology; another one on the command line is a contradiction.
+        const Capture capture = CaptureReader::readFile(s.replay);
+        if (capture.ok() && !capture.technology.empty() && capture.technology != *id) {
+            *error = s.replay + " is a " + TechnologyNames::displayName(capture.technology) +
+                     " capture: --technology " + s.technology + " contradicts it";
+            return std::nullopt;
+        }
+    }
     if (chosen == 0) s.emulate = "utran";  // the embedded default
     return s;
 }
@@ -68,7 +91,10 @@ bool MonitorLauncher::start(const Source& source, ApplicationObject* application
         service_ = std::make_unique<TelephonyServiceThread>(options);
         if (!service_->start(error)) return false;
         serviceName = service_->portName();
-        description_ = source.replay.empty() ? "emulator (" + source.emulate + ")" : "replay of " + source.replay;
+        const auto emulated = TechnologyNames::identifierFor(source.emulate);
+        description_ = !source.replay.empty() ? "replay of " + source.replay
+                                              : "emulator (" + (emulated ? TechnologyNames::displayName(*emulated)
+                                                                         : source.emulate) + ")";
     } else {
         description_ = "service " + source.service;
     }

@@ -28,7 +28,9 @@ public:
     // --emulate, --replay, --service, --technology, --speed, --loop.
     static void addOptions(QCommandLineParser& parser);
     // The source the options name; with none of --emulate/--replay/--service, the
-    // embedded default: the emulator's UTRAN scenario. Empty with *error on bad use.
+    // embedded default: the emulator's UTRAN scenario. Empty with *error on bad use:
+    // two sources, --technology/--speed/--loop without --replay, a --technology other
+    // than the one a replayed capture names.
     static std::optional<Source> sourceFrom(const QCommandLineParser& parser, std::string* error);
 
     MonitorLauncher();
@@ -39,7 +41,7 @@ public:
     // loop. False with *error when the service cannot start.
     bool start(const Source& source, ApplicationObject* application, std::string* error);
     VantorelModel* model() const { return model_.get(); }
-    // "emulator (utran)", "replay of FILE", "service NAME".
+    // "emulator (UTRAN (TD-SCDMA))", "replay of FILE", "service NAME".
     std::string description() const { return description_; }
 
 private:

@@ -10,8 +10,10 @@ namespace vantorel {
 
 class TreeFormatter {
 public:
-    enum class Format { Tree, Json, Plist };
-    // "tree", "json", "plist" → the format; empty when unknown.
+    // Json and Plist carry the shown names in the shown order; Display is the display
+    // dictionary as the decoder keeps it ("0;Technology", "_sorted"), as JSON.
+    enum class Format { Tree, Json, Plist, Display };
+    // "tree", "json", "plist", "display" → the format; empty when unknown.
     static std::optional<Format> parse(const std::string& name);
 
     // Rows as the panes show them: sorted order, shown names, "(unknown)"; a row
@@ -23,6 +25,8 @@ public:
     static std::string compactTree(const NodeRef& root);
     // The display dictionary itself (data as base64, dates as ISO 8601 text).
     static std::string json(const Value& display);
+    // The display as the tree names and orders it ("Technology", never "_sorted"), as JSON.
+    static std::string shownJson(const Value& display);
     static std::string plist(const Value& display);
     static std::string format(Format f, const Value& display);
 };

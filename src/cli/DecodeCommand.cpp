@@ -24,7 +24,9 @@ int DecodeCommand::run(const QStringList& args) {
     parser.addHelpOption();
     parser.addOption({"technology", "Decoder to use (" + QString::fromStdString(TechnologyNames::listing()) +
                                         "); needed unless every FILE is a capture.", "TECH"});
-    parser.addOption({"format", "Output: tree (as the panes show it), json or plist (the display dictionary).",
+    parser.addOption({"format",
+                      "Output: tree (as the panes show it), json or plist (the tree's names in its order),\n"
+                      "or display (the display dictionary as the decoder keeps it, as JSON).",
                       "FORMAT", "tree"});
     parser.addOption({"verbose", "Mirror the system log to stderr."});
     parser.addPositionalArgument("FILE", "QXDM DLF, QMDL/mi2log or Vantorel capture files, decoded in order.",
@@ -34,7 +36,7 @@ int DecodeCommand::run(const QStringList& args) {
 
     const auto format = TreeFormatter::parse(parser.value("format").toStdString());
     if (!format) {
-        std::fprintf(stderr, "vantorel-cli decode: unknown --format '%s' (tree, json or plist)\n",
+        std::fprintf(stderr, "vantorel-cli decode: unknown --format '%s' (tree, json, plist or display)\n",
                      qPrintable(parser.value("format")));
         return 2;
     }
@@ -65,6 +67,12 @@ int DecodeCommand::run(const QStringList& args) {
             ++failures;
             continue;
         }
+        if (!technology.empty() && stream.technologyFromFile() && stream.technology() != technology) {
+            std::fprintf(stderr, "vantorel-cli decode: %s is a %s capture: --technology %s contradicts it\n",
+                         qPrintable(path), TechnologyNames::displayName(stream.technology()).c_str(),
+                         qPrintable(parser.value("technology")));
+            return 2;
+        }
         const RecordedLog& report = stream.report();
         badFrames += report.badCrc + report.malformed + report.truncated;
         if (stream.technology().empty()) {
@@ -78,13 +86,13 @@ int DecodeCommand::run(const QStringList& args) {
             decoderTechnology = stream.technology();
             if (!decoder) {
                 std::fprintf(stderr, "vantorel-cli decode: no decoder for %s\n",
-                             TechnologyNames::shortName(stream.technology()).c_str());
+                             TechnologyNames::displayName(stream.technology()).c_str());
                 return 1;
             }
         } else if (stream.technology() != decoderTechnology) {
             std::fprintf(stderr, "vantorel-cli decode: %s is %s, the files before it %s: skipped\n", qPrintable(path),
-                         TechnologyNames::shortName(stream.technology()).c_str(),
-                         TechnologyNames::shortName(decoderTechnology).c_str());
+                         TechnologyNames::displayName(stream.technology()).c_str(),
+                         TechnologyNames::displayName(decoderTechnology).c_str());
             ++failures;
             continue;
         }

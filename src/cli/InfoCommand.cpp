@@ -13,7 +13,9 @@ namespace vantorel {
 int InfoCommand::run(const QStringList& args) {
     QCommandLineParser parser;
     parser.setApplicationDescription("Describe recorded streams: format, technology if known, message count,\n"
-                                     "counts per log code (property lists for IFX), and every bad frame.");
+                                     "time span, counts per log code with its name and record versions\n"
+                                     "(property lists for IFX), and every bad frame. A file in which nothing\n"
+                                     "is found is not a capture (exit 1).");
     parser.addHelpOption();
     parser.addPositionalArgument("FILE", "QXDM DLF, QMDL/mi2log or Vantorel capture files.", "FILE...");
     parser.process(QStringList{"vantorel-cli info"} + args);
@@ -26,6 +28,12 @@ int InfoCommand::run(const QStringList& args) {
         RecordedStream stream = RecordedStream::open(path.toStdString());
         if (!stream.ok()) {
             std::fprintf(stderr, "vantorel-cli info: %s\n", stream.error().c_str());
+            ++failures;
+            continue;
+        }
+        if (!stream.holdsRecords()) {
+            std::fprintf(stderr, "vantorel-cli info: %s: not a capture (no capture header, DLF record or QMDL frame)\n",
+                         qPrintable(path));
             ++failures;
             continue;
         }

@@ -1,6 +1,7 @@
 // SnapshotCommand: `vantorel-cli snapshot`: reads a VantorelSnapshot-*.vantorel file with libplist, lists it and writes out its DLF.
 #include "cli/SnapshotCommand.h"
 
+#include "Monitor/TreeFormatter.h"
 #include "Platform/TerminalText.h"
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
@@ -66,7 +67,21 @@ std::string snapshotProblem(const Dictionary& root) {
     return std::string();
 }
 
-void printEntry(size_t index, const Value& element) {
+// Every line of text, indented.
+std::string indented(const std::string& text, size_t by) {
+    std::string out;
+    size_t start = 0;
+    while (start < text.size()) {
+        const size_t end = text.find('\n', start);
+        const size_t stop = end == std::string::npos ? text.size() : end + 1;
+        out += std::string(by, ' ') + text.substr(start, stop - start);
+        start = stop;
+    }
+    if (!out.empty() && out.back() != '\n') out += '\n';
+    return out;
+}
+
+void printEntry(size_t index, const Value& element, TreeFormatter::Format format) {
     DictionaryRef entry = element.asDictionary();
     if (!entry) {
         std::printf("  %zu  (not a dictionary: %s)\n", index, element.typeName());
@@ -76,6 +91,11 @@ void printEntry(size_t index, const Value& element) {
     std::printf("  %zu  %s\n", index, description ? TerminalText::visible(*description).c_str() : "(no description)");
     if (const std::string* date = entry->get("Date").asString())
         std::printf("      Date: %s\n", TerminalText::visible(*date).c_str());
+    // The display the entry kept, as the panes showed it (or in the format asked for).
+    if (const Value* display = entry->find("Display"); display && display->asDictionary()) {
+        std::printf("      Display:\n");
+        std::fputs(indented(TreeFormatter::format(format, *display), 8).c_str(), stdout);
+    }
     if (const Value* dlf = entry->find("DLF")) {
         if (const Bytes* bytes = dlf->asData())
             std::printf("      DLF: %zu bytes\n", bytes->size());
@@ -120,9 +140,12 @@ int SnapshotCommand::run(const QStringList& args) {
     QCommandLineParser parser;
     parser.setApplicationDescription(
         "List a snapshot saved by the save screen (VantorelSnapshot-<seconds>.vantorel): its time stamp,\n"
-        "its description and its entries (the display history, then the DLF binary log).");
+        "its description and its entries (the display history, each entry's date and display, then\n"
+        "the DLF binary log).");
     const QCommandLineOption helpOption = parser.addHelpOption();
     parser.addOption({"dlf", "Also write the bytes of the entry holding the DLF to OUT.", "OUT"});
+    parser.addOption({"format", "Each entry's display: tree (as the panes show it), json, plist or display.",
+                      "FORMAT", "tree"});
     parser.addPositionalArgument("FILE", "A snapshot file (property list).", "FILE");
     // parse(), not process(): a usage error is an exit code, not an exit from inside.
     if (!parser.parse(QStringList{kPrefix} + args)) {
@@ -140,6 +163,12 @@ int SnapshotCommand::run(const QStringList& args) {
         return 2;
     }
     const QString& file = files.front();
+    const auto format = TreeFormatter::parse(parser.value("format").toStdString());
+    if (!format) {
+        std::fprintf(stderr, "%s: unknown --format '%s' (tree, json, plist or display)\n", kPrefix,
+                     qPrintable(parser.value("format")));
+        return 2;
+    }
 
     std::string error;
     const std::optional<QByteArray> contents = readWholeFile(file, error);
@@ -165,7 +194,7 @@ int SnapshotCommand::run(const QStringList& args) {
     std::printf("Timestamp: %s\n", TerminalText::visible(*root.get("Timestamp").asString()).c_str());
     std::printf("Description: %s\n", TerminalText::visible(*root.get("Description").asString()).c_str());
     std::printf("Data: %zu %s\n", data.size(), data.size() == 1 ? "entry" : "entries");
-    for (size_t index = 0; index < data.size(); ++index) printEntry(index, data.at(index));
+    for (size_t index = 0; index < data.size(); ++index) printEntry(index, data.at(index), *format);
     std::fflush(stdout);
 
     if (parser.isSet("dlf")) return extractDlf(file, data, parser.value("dlf"));

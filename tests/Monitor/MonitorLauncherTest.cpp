@@ -58,3 +58,25 @@ TEST(MonitorLauncher, TheEmbeddedDefaultIsTheUTRANEmulatorAndBadSourcesAreClearE
     EXPECT_FALSE(launcher.start(*parse({"--emulate", "wimax"}, &error), nullptr, &error));
     EXPECT_NE(error.find("unknown technology \"wimax\""), std::string::npos) << error;
 }
+
+TEST(MonitorLauncher, OptionsThatContradictOrShapeNoReplayAreErrors) {
+    QTemporaryDir dir;
+    const QString capture = dir.filePath("utran.vcap");
+    writeUtranCapture(capture.toStdString(), 1, 1, 1000);
+    const struct {
+        QStringList args;
+        const char* says;  // empty: accepted
+    } rows[] = {
+        {{"--speed", "2"}, "--speed applies to a replay: add --replay FILE"},
+        {{"--emulate", "lte", "--loop"}, "--loop applies to a replay: add --replay FILE"},
+        {{"--service", "x", "--technology", "lte"}, "--technology applies to a replay: add --replay FILE"},
+        {{"--replay", capture, "--technology", "lte"}, "is a UTRAN (TD-SCDMA) capture: --technology lte contradicts it"},
+        {{"--replay", capture, "--technology", "wimax"}, "unknown technology 'wimax'"},
+        {{"--replay", capture, "--technology", "utran", "--speed", "2", "--loop"}, ""},
+    };
+    for (const auto& row : rows) {
+        std::string error;
+        EXPECT_EQ(parse(row.args, &error).has_value(), !*row.says) << row.says;
+        EXPECT_NE(error.find(row.says), std::string::npos) << error;
+    }
+}

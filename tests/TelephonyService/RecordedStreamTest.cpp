@@ -2,7 +2,11 @@
 #include "TelephonyService/Replay/RecordedStream.h"
 
 #include "LogGenerator/DLFAddVersionReport.h"
+#include "LogGenerator/LogGenerator.h"
 #include "LogGenerator/MVKLogGenerator.h"
+#include "PropertyList/Array.h"
+#include "PropertyList/Dictionary.h"
+#include "TelephonyService/Emulator/CDMAScenario.h"
 #include "Platform/ByteReader.h"
 #include "Platform/LogCodes.h"
 #include "Platform/TelephonyIdentifiers.h"
@@ -186,6 +190,48 @@ TEST(DlfReader, TheMonitorsOwnDlfReadsBackAndIsDetectedAsDlf) {
     EXPECT_EQ(ByteReader(stream.messages()[0].data).u16(3), LogCode::kDlfVersionReport);
     EXPECT_EQ(stream.messages()[1].data, record);
     EXPECT_EQ(stream.messages()[1].timeMicros, DiagPacket::microsecondsSince1970(3000));
+}
+
+TEST(DlfReader, SnapshotDlfsReadBackMessageByMessage) {
+    // A decoder's history entries, as its save contents write them.
+    std::unique_ptr<LogGenerator> decoder = LogGenerator::generatorFromTechnology(kTSLogChannelTechnology_Morvek_CDMA);
+    Dictionary state;
+    CDMAScenario scenario(3);
+    for (uint64_t tick = 0; tick < 12; ++tick) {
+        for (const Bytes& record : scenario.recordsForTick(tick)) decoder->updateState(state, record);
+        if (tick % 4 == 3) decoder->generateLogUsingState(state);
+    }
+    Bytes kept;  // every message the entries hold, in order
+    for (const Value& entry : *state.get("History").asArray())
+        if (const Bytes* bytes = entry.asDictionary()->get("DisplayState").asData()) append(kept, *bytes);
+    const ArrayRef contents = decoder->getSaveContentsFromState(state).asArray();
+    // Whole messages after an entry's first record: a type byte, some behind the 0x81 prefix, extras.
+    const Bytes a = morvekRecord(0x7130, 1, {1}), b = morvekRecord(0xB0C1, 2, {}), c = morvekRecord(0x0001, 3, {9});
+    Bytes handmade = a, extra = c;
+    extra[0] = LogCode::kExtraType;
+    append(handmade, Bytes{0x81, 0x00});
+    append(handmade, b);
+    append(handmade, extra);
+    auto entry = Dictionary::create();
+    entry->set("DisplayState", Value::data(handmade));
+    Dictionary handmadeState;
+    handmadeState.set("History", Value(Array::of({Value(entry)})));
+    Bytes handmadeKept = a;
+    append(handmadeKept, b);
+    append(handmadeKept, extra);
+    const struct { const char* name; Bytes dlf, messages; } rows[] = {
+        {"CDMA decoder", *contents->at(contents->size() - 1).asDictionary()->get("DLF").asData(), kept},
+        {"prefix and extra", *MVKLogGenerator().generateDlfFromState(handmadeState), handmadeKept},
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.name);
+        const RecordedStream stream = RecordedStream::fromBytes(row.dlf, kTSLogChannelTechnology_Morvek_CDMA);
+        EXPECT_EQ(stream.report().malformed + stream.report().truncated, 0u) << stream.summary();
+        ASSERT_GT(stream.messages().size(), 2u);
+        Bytes read;
+        for (size_t i = 1; i < stream.messages().size(); ++i) append(read, stream.messages()[i].data);
+        EXPECT_EQ(read, row.messages);
+    }
 }
 
 TEST(RecordedStream, FormatIsDetectedFromTheContent) {

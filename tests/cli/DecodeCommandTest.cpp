@@ -7,6 +7,7 @@
 #include "support/CommandOutput.h"
 #include "support/ScenarioCapture.h"
 
+#include <QFile>
 #include <QJsonDocument>
 #include <QProcess>
 #include <QJsonObject>
@@ -38,8 +39,9 @@ TEST(DecodeCommand, ACaptureDecodesToTheDisplayAsTreeOrJsonWithOnlyDataOnStandar
     EXPECT_NE(twice.err.find("2 skipped"), std::string::npos) << twice.err;
 
     CommandOutput json = decode({"--format", "json", path});
-    const QJsonObject serving = QJsonDocument::fromJson(QByteArray::fromStdString(json.out)).object()["1;Serving Cell"].toObject();
+    const QJsonObject serving = QJsonDocument::fromJson(QByteArray::fromStdString(json.out)).object()["Serving Cell"].toObject();
     EXPECT_EQ(serving["Serving Cell Info"].toObject()["Local Area Code"].toString(), "23071") << json.out;
+    EXPECT_EQ(json.out.rfind("{\n    \"Technology\": \"UTRAN (TD-SCDMA)\",\n    \"Serving Cell\": {", 0), 0u) << json.out;
 }
 
 TEST(DecodeCommand, TextFromTheModemIsShownNotObeyedInTheTreeAndKeptExactInJson) {
@@ -60,6 +62,14 @@ TEST(DecodeCommand, TextFromTheModemIsShownNotObeyedInTheTreeAndKeptExactInJson)
 }
 
 TEST(VantorelCli, CommandsAreDispatchedInfoAccountsForEveryFrameAndBadUseIsAClearError) {
+    QTemporaryDir dir;
+    const QString capture = dir.filePath("utran.vcap"), empty = dir.filePath("empty"), noise = dir.filePath("noise");
+    vantorel::testing::writeUtranCapture(capture.toStdString(), 1, 2, 1500);
+    QFile(empty).open(QIODevice::WriteOnly);
+    QFile file(noise);
+    ASSERT_TRUE(file.open(QIODevice::WriteOnly));
+    for (int i = 0; i < 4096; ++i) file.putChar(static_cast<char>((i * 7919 + 13) % 251));
+    file.close();
     const struct {
         QStringList args;
         int code;
@@ -70,7 +80,12 @@ TEST(VantorelCli, CommandsAreDispatchedInfoAccountsForEveryFrameAndBadUseIsAClea
         {{"-h"}, 0, "Usage: vantorel-cli COMMAND"},
         {{"info", VANTOREL_CAPTURES_DIR "/qmdl_example.qmdl"}, 0, "QMDL, technology unknown, 336 messages"},
         {{"info", VANTOREL_CAPTURES_DIR "/cmcc.mi2log"}, 0, "frames 5500, log packets 5483, other packets 17, bad CRC 1"},
-        {{"info", VANTOREL_CAPTURES_DIR "/cmcc.mi2log"}, 0, "\n0xB0C2  62  (version 3: 62)\n"},
+        {{"info", VANTOREL_CAPTURES_DIR "/cmcc.mi2log"}, 0, "\n0xB0C2  LTE RRC serving cell info  62  (version 3: 62)\n"},
+        {{"info", capture}, 0, "capture, technology UTRAN (TD-SCDMA), "},
+        {{"info", capture}, 0, "\ntime span 2023-11-14 22:13:20.001 to 2023-11-14 22:13:20.0"},
+        {{"info", empty}, 1, "empty: not a capture"},
+        {{"info", noise}, 1, "noise: not a capture"},
+        {{"decode", "--technology", "lte", capture}, 2, "is a UTRAN (TD-SCDMA) capture: --technology lte contradicts it"},
         {{"frobnicate"}, 2, "vantorel-cli: unknown command 'frobnicate'"},
         {{"decode", VANTOREL_CAPTURES_DIR "/qmdl_example.qmdl"}, 1, "does not say its technology: add --technology (ifx, gsm, cdma, lte, utran)"},
         {{"decode", "--format", "yaml", "x"}, 2, "unknown --format 'yaml'"},

@@ -65,10 +65,14 @@ TEST_F(SnapshotCommandTest, ListsEveryEntryAndWritesOutTheDlfOfARealDecoderInEit
         write("s.vantorel", snapshotOf(Value(contents)), format);
         CommandOutput r = run({path("s.vantorel"), "--dlf", path("out.dlf")});
         ASSERT_EQ(r.code, 0) << r.err;
-        EXPECT_EQ(r.out.substr(0, r.out.find("  1  ")),
-                  "Timestamp: 2016-06-28 18:31:10 -0330\nDescription: cell edge\\x1b]0;owned\\x07, walking\\x1b[2J\n"
+        EXPECT_EQ(r.out.rfind("Timestamp: 2016-06-28 18:31:10 -0330\nDescription: cell edge\\x1b]0;owned\\x07, walking\\x1b[2J\n"
                   "Data: 5 entries\n  0  " +
-                      first + "\n      Date: " + date + "\n");
+                      first + "\n      Date: " + date + "\n      Display:\n        Technology: UTRAN (TD-SCDMA)\n" +
+                      "        Serving Cell\n          RRC Info\n            State: ", 0), 0u)
+            << r.out;
+        CommandOutput json = run({"--format", "json", path("s.vantorel")});
+        EXPECT_NE(json.out.find("      Display:\n        {\n            \"Technology\": \"UTRAN (TD-SCDMA)\",\n"),
+                  std::string::npos) << json.out;
         const std::string size = std::to_string(dlf.size());
         EXPECT_NE(r.out.find("  2  DLF binary (" + size + " bytes)\n      DLF: " + size + " bytes\n"
                              "  3  (no description)\n  4  (not a dictionary: string)\n"),
@@ -107,6 +111,7 @@ TEST_F(SnapshotCommandTest, BadInputIsAClearErrorAndWritesNothing) {
         {{path("good"), "--dlf", path("missing-dir/out.dlf")}, 1, "cannot write "},
         {{}, 2, "no FILE given"},
         {{path("a"), path("b")}, 2, "one FILE at a time"},
+        {{path("good"), "--format", "yaml"}, 2, "unknown --format 'yaml'"},
     };
     for (const auto& row : rows) {
         CommandOutput r = run(row.args);

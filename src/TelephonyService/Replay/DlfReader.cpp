@@ -2,10 +2,57 @@
 #include "TelephonyService/Replay/DlfReader.h"
 
 #include "Platform/ByteReader.h"
+#include "Platform/LogCodes.h"
 #include "Platform/StringFormat.h"
 #include "TelephonyService/Replay/DiagPacket.h"
 
+#include <utility>
+
 namespace vantorel {
+
+namespace {
+
+// A record whose length holds its header and stays within the file.
+bool recordFits(const ByteReader& r, size_t offset) {
+    const auto length = r.u16(offset);
+    return length && *length >= DlfReader::kRecordHeaderLength && r.has(offset, *length);
+}
+
+bool isTypeByte(std::optional<uint8_t> b) {
+    return b && (*b == LogCode::kOrdinaryType || *b == LogCode::kExtraType);
+}
+
+// The Morvek message bytes before the record at offset, when offset starts one of
+// [type] [0x81 0x00 type] [0x00 type] (a message's type byte, after its optional prefix;
+// the last form is a prefixed message whose first byte the writer dropped); 0 otherwise.
+size_t messageHeaderAt(const ByteReader& r, size_t offset) {
+    if (isTypeByte(r.u8(offset))) return 1;
+    if (r.u8(offset) == uint8_t{0x00} && isTypeByte(r.u8(offset + 1))) return 2;
+    if (r.u8(offset) == uint8_t{0x81} && r.u8(offset + 1) == uint8_t{0x00} && isTypeByte(r.u8(offset + 2))) return 3;
+    return 0;
+}
+
+// Where the record that follows a record boundary starts, and its type: the boundary
+// itself for a plain DLF (type 1), or past a message header (our own snapshot DLFs store
+// whole messages after an entry's first record). A header is skipped only when the
+// record behind it fits and is followed by the end of the file or by another record
+// that fits, and the plain reading is not such a record.
+std::pair<size_t, uint8_t> recordStart(const ByteReader& r, size_t offset) {
+    auto chains = [&r](size_t at) {
+        if (!recordFits(r, at)) return false;
+        const size_t next = at + r.u16(at).value_or(0);
+        if (next == r.size() || recordFits(r, next)) return true;
+        const size_t header = messageHeaderAt(r, next);
+        return header && recordFits(r, next + header);
+    };
+    if (chains(offset)) return {offset, LogCode::kOrdinaryType};
+    const size_t header = messageHeaderAt(r, offset);
+    if (header && chains(offset + header))
+        return {offset + header, r.u8(offset + header - 1).value_or(LogCode::kOrdinaryType)};
+    return {offset, LogCode::kOrdinaryType};
+}
+
+}  // namespace
 
 RecordedLog DlfReader::readFile(const std::string& path) {
     RecordedLog log;
@@ -19,6 +66,8 @@ RecordedLog DlfReader::readBytes(ByteView data) {
     const ByteReader r(data);
     size_t offset = 0;
     while (offset < r.size()) {
+        const auto [start, type] = recordStart(r, offset);
+        offset = start;
         if (!r.has(offset, 2)) {
             ++log.truncated;
             log.addProblem(offset, "truncated record", "1 byte left, too short for a record length");
@@ -42,7 +91,15 @@ RecordedLog DlfReader::readBytes(ByteView data) {
         // The record fits and is at least a header long, so its code and time stamp are there.
         const ByteView recordBytes = r.slice(offset, length).value_or(ByteView{});
         const ByteReader record(recordBytes);
-        log.addEntry(record.u16(2).value_or(0), record.u64(4).value_or(0), DiagPacket::morvekRecordFromDlf(recordBytes));
+        Bytes morvek = DiagPacket::morvekRecordFromDlf(recordBytes);
+        if (type == LogCode::kExtraType) {
+            // An extra record the service added: kept as it arrived, counted apart from log codes.
+            morvek[0] = type;
+            log.entries.push_back(RecordedEntry{record.u16(2).value_or(0), record.u64(4).value_or(0), std::move(morvek)});
+            ++log.otherPackets;
+        } else {
+            log.addEntry(record.u16(2).value_or(0), record.u64(4).value_or(0), std::move(morvek));
+        }
         offset += length;
     }
     return log;

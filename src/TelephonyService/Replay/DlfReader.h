@@ -11,7 +11,11 @@ namespace vantorel {
 // A DLF file is a raw concatenation of records, no file header or trailer:
 //   0..1 len u16 LE (12 + payload length) | 2..3 code u16 LE | 4..11 time stamp u64 LE | 12.. payload
 // The monitor's own DLF writer leads with a 161-byte version record (LogCode::kDlfVersionReport); it is
-// read like any other record. Each record becomes the Morvek record
+// read like any other record. After it come the messages each display entry kept: an
+// entry's first record without its type byte, then whole messages
+//   [0x81 0x00] (optional prefix) | type u8 (1 ordinary, 255 extra) | record
+// so at a record boundary such a header is skipped when the record behind it is
+// well formed and chains on (see recordStart). Each record becomes the Morvek record
 // type byte 1 + the record. Records carry no sync marks, so at the first record with
 // len < 12 (malformed) or running past the end of the file (truncated) reading stops;
 // the records before it are kept.

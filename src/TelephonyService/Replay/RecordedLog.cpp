@@ -1,6 +1,7 @@
 // RecordedLog: entries and counters shared by the recorded-stream readers, with the file loader and the per-code summary.
 #include "TelephonyService/Replay/RecordedLog.h"
 
+#include "Platform/LogCodeNames.h"
 #include "Platform/RecordVersions.h"
 #include "Platform/StringFormat.h"
 
@@ -37,7 +38,8 @@ std::string RecordedLog::summary() const {
         "frames %zu, log packets %zu, other packets %zu, bad CRC %zu, malformed %zu, truncated %zu\n", frames,
         logPackets, otherPackets, badCrc, malformed, truncated);
     for (const auto& [code, n] : codeCounts) {
-        out += StringFormat::format("0x%04X  %zu", code, n);
+        const std::string name = LogCodeNames::nameOf(code);
+        out += StringFormat::format("0x%04X  %s%zu", code, name.empty() ? "" : (name + "  ").c_str(), n);
         const auto versions = versionCounts.find(code);
         if (versions != versionCounts.end()) {
             std::string list;

@@ -52,8 +52,8 @@ public:
     // Keeps a problem text (up to kMaxProblems); the caller counts the problem itself.
     void addProblem(uint64_t offset, const std::string& what, const std::string& why);
 
-    // Multi-line report: the counters on one line, then one line "0x%04X  %zu" per log
-    // code in ascending order (for a code whose layout varies, followed by its versions:
+    // Multi-line report: the counters on one line, then one line per log code in
+    // ascending order, "0x%04X  <name>  %zu" (the name when LogCodeNames knows the code) (for a code whose layout varies, followed by its versions:
     // "  (version 2: 12, version 3: 1729)"); the error or the problems, when there are any.
     std::string summary() const;
 

@@ -4,11 +4,14 @@
 #include "Platform/ByteReader.h"
 #include "Platform/LogCodes.h"
 #include "Platform/StringFormat.h"
+#include "Platform/TechnologyNames.h"
 #include "Platform/TelephonyIdentifiers.h"
 #include "PropertyList/PropertyListSerialization.h"
 #include "TelephonyService/Replay/DiagPacket.h"
 #include "TelephonyService/Replay/DlfReader.h"
 #include "TelephonyService/Replay/QmdlReader.h"
+
+#include <QDateTime>
 
 #include <utility>
 
@@ -34,6 +37,12 @@ bool looksLikeDlf(ByteView data) {
         offset += length;
     }
     return records >= 2;
+}
+
+std::string timeText(int64_t micros) {
+    return QDateTime::fromMSecsSinceEpoch(micros / 1000, Qt::UTC)
+        .toString(QStringLiteral("yyyy-MM-dd hh:mm:ss.zzz"))
+        .toStdString();
 }
 
 }  // namespace
@@ -75,29 +84,48 @@ RecordedStream RecordedStream::fromBytes(ByteView data, const std::string& techn
             stream.technologyFromFile_ = true;
         }
         stream.messages_ = std::move(capture.messages);
+        if (!stream.messages_.empty())
+            stream.timeSpan_ = {stream.messages_.front().timeMicros, stream.messages_.back().timeMicros};
         return stream;
     }
     stream.report_ = stream.format_ == Format::Dlf ? DlfReader::readBytes(data) : QmdlReader::readBytes(data);
     stream.messages_.reserve(stream.report_.entries.size());
-    for (RecordedEntry& entry : stream.report_.entries)
-        stream.messages_.push_back(
-            TimedMessage{DiagPacket::microsecondsSince1970(entry.timeStamp), 0, std::move(entry.record)});
+    for (RecordedEntry& entry : stream.report_.entries) {
+        const int64_t time = DiagPacket::microsecondsSince1970(entry.timeStamp);
+        // A zero time stamp (our DLF writer's version report) carries no time.
+        if (entry.timeStamp != 0)
+            stream.timeSpan_ = {stream.timeSpan_ ? stream.timeSpan_->first : time, time};
+        stream.messages_.push_back(TimedMessage{time, 0, std::move(entry.record)});
+    }
     stream.report_.entries.clear();
     stream.report_.entries.shrink_to_fit();
     return stream;
 }
 
+bool RecordedStream::holdsRecords() const {
+    return format_ == Format::Capture || report_.frames > 0 || report_.logPackets > 0 || report_.otherPackets > 0;
+}
+
 std::string RecordedStream::summary() const {
-    std::string out = StringFormat::format("%s, technology %s, %zu messages\n", formatName(),
-                                           technology_.empty() ? "unknown" : technology_.c_str(), messages_.size());
-    if (technology_ != kTSLogChannelTechnology_IFX || !ok()) return out + report_.summary();
+    std::string out = StringFormat::format(
+        "%s, technology %s, %zu messages\n", formatName(),
+        technology_.empty() ? "unknown" : TechnologyNames::displayName(technology_).c_str(), messages_.size());
+
+    if (technology_ != kTSLogChannelTechnology_IFX || !ok()) return out + report_.summary() + timeSpanText();
     // The IFX modem sends property lists, not log records: count those instead of log codes.
     size_t lists = 0;
     for (const TimedMessage& m : messages_) lists += PropertyListSerialization::read(m.data).value.has_value();
     out += StringFormat::format("%zu property-list messages, %zu unreadable, truncated %zu\n", lists,
                                 messages_.size() - lists, report_.truncated);
     for (const auto& p : report_.problems) out += p + "\n";
-    return out;
+    return out + timeSpanText();
+}
+
+std::string RecordedStream::timeSpanText() const {
+    if (!timeSpan_) return std::string();
+    return StringFormat::format("time span %s to %s UTC (%.3f s)\n", timeText(timeSpan_->first).c_str(),
+                                timeText(timeSpan_->second).c_str(),
+                                static_cast<double>(timeSpan_->second - timeSpan_->first) / 1e6);
 }
 
 }  // namespace vantorel

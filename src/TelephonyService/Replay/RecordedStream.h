@@ -5,7 +5,9 @@
 #include "TelephonyService/Replay/CaptureReader.h"
 #include "TelephonyService/Replay/RecordedLog.h"
 
+#include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace vantorel {
@@ -45,16 +47,27 @@ public:
     // their records are in messages()).
     const RecordedLog& report() const { return report_; }
 
-    // "<format>, technology <id>, <n> messages" then the report's summary; for the IFX
-    // channel, whose messages are property lists, the count of those that parse instead.
+    // False for content in which no reader found anything: an empty file, random bytes
+    // (neither a capture header, nor a DLF record, nor a good QMDL frame).
+    bool holdsRecords() const;
+    // The times of the first and last message that carries one, microseconds since 1970
+    // (arrival times in a capture, DIAG time stamps in DLF and QMDL); empty when none does.
+    std::optional<std::pair<int64_t, int64_t>> timeSpan() const { return timeSpan_; }
+
+    // "<format>, technology <name>, <n> messages", then the report's summary (for the
+    // IFX channel, whose messages are property lists, the count of those that parse
+    // instead), then "time span <first> to <last> UTC (<s> s)" when messages carry times.
     std::string summary() const;
 
 private:
+    std::string timeSpanText() const;
+
     Format format_ = Format::Qmdl;
     std::string technology_;
     bool technologyFromFile_ = false;
     std::vector<TimedMessage> messages_;
     RecordedLog report_;
+    std::optional<std::pair<int64_t, int64_t>> timeSpan_;
 };
 
 }  // namespace vantorel
