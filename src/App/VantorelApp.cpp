@@ -7,10 +7,8 @@
 #include "Model/VantorelModel.h"
 #include "Monitor/StatusText.h"
 #include "Platform/Preferences.h"
-#include "Platform/TechnologyNames.h"
 
 #include <QDateTime>
-#include <QFileInfo>
 #include <QTimer>
 #include <QGuiApplication>
 #include <QMainWindow>
@@ -55,16 +53,6 @@ bool VantorelApp::applicationDidFinishLaunching(std::string* error) {
     // Creates the model and queues restartMonitor on the main queue: connecting
     // starts after launch returns.
     if (!launcher_->start(options_.source, this, error)) return false;
-    // The in-process service's source is known here; a running service names its own.
-    const MonitorLauncher::Source& source = options_.source;
-    if (!source.replay.empty())
-        model()->setSource("replay " + QFileInfo(QString::fromStdString(source.replay)).fileName().toStdString(), true, true);
-    else if (!source.emulate.empty())
-        model()->setSource(
-            "emulator " + TechnologyNames::displayName(TechnologyNames::identifierFor(source.emulate).value_or(source.emulate)),
-            false, true);
-    else
-        model()->setSource("service " + source.service, false, false);
     return true;
 }
 

@@ -7,6 +7,7 @@
 #include "TelephonyService/Replay/CaptureReader.h"
 
 #include <QCommandLineParser>
+#include <QFileInfo>
 #include <QMetaObject>
 
 #include <unistd.h>
@@ -100,6 +101,16 @@ bool MonitorLauncher::start(const Source& source, ApplicationObject* application
     }
     model_ = std::make_unique<VantorelModel>(application, serviceName);
     VantorelModel* model = model_.get();
+    // The status line names the source: known here for the in-process service; a running
+    // service names its own in its notifications.
+    if (!source.replay.empty())
+        model->setSource("replay " + QFileInfo(QString::fromStdString(source.replay)).fileName().toStdString(), true, true);
+    else if (!source.emulate.empty())
+        model->setSource("emulator " + TechnologyNames::displayName(TechnologyNames::identifierFor(source.emulate)
+                                                                      .value_or(source.emulate)),
+                         false, true);
+    else
+        model->setSource("service " + source.service, false, false);
     QMetaObject::invokeMethod(model, [model] { model->restartMonitor(); }, Qt::QueuedConnection);
     return true;
 }

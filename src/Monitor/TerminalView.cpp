@@ -46,7 +46,6 @@ void TerminalView::watchConnection() {
     if (interactive_) {
         winsize size{};
         const bool resized = ::ioctl(fileno(out_), TIOCGWINSZ, &size) == 0 && (size.ws_col != width_ || size.ws_row != height_);
-        if (!connected && wasConnected_) status_ = StatusText::kConnecting;
         if (resized || connected != wasConnected_) draw();
     } else if (!connected && wasConnected_) {
         status_ = StatusText::kConnecting;
@@ -59,8 +58,13 @@ void TerminalView::watchConnection() {
 std::string TerminalView::statusLine() const {
     std::string text = "Vantorel";
     if (model_ && model_->logGenerator()) {
-        text += " - ";
-        text += model_->isConnected() ? status_ : StatusText::kConnecting;
+        // The window's status line: source, state, replay position, a lost or finished stream.
+        SourceStatus status = model_->sourceStatus();
+        status.firstConnect = false;
+        status.updatedAt = updatedAt_;
+        if (!model_->isConnected() && status.phase != SourceStatus::Phase::Disconnected)
+            status.phase = SourceStatus::Phase::Connecting;
+        text += " - " + StatusText::line(status);
         text += " - " + std::to_string(model_->messagesDecoded()) + " messages decoded";
     }
     return text;
@@ -111,7 +115,10 @@ void TerminalView::draw() {
 
 void TerminalView::updateViewControllerFromModel() {
     ++refreshes_;
-    status_ = StatusText::updated(QDateTime::currentDateTime());
+    if (model_ && model_->isConnected() && (model_->messagesDecoded() != messagesShown_ || !updatedAt_.isValid())) {
+        messagesShown_ = model_->messagesDecoded();
+        updatedAt_ = QDateTime::currentDateTime();
+    }
     if (interactive_) {
         navigator_.setRoot(model_ ? model_->topLevelNodes() : nullptr);
         draw();

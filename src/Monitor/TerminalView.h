@@ -54,7 +54,9 @@ private:
     QTimer* connectionTimer_ = nullptr;
     bool wasConnected_ = true;
     int refreshes_ = 0;
-    std::string status_ = StatusText::kConnecting;
+    std::string status_ = StatusText::kConnecting;  // the plain output's "Connecting..." line
+    QDateTime updatedAt_;      // when new data was last shown
+    uint64_t messagesShown_ = 0;
     TerminalNavigator navigator_;
     std::unique_ptr<TerminalRawMode> rawMode_;
     QSocketNotifier* keys_ = nullptr;
