@@ -5,9 +5,15 @@
 #include "Platform/StringFormat.h"
 #include "Platform/SystemLog.h"
 
+#include <QDir>
+#include <QFileInfo>
 #include <QLocalServer>
 #include <QLocalSocket>
 #include <QPointer>
+
+#include <sys/socket.h>
+#include <sys/stat.h>
+#include <sys/un.h>
 
 #include <algorithm>
 
@@ -42,41 +48,56 @@ LocalMessagePort::~LocalMessagePort() {
     if (server_) server_->close();
 }
 
-std::unique_ptr<LocalMessagePort> LocalMessagePort::create(const std::string& name, ReceiveCallback callback) {
+std::unique_ptr<LocalMessagePort> LocalMessagePort::create(const std::string& name, ReceiveCallback callback,
+                                                           CreateFailure* failure) {
     std::unique_ptr<LocalMessagePort> port(new LocalMessagePort(name, std::move(callback)));
-    if (!port->listen()) return nullptr;
+    CreateFailure ignored;
+    if (!port->listen(failure ? failure : &ignored)) return nullptr;
     return port;
 }
 
-bool LocalMessagePort::listen() {
-    if (name_.empty()) {
-        SystemLog::log(SystemLog::kError, "%s", "Message port: cannot listen under an empty name");
+bool LocalMessagePort::listen(CreateFailure* failure) {
+    auto invalid = [&](const std::string& why) {
+        failure->nameInUse = false;
+        failure->reason = StringFormat::format("not a valid port name: %s (%s)", name_.c_str(), why.c_str());
+        SystemLog::log(SystemLog::kError, "Message port: %s", failure->reason.c_str());
         return false;
-    }
+    };
+    if (name_.empty()) return invalid("empty");
+    if (name_.find('\0') != std::string::npos) return invalid("it holds a NUL character");
+    // A name is a bare name under the temporary directory or an absolute socket path.
+    if (name_.front() != '/' && name_.find('/') != std::string::npos)
+        return invalid("a name with a slash must be an absolute path");
     server_ = new QLocalServer(this);
     const QString name = QString::fromStdString(name_);
+    // The socket file, by Qt's rule (docs/protocol.md).
+    const std::string path = name_.front() == '/' ? name_ : QDir::tempPath().toStdString() + "/" + name_;
+    const QFileInfo directory(QFileInfo(QString::fromStdString(path)).absolutePath());
+    if (!directory.isDir())
+        return invalid(StringFormat::format("the directory %s does not exist", directory.filePath().toStdString().c_str()));
+    if (path.size() >= sizeof(sockaddr_un::sun_path)) return invalid("too long for a socket path");
     if (!server_->listen(name)) {
-        if (server_->serverError() != QAbstractSocket::AddressInUseError) {
-            SystemLog::log(SystemLog::kError, "Message port %s: cannot listen (%s)", name_.c_str(),
-                           server_->errorString().toStdString().c_str());
-            return false;
-        }
-        // The name is taken: by a live port (then this one cannot exist) or by a
-        // socket file that a dead process left behind (then it is removed).
+        if (server_->serverError() != QAbstractSocket::AddressInUseError)
+            return invalid("no socket can be made there: " +
+                           server_->errorString().remove(QStringLiteral("QLocalServer::listen: ")).toStdString());
+        // The name is taken: by a live port (then this one cannot exist) or by a file
+        // that a dead process left behind (then it is removed). Under an absolute path
+        // only a socket file is: anything else there is someone's file, not a port.
+        struct stat st {};
+        if (name_.front() == '/' && ::lstat(path.c_str(), &st) == 0 && !S_ISSOCK(st.st_mode))
+            return invalid("a file that is not a socket is there");
         QLocalSocket probe;
         probe.connectToServer(name);
         const bool live = probe.waitForConnected(kProbeTimeoutMs);
         probe.abort();
         if (live) {
+            failure->nameInUse = true;
+            failure->reason = "the name is in use by a live port";
             SystemLog::log(SystemLog::kError, "Message port %s: the name is in use by a live port", name_.c_str());
             return false;
         }
         QLocalServer::removeServer(name);
-        if (!server_->listen(name)) {
-            SystemLog::log(SystemLog::kError, "Message port %s: cannot listen (%s)", name_.c_str(),
-                           server_->errorString().toStdString().c_str());
-            return false;
-        }
+        if (!server_->listen(name)) return invalid(server_->errorString().toStdString());
     }
     connect(server_, &QLocalServer::newConnection, this, &LocalMessagePort::acceptPeers);
     return true;

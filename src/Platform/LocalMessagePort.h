@@ -35,10 +35,19 @@ public:
     using ReceiveCallback = std::function<std::optional<Bytes>(int32_t messageId, const Bytes& data)>;
     using InvalidationCallback = std::function<void(LocalMessagePort* port)>;
 
-    // Listens under `name` (a QLocalServer name). Null when the name cannot be
-    // listened on (e.g. in use by a live port). A stale socket file left by a dead
-    // process is removed first.
-    static std::unique_ptr<LocalMessagePort> create(const std::string& name, ReceiveCallback callback);
+    // Why create() failed: a live port has the name, or the name cannot be a port at all
+    // (empty, a NUL character, a relative name with a slash, a directory that does not
+    // exist or takes no socket, an absolute path to a file that is not a socket, too long).
+    struct CreateFailure {
+        bool nameInUse = false;
+        std::string reason;  // "the name is in use by a live port", "not a valid port name: <name> (<why>)"
+    };
+
+    // Listens under `name` (a QLocalServer name). Null, with *failure set, when the
+    // name cannot be listened on. A stale socket file left by a dead process is
+    // removed first; under an absolute path, a file that is no socket is left alone.
+    static std::unique_ptr<LocalMessagePort> create(const std::string& name, ReceiveCallback callback,
+                                                    CreateFailure* failure = nullptr);
     ~LocalMessagePort() override;
 
     const std::string& name() const { return name_; }
@@ -75,7 +84,7 @@ private:
     struct Peer;
 
     LocalMessagePort(std::string name, ReceiveCallback callback);
-    bool listen();
+    bool listen(CreateFailure* failure);
     void acceptPeers();
     void readPeer(QLocalSocket* peer);
     void peerGone(QLocalSocket* peer);

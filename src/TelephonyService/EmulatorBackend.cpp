@@ -40,6 +40,10 @@ std::string EmulatorBackend::technology() const {
     return scenario_->technology();
 }
 
+std::string EmulatorBackend::source() const {
+    return "emulator " + TechnologyNames::displayName(technology());
+}
+
 std::string EmulatorBackend::description() const {
     return StringFormat::format("emulator (%s scenario, seed %llu, tick %lld ms)",
                                 TechnologyNames::shortName(scenario_->technology()).c_str(),

@@ -32,6 +32,8 @@ public:
 
     std::string technology() const override;
     std::string description() const override;
+    // "emulator <technology as people name it>"
+    std::string source() const override;
     void start() override;
     void stop() override;
 

@@ -38,11 +38,13 @@ void ModemBackend::setPaused(bool paused) {
 void ModemBackend::setState(State state) {
     if (state == state_) return;
     state_ = state;
+    if (state == State::Streaming) emittedThisRun_ = 0;
     emit stateChanged(state);
 }
 
 void ModemBackend::emitMessage(int32_t messageId, const Bytes& data) {
     ++emitted_;
+    ++emittedThisRun_;
     emit messageReady(messageId, data);
 }
 

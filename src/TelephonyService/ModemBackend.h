@@ -31,6 +31,13 @@ public:
     virtual std::string technology() const = 0;
     // One line for status output: "emulator (...)", "replay of ...".
     virtual std::string description() const = 0;
+    // Where the messages come from, for people: "emulator LTE", "replay sprint.mi2log".
+    virtual std::string source() const = 0;
+    // Messages in the whole stream (a replay); none for a live modem.
+    virtual std::optional<uint64_t> totalMessages() const { return std::nullopt; }
+    // Microseconds since 1970 of the last message sent, as its recording says (a
+    // replay of a file that carries times); none otherwise.
+    virtual std::optional<int64_t> recordedTime() const { return std::nullopt; }
 
     State state() const { return state_; }
     // Starts streaming (from the beginning after Idle or Finished); no-op while Streaming.
@@ -41,8 +48,9 @@ public:
     void setPaused(bool paused);
     bool isPaused() const { return paused_; }
 
-    // Messages emitted since construction.
+    // Messages emitted since construction, and since the last change to Streaming.
     uint64_t messagesEmitted() const { return emitted_; }
+    uint64_t messagesThisRun() const { return emittedThisRun_; }
 
     // The identifier for a technology name (ifx, gsm, cdma, lte, utran, any case) or a
     // full identifier; empty with *error set ("unknown technology ...") otherwise.
@@ -62,6 +70,7 @@ private:
     State state_ = State::Idle;
     bool paused_ = false;
     uint64_t emitted_ = 0;
+    uint64_t emittedThisRun_ = 0;
 };
 
 }  // namespace vantorel

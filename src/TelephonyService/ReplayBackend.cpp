@@ -30,9 +30,18 @@ std::string ReplayBackend::description() const {
                                 loop_ ? ", looping" : "");
 }
 
+std::string ReplayBackend::source() const {
+    return "replay " + (name_.empty() ? std::string("of a stream") : name_);
+}
+
+std::optional<int64_t> ReplayBackend::recordedTime() const {
+    return lastTime_ > 0 ? std::optional<int64_t>(lastTime_) : std::nullopt;
+}
+
 void ReplayBackend::start() {
     if (state() == State::Streaming) return;
     index_ = 0;
+    lastTime_ = 0;
     clock_.start();
     dueMicros_ = 0;
     setState(State::Streaming);
@@ -92,6 +101,7 @@ void ReplayBackend::run() {
         const TimedMessage& message = messages[index_++];
         if (index_ < messages.size()) dueMicros_ += gapBefore(index_);
         ++sent;
+        lastTime_ = message.timeMicros;
         emitMessage(message.messageId, message.data);
         // A slot may have paused or stopped us between two messages.
         if (state() != State::Streaming || isPaused()) return;

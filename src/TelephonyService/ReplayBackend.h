@@ -10,6 +10,7 @@
 #include <chrono>
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <string>
 
 namespace vantorel {
@@ -37,6 +38,11 @@ public:
 
     std::string technology() const override;
     std::string description() const override;
+    // "replay <file name>"
+    std::string source() const override;
+    std::optional<uint64_t> totalMessages() const override { return stream_.messages().size(); }
+    // The time of the last message sent; none before the first or when it has none (0 or less).
+    std::optional<int64_t> recordedTime() const override;
     void start() override;
     void stop() override;
 
@@ -59,6 +65,7 @@ private:
     QTimer timer_;
     QElapsedTimer clock_;
     size_t index_ = 0;      // the next message to send in the current pass
+    int64_t lastTime_ = 0;  // recorded time of the last message sent
     double dueMicros_ = 0;  // clock_ time at which message index_ is due
 };
 

@@ -7,6 +7,7 @@
 #include "Platform/SystemLog.h"
 #include "Platform/TechnologyNames.h"
 #include "Platform/TelephonyServiceConnection.h"
+#include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
 #include "PropertyList/PropertyListSerialization.h"
 #include "TelephonyService/EmulatorBackend.h"
@@ -18,6 +19,7 @@
 
 #include <sys/stat.h>
 
+#include <algorithm>
 #include <atomic>
 #include <cmath>
 #include <vector>
@@ -27,6 +29,8 @@ namespace vantorel {
 namespace {
 
 constexpr int kHealthIntervalMs = 500;
+// Progress ("Sent") is notified at most this often; the health check looks twice as often.
+constexpr int kProgressIntervalMs = 1000;
 
 // Dictionary → XML plist bytes; our own dictionaries of strings and numbers always serialise.
 Bytes xml(const DictionaryRef& dict) {
@@ -88,7 +92,8 @@ std::unique_ptr<ModemBackend> TelephonyService::createBackend(const TelephonySer
             options.replay.c_str(), stream.formatName(), TechnologyNames::listing().c_str()));
     if (stream.technologyFromFile() && !technology.empty() && technology != stream.technology())
         SystemLog::log(SystemLog::kWarning, "Telephony service: --technology %s ignored, the capture %s says %s",
-                       options.technology.c_str(), options.replay.c_str(), stream.technology().c_str());
+                       options.technology.c_str(), options.replay.c_str(),
+                       TechnologyNames::displayName(stream.technology()).c_str());
     const std::string name = QFileInfo(QString::fromStdString(options.replay)).fileName().toStdString();
     return std::make_unique<ReplayBackend>(std::move(stream), options.speed, options.loop, name);
 }
@@ -103,12 +108,25 @@ bool TelephonyService::start(std::string* error) {
         if (!backend_) return false;
     }
 
-    port_ = LocalMessagePort::create(portName_,
-                                     [this](int32_t messageId, const Bytes& data) { return receiveOnServicePort(messageId, data); });
+    // Recording onto the file being replayed would destroy it, --force or not.
+    if (!options_.record.empty() && !options_.replay.empty()) {
+        const QFileInfo recorded(QString::fromStdString(options_.record)), replayed(QString::fromStdString(options_.replay));
+        if (recorded.exists() && recorded.canonicalFilePath() == replayed.canonicalFilePath()) {
+            if (error) *error = options_.record + ": the file being replayed cannot be recorded onto";
+            return false;
+        }
+    }
+
+    LocalMessagePort::CreateFailure failure;
+    port_ = LocalMessagePort::create(
+        portName_, [this](int32_t messageId, const Bytes& data) { return receiveOnServicePort(messageId, data); }, &failure);
     if (!port_) {
         if (error)
-            *error = StringFormat::format("cannot listen on port %s: the name is in use (is another service running?)",
-                                          portName_.c_str());
+            *error = failure.nameInUse ? StringFormat::format(
+                                             "cannot listen on port %s: the name is in use (is another service running?)",
+                                             portName_.c_str())
+                                       : StringFormat::format("cannot listen on port %s: %s", portName_.c_str(),
+                                                              failure.reason.c_str());
         return false;
     }
     // Clients come and go on the well-known port; it serves until stop().
@@ -119,8 +137,10 @@ bool TelephonyService::start(std::string* error) {
 
     // Only now: a port in use must not have truncated an earlier recording.
     if (!options_.record.empty()) {
-        recorder_ = CaptureWriter::create(options_.record, backend_->technology(), error);
+        recorder_ = CaptureWriter::create(options_.record, backend_->technology(), error, options_.replaceRecording);
         if (!recorder_) {
+            if (error && !options_.replaceRecording && QFileInfo::exists(QString::fromStdString(options_.record)))
+                *error += "; it is left as it is (--force replaces it)";
             port_->setInvalidationCallback(nullptr);
             port_.reset();
             return false;
@@ -130,6 +150,8 @@ bool TelephonyService::start(std::string* error) {
     connect(backend_.get(), &ModemBackend::messageReady, this, &TelephonyService::sendMessage);
     connect(backend_.get(), &ModemBackend::stateChanged, this, &TelephonyService::backendStateChanged);
     healthTimer_.start(kHealthIntervalMs);
+    // A recording starts with the modem, not with the first client.
+    if (recorder_) backend_->start();
     return true;
 }
 
@@ -181,7 +203,7 @@ TelephonyService::PortCounts TelephonyService::portCountsNow() const {
 std::string TelephonyService::startupLine() const {
     return StringFormat::format("listening on %s, backend %s, technology %s", portName_.c_str(),
                                 backend_ ? backend_->description().c_str() : "none",
-                                backend_ ? backend_->technology().c_str() : "none");
+                                backend_ ? TechnologyNames::displayName(backend_->technology()).c_str() : "none");
 }
 
 void TelephonyService::statusLine(const std::string& line) {
@@ -260,9 +282,9 @@ Bytes TelephonyService::createLogChannel(const std::string& clientPortName) {
     channel->age.start();
     channels_[number] = std::move(channel);
     ++counters_.channelsServed;
-    statusLine(StringFormat::format("client connected: channel %llu on %s for %s; %zu open",
+    statusLine(StringFormat::format("client connected: channel %llu on %s for %s, technology %s; %zu open",
                                     static_cast<unsigned long long>(number), name.c_str(), clientPortName.c_str(),
-                                    channels_.size()));
+                                    TechnologyNames::displayName(backend_->technology()).c_str(), channels_.size()));
     return channelReply(kNoError, name);
 }
 
@@ -347,7 +369,7 @@ void TelephonyService::closeChannel(uint64_t number, const std::string& why) {
                                     static_cast<unsigned long long>(channel->dropped), channels_.size()));
     if (stopping_) return;
     // Nobody listens any more: the modem's logging is switched off (docs/protocol.md).
-    if (channels_.empty() && backend_ && backend_->state() == ModemBackend::State::Streaming) {
+    if (channels_.empty() && !recorder_ && backend_ && backend_->state() == ModemBackend::State::Streaming) {
         backend_->stop();
         statusLine("no client left: backend stopped");
     }
@@ -357,24 +379,30 @@ void TelephonyService::closeChannel(uint64_t number, const std::string& why) {
 // ---- streaming ----
 
 void TelephonyService::sendMessage(int32_t messageId, const Bytes& data) {
-    bool forwarded = false;
+    // Written first and unbuffered: whatever happens to clients or to this process
+    // afterwards, the message is in the file.
+    if (recorder_) {
+        if (recorder_->write(CaptureWriter::nowMicros(), messageId, data)) {
+            ++counters_.messagesRecorded;
+        } else {
+            SystemLog::log(SystemLog::kError, "Telephony service: recording stopped: %s", recorder_->error().c_str());
+            statusLine("recording stopped: " + recorder_->error());
+            recorder_.reset();
+        }
+    }
+    if (const auto record = LogMask::classify(data); record && record->isOrdinary())
+        if (const auto technology = TechnologyNames::identifierForLogCode(record->code);
+            technology && std::find(logTechnologies_.begin(), logTechnologies_.end(), *technology) == logTechnologies_.end())
+            logTechnologies_.push_back(*technology);
+
     bool congestion = false;
     for (auto& [number, channel] : channels_) {
         if (!channel->streaming || channel->closing || !channel->mask.forwards(data)) continue;
-        forwarded = true;
         // Behind what waits already, so that the client gets its messages in order.
         if (channel->congested || !channel->queue.empty()) {
             enqueue(*channel, messageId, data);
         } else if (deliver(number, *channel, messageId, data)) {
             congestion = congestion || channel->congested;
-        }
-    }
-    if (forwarded && recorder_) {
-        if (recorder_->write(CaptureWriter::nowMicros(), messageId, data)) {
-            ++counters_.messagesRecorded;
-        } else {
-            SystemLog::log(SystemLog::kError, "Telephony service: recording stopped: %s", recorder_->error().c_str());
-            recorder_.reset();
         }
     }
     if (congestion) updateFlow();
@@ -430,26 +458,43 @@ void TelephonyService::updateFlow() {
     // A client behind but still taking holds the replay back (nothing is lost for a
     // slow reader); one that has taken nothing for kStallMs no longer does, and only
     // its own queue drops. With no channel able to take more, the replay waits.
-    bool canTake = false, holdsBack = false;
+    // With no client streaming, only a recording takes the messages, at the replay's pace.
+    bool canTake = false, holdsBack = false, streaming = false;
     for (const auto& entry : channels_) {
         const Channel& channel = *entry.second;
         if (!channel.streaming || channel.closing) continue;
+        streaming = true;
         if (!channel.congested)
             canTake = true;
         else if (channel.congestedSince.elapsed() < kStallMs)
             holdsBack = true;
     }
-    backend_->setPaused(!canTake || holdsBack);
+    backend_->setPaused(streaming ? !canTake || holdsBack : !recorder_);
 }
 
-void TelephonyService::backendStateChanged(ModemBackend::State state) {
+void TelephonyService::notifyBackendState() {
     auto info = Dictionary::create();
-    info->set("State", Value(ModemBackend::stateName(state)));
+    info->set("State", Value(ModemBackend::stateName(backend_->state())));
     info->set("Technology", Value(backend_->technology()));
+    info->set("Source", Value(backend_->source()));
+    info->set("Sent", Value::integer(static_cast<int64_t>(backend_->messagesThisRun())));
+    if (const auto total = backend_->totalMessages()) info->set("Total", Value::integer(static_cast<int64_t>(*total)));
+    if (const auto time = backend_->recordedTime()) info->set("RecordedTime", Value::integer(*time));
+    auto technologies = Array::create();
+    for (const std::string& identifier : logTechnologies_) technologies->append(Value(identifier));
+    info->set("LogTechnologies", Value(technologies));
     auto notification = Dictionary::create();
     notification->set("Name", Value("BackendStateChanged"));
     notification->set("Info", Value(info));
     if (port_) port_->broadcastNotification(kNotificationMessageId, xml(notification));
+    notifiedSent_ = backend_->messagesThisRun();
+    notified_.start();
+}
+
+void TelephonyService::backendStateChanged(ModemBackend::State state) {
+    // A new run: what its stream holds is learnt afresh.
+    if (state == ModemBackend::State::Streaming) logTechnologies_.clear();
+    notifyBackendState();
 
     if (state == ModemBackend::State::Finished) {
         const auto* replay = qobject_cast<const ReplayBackend*>(backend_.get());
@@ -465,7 +510,6 @@ void TelephonyService::backendStateChanged(ModemBackend::State state) {
     } else if (state == ModemBackend::State::Failed) {
         statusLine("backend failed");
     }
-    if (recorder_) recorder_->flush();
 }
 
 void TelephonyService::checkHealth() {
@@ -479,6 +523,9 @@ void TelephonyService::checkHealth() {
                                         static_cast<unsigned long long>(ports.overLimit)));
         reported_ = ports;
     }
+    if (backend_ && backend_->state() == ModemBackend::State::Streaming &&
+        backend_->messagesThisRun() != notifiedSent_ && notified_.isValid() && notified_.hasExpired(kProgressIntervalMs - 50))
+        notifyBackendState();
     for (const auto& entry : channels_) {
         if (entry.second->closing) continue;
         // A client that died without its invalidation reaching us.
@@ -488,7 +535,6 @@ void TelephonyService::checkHealth() {
         else if (!entry.second->port->hadConnection() && entry.second->age.hasExpired(kUnclaimedChannelMs))
             scheduleClose(entry.first, "nobody connected to its port");
     }
-    if (recorder_) recorder_->flush();
 }
 
 bool TelephonyService::servesPort(const RemoteMessagePort& port) const {

@@ -17,6 +17,7 @@
 #include <memory>
 #include <optional>
 #include <string>
+#include <vector>
 
 namespace vantorel {
 
@@ -32,7 +33,8 @@ struct TelephonyServiceOptions {
     std::string technology;  // --technology TECH, for files that do not carry one
     double speed = 1.0;      // --speed X (replay)
     bool loop = false;       // --loop (replay)
-    std::string record;      // --record FILE: every message sent, as a capture
+    std::string record;      // --record FILE: every message the backend produces, as a capture
+    bool replaceRecording = false;  // --force: an existing record FILE is replaced (else refused, untouched)
     uint64_t seed = 1;       // emulator scenario seed
     // Builds the backend instead of emulate / replay (tests, embedders); called on the
     // service's thread.
@@ -53,11 +55,15 @@ struct TelephonyServiceOptions {
 //   - messages go to the client's receive port as Message frames, one record each, only
 //     while the channel streams and only those its mask forwards;
 //   - backend state changes are broadcast to the well-known port's connected clients as
-//     Notification frames (id 0) {"Name": "BackendStateChanged", "Info": {"State", "Technology"}}.
+//     Notification frames (id 0) {"Name": "BackendStateChanged", "Info": {"State",
+//     "Technology", "Source", "Sent", "Total", "RecordedTime", "LogTechnologies"}}, and
+//     again at most once a second while streaming when "Sent" changed.
 // The backend starts on the first start command (and again after a finished replay when
 // a start command comes while no channel streams) and stops when the last channel is
 // freed (a replay then starts over for the next client; the emulator's ticks go on
-// counting). A channel whose client has more than kHighWaterBytes not yet taken keeps
+// counting). When recording, the backend starts with the service and runs until it
+// stops, clients or none: every message it produces is written, and a replay that no
+// client holds back runs at its own pace. A channel whose client has more than kHighWaterBytes not yet taken keeps
 // what comes next in a queue of at most kMaxQueuedBytes, dropping its oldest messages
 // beyond that. A replay waits (is paused) while a client is behind but still taking
 // (lossless back-pressure for slow readers) and while no streaming channel can take more;
@@ -120,7 +126,7 @@ public:
     const std::string& portName() const { return portName_; }
     ModemBackend* backend() const { return backend_.get(); }
     Counters counters() const;
-    // "listening on <port>, backend <description>, technology <identifier>"
+    // "listening on <port>, backend <description>, technology <display name>"
     std::string startupLine() const;
 
     // Progress lines (a client came or went, a replay ended), on the service's thread.
@@ -164,6 +170,7 @@ private:
     // True when the port named is one this service listens on (the same socket file).
     bool servesPort(const RemoteMessagePort& port) const;
     void backendStateChanged(ModemBackend::State state);
+    void notifyBackendState();
     void updateFlow();
     void checkHealth();
     void statusLine(const std::string& line);
@@ -181,6 +188,9 @@ private:
     PortCounts closedPorts_;  // of the ports closed already
     PortCounts reported_;
     bool stopping_ = false;
+    std::vector<std::string> logTechnologies_;  // of the ordinary log codes seen this run, first-seen order
+    uint64_t notifiedSent_ = 0;                 // "Sent" of the last notification
+    QElapsedTimer notified_;                    // since the last notification
 };
 
 }  // namespace vantorel

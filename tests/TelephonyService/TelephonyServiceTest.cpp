@@ -13,6 +13,8 @@
 
 #include <QCoreApplication>
 #include <QDir>
+#include <QElapsedTimer>
+#include <QFile>
 #include <QLocalSocket>
 #include <QTemporaryDir>
 #include <QThread>
@@ -22,6 +24,7 @@
 #include <sys/un.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <atomic>
 #include <memory>
 #include <string>
@@ -120,8 +123,10 @@ TEST(TelephonyService, ClientsThatGoAwayFreeTheirChannelsAndTheLastOneStopsTheBa
     watcher.close();
     ASSERT_TRUE(waitForCounters(service, [](const Counters& c) { return c.openChannels == 0; }));
     EXPECT_EQ(backendState(service), ModemBackend::State::Idle);
-    ASSERT_TRUE(waitUntil([&] { return watcher.backendStates().size() >= 2; }));
-    EXPECT_EQ(watcher.backendStates(), (std::vector<std::string>{"Streaming", "Idle"}));
+    ASSERT_TRUE(waitUntil([&] { return watcher.backendStates().back() == "Idle"; }));
+    std::vector<std::string> changes = watcher.backendStates();  // progress repeats "Streaming"
+    changes.erase(std::unique(changes.begin(), changes.end()), changes.end());
+    EXPECT_EQ(changes, (std::vector<std::string>{"Streaming", "Idle"}));
     EXPECT_EQ(service.counters().channelsServed, 3u);
 }
 
@@ -278,29 +283,64 @@ TEST(TelephonyService, AClientThatNeverReadsLosesItsOldestMessagesAndHoldsUpNoOt
     ::unlink(path.c_str());
 }
 
-TEST(TelephonyService, RecordingWritesEveryMessageSentAsACapture) {
+TEST(TelephonyService, RecordingTakesEveryMessageFromTheStartWithoutAClientAndIsOnDiskAtOnce) {
     QTemporaryDir dir;
     const std::string path = dir.filePath("rec.vcap").toStdString();
+    QFile old(QString::fromStdString(path));
+    ASSERT_TRUE(old.open(QIODevice::WriteOnly) && old.write("an older recording") > 0);
+    old.close();
     TelephonyServiceOptions options = replayOptions(kMixed);
     options.record = path;
+    options.replaceRecording = true;
     TelephonyServiceThread service(options);
     ASSERT_TRUE(service.start());
-    TestClient client;
-    ASSERT_TRUE(client.connect(service.portName()));
-    ASSERT_TRUE(client.send(startCommand({0xD00C}, {1, 2})));
-    const std::vector<Bytes> expected = {kCodeB, kExtra1, kExtra2, kJunk};
-    ASSERT_TRUE(waitUntil([&] { return client.received.size() >= expected.size(); }));
-    service.stop();
-    EXPECT_EQ(service.counters().messagesRecorded, expected.size());
+    ASSERT_TRUE(waitForCounters(service, [](const Counters& c) { return c.messagesRecorded == kMixed.size(); }));
 
-    const Capture capture = CaptureReader::readFile(path);
+    const Capture capture = CaptureReader::readFile(path);  // while the service still runs
     ASSERT_TRUE(capture.ok()) << capture.report.error;
     EXPECT_EQ(capture.technology, kTSLogChannelTechnology_Morvek_UTRAN2);
-    ASSERT_EQ(capture.messages.size(), expected.size());
-    for (size_t i = 0; i < expected.size(); ++i) {
-        EXPECT_EQ(capture.messages[i].data, expected[i]);
+    ASSERT_EQ(capture.messages.size(), kMixed.size());
+    for (size_t i = 0; i < kMixed.size(); ++i) {
+        EXPECT_EQ(capture.messages[i].data, kMixed[i]);
         EXPECT_GT(capture.messages[i].timeMicros, 1700000000LL * 1000000);
     }
+}
+
+TEST(TelephonyService, BackendStateChangedTellsSourceProgressAndTheTechnologiesOfTheStream) {
+    const Bytes lte = RecordBuilder::ordinary(0xB0C0, 20).build();
+    std::vector<Bytes> records;
+    std::vector<int64_t> times;
+    for (int i = 0; i < 20; ++i) {  // 1.9 s at the recorded pace
+        records.push_back(i % 4 == 0 ? kExtra1 : i % 4 == 3 ? lte : kCodeA);
+        times.push_back(1700000000000000 + i * 100000);
+    }
+    TelephonyServiceThread service(
+        options([=] { return std::make_unique<ReplayBackend>(streamOf(records, times), 1, false, "short.vcap"); }));
+    ASSERT_TRUE(service.start());
+    TestClient client;
+    ASSERT_TRUE(client.connect(service.portName(), /*keepConnection=*/true));
+    QElapsedTimer clock;
+    clock.start();
+    ASSERT_TRUE(client.send(startCommand({}, {}, false)));
+    ASSERT_TRUE(waitUntil([&] { return !client.notifications.empty() && client.backendStates().back() == "Finished"; }, 5000));
+
+    std::vector<DictionaryRef> infos;
+    for (const auto& [name, info] : client.notifications) infos.push_back(info.asDictionary());
+    ASSERT_GE(infos.size(), 3u);  // Streaming, progress at most once a second, Finished
+    EXPECT_LE(infos.size() - 2, static_cast<size_t>((clock.elapsed() + 999) / 1000));
+    for (size_t i = 0; i < infos.size(); ++i) {
+        const DictionaryRef& info = infos[i];
+        EXPECT_EQ(*info->get("Source").asString(), "replay short.vcap");
+        EXPECT_EQ(info->get("Total").asInteger(), 20);
+        if (i > 0) EXPECT_GT(info->get("Sent").asInteger(), infos[i - 1]->get("Sent").asInteger());
+    }
+    EXPECT_EQ(infos.front()->get("Sent").asInteger(), 0);
+    EXPECT_FALSE(infos.front()->contains("RecordedTime"));
+    EXPECT_EQ(infos.back()->get("Sent").asInteger(), 20);
+    EXPECT_EQ(infos.back()->get("RecordedTime").asInteger(), times.back());
+    std::vector<std::string> technologies;
+    for (const Value& v : *infos.back()->get("LogTechnologies").asArray()) technologies.push_back(*v.asString());
+    EXPECT_EQ(technologies, (std::vector<std::string>{kTSLogChannelTechnology_Morvek_UTRAN2, kTSLogChannelTechnology_Morvek_LTE}));
 }
 
 TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
@@ -318,8 +358,14 @@ TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
     ASSERT_TRUE(first.start(&error)) << error;
     EXPECT_TRUE(first.start(&error));  // already running: nothing more to do
     EXPECT_EQ(first.startupLine(), "listening on " + running.portName +
-                                       ", backend replay of qmdl_example.qmdl (QMDL, 336 messages, speed 1), technology " +
-                                       kTSLogChannelTechnology_Morvek_GSM);
+                                       ", backend replay of qmdl_example.qmdl (QMDL, 336 messages, speed 1), technology GSM/UMTS");
+    QTemporaryDir dir;  // an earlier recording, which no failed start may touch
+    const std::string existing = dir.filePath("old.vcap").toStdString();
+    const Bytes oldBytes = CaptureWriter::headerBytes(kTSLogChannelTechnology_Morvek_UTRAN2);
+    QFile oldFile(QString::fromStdString(existing));
+    ASSERT_TRUE(oldFile.open(QIODevice::WriteOnly));
+    oldFile.write(reinterpret_cast<const char*>(oldBytes.data()), static_cast<qint64>(oldBytes.size()));
+    oldFile.close();
 
     auto with = [](auto change) {
         TelephonyServiceOptions o = options();
@@ -335,6 +381,12 @@ TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
         {with([](auto& o) { o.replay = "x"; o.speed = -1; }), "speed -1: give 0"},
         {with([](auto& o) { o.emulate = "utran"; o.record = "/nonexistent-dir-of-vantorel/x.vcap"; }),
          "/nonexistent-dir-of-vantorel/x.vcap: "},
+        {with([&](auto& o) { o.emulate = "utran"; o.record = existing; }),
+         existing + ": the file exists already; it is left as it is (--force replaces it)"},
+        {with([&](auto& o) { o.replay = o.record = existing; o.replaceRecording = true; }),
+         existing + ": the file being replayed cannot be recorded onto"},
+        {with([](auto& o) { o.emulate = "utran"; o.portName = "/proc/vantorel-port"; }),
+         "cannot listen on port /proc/vantorel-port: not a valid port name: /proc/vantorel-port ("},
     };
     for (const auto& [failing, why] : failures) {
         TelephonyServiceThread service(failing);
@@ -344,6 +396,8 @@ TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
         // Nothing is left listening after a failed start.
         EXPECT_TRUE(failing.portName == running.portName || !RemoteMessagePort::lookup(failing.portName, 100));
     }
+    ASSERT_TRUE(oldFile.open(QIODevice::ReadOnly));
+    EXPECT_EQ(oldFile.readAll().toStdString(), std::string(oldBytes.begin(), oldBytes.end()));
 
     TestClient client;
     ASSERT_TRUE(client.connect(running.portName));

@@ -4,16 +4,21 @@
 #include "Platform/RecordBuilder.h"
 
 #include <QFile>
+#include <QFileInfo>
 
 #include <chrono>
 
 namespace vantorel {
 
 std::unique_ptr<CaptureWriter> CaptureWriter::create(const std::string& path, const std::string& technology,
-                                                     std::string* error) {
+                                                     std::string* error, bool replace) {
     auto file = std::make_unique<QFile>(QString::fromStdString(path));
-    if (!file->open(QIODevice::WriteOnly | QIODevice::Truncate)) {
-        if (error) *error = path + ": " + file->errorString().toStdString();
+    // NewOnly creates exclusively: a file that appears meanwhile is not truncated either.
+    const QIODevice::OpenMode mode =
+        QIODevice::WriteOnly | QIODevice::Unbuffered | (replace ? QIODevice::Truncate : QIODevice::NewOnly);
+    if (!file->open(mode)) {
+        const bool exists = !replace && QFileInfo(QString::fromStdString(path)).exists();
+        if (error) *error = path + ": " + (exists ? std::string("the file exists already") : file->errorString().toStdString());
         return nullptr;
     }
     std::unique_ptr<CaptureWriter> writer(new CaptureWriter(path, std::move(file)));

@@ -30,10 +30,13 @@ public:
     static constexpr size_t kFileHeaderLength = 16;     // magic, version, n (before the identifier)
     static constexpr size_t kMessageHeaderLength = 16;  // time, id, L
 
-    // Creates (or truncates) the file and writes its header; null with *error set to
-    // "<path>: <reason>" when it cannot be written.
+    // Creates the file and writes its header; null with *error set to "<path>: <reason>"
+    // when it cannot be written. An existing file is refused and left as it is
+    // ("<path>: the file exists already") unless replace is true (then it is truncated).
+    // Writes are unbuffered: each message reaches the file in one write, so a process
+    // killed at any moment leaves a capture readable up to its last message.
     static std::unique_ptr<CaptureWriter> create(const std::string& path, const std::string& technology,
-                                                 std::string* error);
+                                                 std::string* error, bool replace = false);
     // Flushes and closes the file.
     ~CaptureWriter();
     CaptureWriter(const CaptureWriter&) = delete;

@@ -8,6 +8,7 @@
 
 #include <QCommandLineParser>
 #include <QCoreApplication>
+#include <QFileInfo>
 
 #include <cstdio>
 #include <string>
@@ -49,15 +50,19 @@ int main(int argc, char** argv) {
         QStringLiteral("technology"),
         QStringLiteral("The technology of a replayed file that does not carry one (QMDL, DLF): %1.").arg(names),
         QStringLiteral("TECH"));
-    const QCommandLineOption record(QStringLiteral("record"),
-                                    QStringLiteral("Write every message sent to FILE, as a capture."),
-                                    QStringLiteral("FILE"));
+    const QCommandLineOption record(
+        QStringLiteral("record"),
+        QStringLiteral("Write every message the modem produces to FILE, as a capture, from the start whether or not a "
+                       "client is connected; each message is on disk as soon as it is written. An existing FILE is "
+                       "refused and left untouched (exit 2) unless --force is given."),
+        QStringLiteral("FILE"));
+    const QCommandLineOption force(QStringLiteral("force"), QStringLiteral("Let --record replace an existing FILE."));
     const QCommandLineOption port(QStringLiteral("port"),
                                   QStringLiteral("The service's well-known port (default %1).")
                                       .arg(QString::fromStdString(TelephonyServiceConnection::defaultServiceName())),
                                   QStringLiteral("NAME"));
     const QCommandLineOption verbose(QStringLiteral("verbose"), QStringLiteral("Mirror the system log to stderr."));
-    parser.addOptions({emulate, replay, speed, loop, technology, record, port, verbose});
+    parser.addOptions({emulate, replay, speed, loop, technology, record, force, port, verbose});
     parser.process(app);  // --help and unknown options end here
 
     if (!parser.positionalArguments().isEmpty())
@@ -65,6 +70,14 @@ int main(int argc, char** argv) {
     if (parser.isSet(emulate) == parser.isSet(replay)) return fail("give exactly one of --emulate TECH and --replay FILE");
     if (parser.isSet(emulate) && (parser.isSet(speed) || parser.isSet(loop) || parser.isSet(technology)))
         return fail("--speed, --loop and --technology apply to --replay only");
+    if (parser.isSet(force) && !parser.isSet(record)) return fail("--force applies to --record only");
+    // Checked before anything starts; the writer's exclusive create still guards a file that appears meanwhile.
+    const QFileInfo recordFile(parser.value(record));
+    if (parser.isSet(record) && !parser.isSet(force) && (recordFile.exists() || recordFile.isSymLink())) {
+        std::fprintf(stderr, "vantorel-telephonyd: %s exists already; it is left as it is (--force replaces it)\n",
+                     parser.value(record).toLocal8Bit().constData());
+        return 2;
+    }
 
     TelephonyServiceOptions options;
     options.emulate = parser.value(emulate).toStdString();
@@ -72,6 +85,7 @@ int main(int argc, char** argv) {
     options.technology = parser.value(technology).toStdString();
     options.loop = parser.isSet(loop);
     options.record = parser.value(record).toStdString();
+    options.replaceRecording = parser.isSet(force);
     options.portName = parser.value(port).toStdString();
     bool speedOk = false;
     options.speed = parser.value(speed).toDouble(&speedOk);
