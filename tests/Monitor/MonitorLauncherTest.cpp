@@ -40,9 +40,11 @@ TEST(MonitorLauncher, AReplayedCaptureReachesTheTerminalViewThroughServiceModelA
     MonitorLauncher launcher;
     ASSERT_TRUE(launcher.start(*source, &view, &error)) << error;
     view.setModel(launcher.model());
-    ASSERT_TRUE(waitUntil([&] { return view.refreshes() >= 1 && view.screen().find("\n    Local Area Code: 23071\n") != std::string::npos; }, 10000));
+    // At speed 0 the whole capture streams at once: the header ends up saying so.
+    ASSERT_TRUE(waitUntil([&] { return view.refreshes() >= 1 && view.screen().find("\n    Local Area Code: 23071\n") != std::string::npos &&
+                                       view.screen().rfind("Vantorel - replay finished", 0) == 0; }, 10000));
     const std::string screen = view.screen();
-    EXPECT_EQ(screen.rfind("Vantorel - Updated ", 0), 0u) << screen;
+    EXPECT_EQ(screen.rfind("Vantorel - replay finished: 112 messages, 112 for this decoder · replay utran.vcap - 112 messages decoded", 0), 0u) << screen;
     EXPECT_NE(screen.find(" messages decoded\n\nTechnology: UTRAN (TD-SCDMA)\n"), std::string::npos) << screen;
     EXPECT_NE(screen.find("\n    0: UARFCN "), std::string::npos) << screen;  // a list entry on one line, named fields
     std::fclose(out);

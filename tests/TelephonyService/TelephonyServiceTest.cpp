@@ -332,7 +332,9 @@ TEST(TelephonyService, BackendStateChangedTellsSourceProgressAndTheTechnologiesO
         const DictionaryRef& info = infos[i];
         EXPECT_EQ(*info->get("Source").asString(), "replay short.vcap");
         EXPECT_EQ(info->get("Total").asInteger(), 20);
-        if (i > 0) EXPECT_GT(info->get("Sent").asInteger(), infos[i - 1]->get("Sent").asInteger());
+        if (i > 0) {
+            EXPECT_GT(info->get("Sent").asInteger(), infos[i - 1]->get("Sent").asInteger());
+        }
     }
     EXPECT_EQ(infos.front()->get("Sent").asInteger(), 0);
     EXPECT_FALSE(infos.front()->contains("RecordedTime"));
