@@ -21,15 +21,19 @@ std::string listOfNames(const std::vector<std::string>& identifiers) {
     return text;
 }
 
-std::string noRecordText(const SourceStatus& status) {
-    std::string text = "no record for the " + TechnologyNames::displayName(status.decoderTechnology) + " decoder; ";
+// What the stream's log codes are, and the technology to try instead.
+std::string holdsText(const SourceStatus& status) {
     const char* holder = status.isReplay ? "this file" : "this stream";
-    if (status.logTechnologies.empty()) return text + holder + " has sent no log codes yet";
-    text += std::string(holder) + " holds " + listOfNames(status.logTechnologies) + " codes";
+    if (status.logTechnologies.empty()) return std::string(holder) + " has sent no log codes yet";
+    std::string text = std::string(holder) + " holds " + listOfNames(status.logTechnologies) + " codes";
     for (const std::string& identifier : status.logTechnologies)
         if (identifier != status.decoderTechnology && TechnologyNames::shortName(identifier) != identifier)
             return text + ": try --technology " + TechnologyNames::shortName(identifier);
     return text;
+}
+
+std::string noRecordText(const SourceStatus& status) {
+    return "no record for the " + TechnologyNames::displayName(status.decoderTechnology) + " decoder; " + holdsText(status);
 }
 
 }  // namespace
@@ -45,9 +49,13 @@ std::string StatusText::line(const SourceStatus& status) {
         return status.firstConnect ? kFirstConnecting : kConnecting;
     case SourceStatus::Phase::Disconnected:
         return "disconnected since " + status.disconnectedAt.toString(QStringLiteral("HH:mm:ss")).toStdString() + source;
-    case SourceStatus::Phase::Finished:
-        return "replay finished: " + std::to_string(status.total.value_or(status.sent.value_or(0))) + " messages, " +
-               std::to_string(status.forDecoder) + " for this decoder" + source;
+    case SourceStatus::Phase::Finished: {
+        std::string text = "replay finished: " + std::to_string(status.total.value_or(status.sent.value_or(0))) +
+                           " messages, " + std::to_string(status.forDecoder) + " for this decoder";
+        // A fast replay ends before the 10 s wait: the hint comes with the end.
+        if (status.forDecoder == 0 && !status.decoderTechnology.empty()) text += "; " + holdsText(status);
+        return text + source;
+    }
     case SourceStatus::Phase::Streaming:
         break;
     }

@@ -35,6 +35,8 @@ TEST(StatusText, EachStateOfTheStreamReadsAsTheUserNeedsIt) {
          "disconnected since 22:01:10 \u00b7 service vt"},
         {make(Phase::Finished, [](SourceStatus& s) { s.sent = 120; s.total = 120; s.forDecoder = 80; }),
          "replay finished: 120 messages, 80 for this decoder \u00b7 replay sprint.qmdl"},
+        {make(Phase::Finished, [](SourceStatus& s) { s.sent = 9; s.logTechnologies = {kTSLogChannelTechnology_Morvek_LTE}; }),
+         "replay finished: 9 messages, 0 for this decoder; this file holds LTE codes: try --technology lte \u00b7 replay sprint.qmdl"},
         {make(Phase::Streaming, [&](SourceStatus& s) { s.noRecordForDecoder = true; s.logTechnologies = {lte, gsm}; }),
          "no record for the UTRAN (TD-SCDMA) decoder; this file holds LTE and GSM/UMTS codes: try --technology lte "
          "\u00b7 replay sprint.qmdl"},
