@@ -22,7 +22,8 @@ std::optional<vantorel::MonitorLauncher::Source> parseOptions(QCoreApplication& 
     parser.setApplicationDescription(
         "Vantorel: watch, live, what a cellular modem reports, as drill-down panes.\n"
         "Without a source, the built-in modem emulator runs in-process (UTRAN).\n"
-        "Keys: arrows move, Enter drills down, Backspace or Alt+Left goes back.");
+        "Keys: arrows move, Enter drills down, Backspace or Alt+Left goes back\n"
+        "(in the terminal view also PgUp/PgDn to scroll and q to quit).");
     parser.addHelpOption();
     vantorel::MonitorLauncher::addOptions(parser);
     parser.addOption({"allow-save", "Offer the snapshot save button (also: AllowSaveButton in the settings)."});

@@ -15,7 +15,8 @@ int WatchCommand::run(const QStringList& args) {
     QCommandLineParser parser;
     parser.setApplicationDescription(
         "Watch the monitor's display in the terminal, refreshed every 2 s when new data arrived.\n"
-        "Without a source, the built-in modem emulator runs in-process (UTRAN). Ctrl-C ends.");
+        "Without a source, the built-in modem emulator runs in-process (UTRAN); Ctrl-C ends.\n"
+        "Keys in a terminal: arrows move, Enter opens, Backspace goes back, PgUp/PgDn scroll, q quits.");
     parser.addHelpOption();
     MonitorLauncher::addOptions(parser);
     parser.addOption({"verbose", "Mirror the system log to stderr."});
