@@ -2,8 +2,10 @@
 #include "App/VantorelApp.h"
 
 #include "App/NavigationController.h"
+#include "App/VantorelSaveViewController.h"
 #include "Model/VantorelModel.h"
 #include "PaneTestSupport.h"
+#include "Platform/DiagnosticLogDirectory.h"
 #include "Platform/Preferences.h"
 #include "Platform/RecordBuilder.h"
 #include "PropertyList/Array.h"
@@ -75,8 +77,13 @@ TEST_F(VantorelAppTest, TheRootReadsConnectingUntilTheFirstUpdateThenConnectingD
     ASSERT_TRUE(first);
     app->showSaveView();
     EXPECT_EQ(app->saveViewController(), first);
+    DiagnosticLogDirectory::setOverride(settings.filePath("logs").toStdString());
+    first->savePressed();
+    const std::string path = first->lastWritePath();
     app->closeSaveView();
     EXPECT_EQ(app->saveViewController(), nullptr);
+    EXPECT_EQ(app->navigationController()->topPane()->status(), "Saved " + path);  // for a few seconds
+    DiagnosticLogDirectory::setOverride("");
 }
 
 TEST_F(VantorelAppTest, WhenADeeperPanesBranchVanishesTheStackPopsToThePaneBelowIt) {
