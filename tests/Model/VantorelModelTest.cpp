@@ -179,10 +179,14 @@ TEST_F(VantorelModelTest, TheSourceStateFollowsTheBackendAndALostChannelAtOnce) 
 
     service.send(rrcRecord(3));
     ASSERT_TRUE(waitUntil([&] { return model->messagesDecoded() == 1; }, 2000));
+    spin(300);  // the record's refresh is over
+    const int beforeEnd = app.updates;
     info->set("State", "Finished");
     service.notify("BackendStateChanged", Value(info));
     ASSERT_TRUE(waitUntil([&] { return model->sourceStatus().phase == Phase::Finished; }, 2000));
     EXPECT_EQ(model->sourceStatus().forDecoder, 1u);
+    // The end of the stream refreshes the view by itself, with no new data.
+    EXPECT_TRUE(waitUntil([&] { return app.updates > beforeEnd; }, 2000));
 
     service.setBehaviour({.channelErrorCode = 5});  // the service will not take us back
     service.closeChannelPort();
