@@ -39,9 +39,11 @@ NodeRef tree(int cells, const std::string& before = "") {
 }  // namespace
 
 TEST(TerminalView, KeySequencesSplitAcrossReadsAndUnknownBytesDropped) {
-    std::string pending = "\x1b[A\x1b[B\r\x7f\x1b[5~\x1b[6~\x1b[H\x1bOF\x1b[C\x1b[Dzq\x1b[1;5";
-    const std::vector<Key> keys{Key::Up,  Key::Down, Key::Enter, Key::Back, Key::PageUp, Key::PageDown,
-                                Key::Home, Key::End, Key::Enter, Key::Back, Key::Quit};
+    // Home and End also as the console's 1~/4~ and rxvt's 7~/8~.
+    std::string pending = "\x1b[A\x1b[B\r\x7f\x1b[5~\x1b[6~\x1b[H\x1bOF\x1b[1~\x1b[4~\x1b[7~\x1b[8~\x1b[C\x1b[Dzq\x1b[1;5";
+    const std::vector<Key> keys{Key::Up,   Key::Down, Key::Enter, Key::Back, Key::PageUp, Key::PageDown, Key::Home,
+                                Key::End,  Key::Home, Key::End,   Key::Home, Key::End,    Key::Enter,    Key::Back,
+                                Key::Quit};
     EXPECT_EQ(TerminalKeys::take(pending), keys);
     EXPECT_EQ(pending, "\x1b[1;5");  // the rest of the sequence is still to come
     pending += "B";
