@@ -38,6 +38,15 @@ NodeRef tree(int cells, const std::string& before = "") {
 
 }  // namespace
 
+TEST(TerminalView, TextTakesTheColumnsATerminalGivesIt) {
+    // "×" one column; a combining mark (U+036F) and a zero-width space (U+200B) none;
+    // a fullwidth sign (U+FFE6) and a CJK ideograph two; a stray continuation byte one.
+    const std::pair<const char*, int> rows[] = {{"12 \u00d7 64", 7}, {"e\u036f", 1}, {"a\u200bb", 2},
+                                                {"\uffe6", 2}, {"\u4e2d\u6587", 4}, {"\x80x", 2}};
+    for (const auto& [text, columns] : rows) EXPECT_EQ(TerminalNavigator::columns(text), columns) << text;
+    EXPECT_EQ(TerminalNavigator::cut("\u4e2d\u6587abc", 4), "\u4e2d\u2026");
+}
+
 TEST(TerminalView, KeySequencesSplitAcrossReadsAndUnknownBytesDropped) {
     // Home and End also as the console's 1~/4~ and rxvt's 7~/8~.
     std::string pending = "\x1b[A\x1b[B\r\x7f\x1b[5~\x1b[6~\x1b[H\x1bOF\x1b[1~\x1b[4~\x1b[7~\x1b[8~\x1b[C\x1b[Dzq\x1b[1;5";

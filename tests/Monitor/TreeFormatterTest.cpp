@@ -1,6 +1,8 @@
 // Tests the display's text forms: JSON and plist carry the names and order the tree shows; display keeps the decoder's keys.
 #include "Monitor/TreeFormatter.h"
 
+#include "Model/VantorelModelNode.h"
+
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
 
@@ -28,4 +30,18 @@ TEST(TreeFormatter, JsonAndPlistUseTheShownNamesInTheShownOrder) {
     const std::string stored = TreeFormatter::format(*TreeFormatter::parse("display"), Value(display));
     EXPECT_NE(stored.find("\"0;Technology\": \"LTE\""), std::string::npos) << stored;
     EXPECT_NE(stored.find("\"_sorted\""), std::string::npos);
+}
+
+TEST(TreeFormatter, TheTerminalTreeShowsListsOfValuesAndOfNamedValuesOnOneLine) {
+    auto cell = Dictionary::create();
+    cell->set("ARFCN", Value("95"));
+    cell->set("BSIC", Value("12"));
+    auto display = Dictionary::create();
+    display->set("ARFCNs", Value(Array::of({"95", "98"})));
+    display->set("One", Value(Array::of({"7"})));
+    display->set("Cells", Value(Array::of({Value(cell)})));
+    display->set("Empty", Value(Array::create()));
+    PathDictionary paths;
+    EXPECT_EQ(TreeFormatter::compactTree(VantorelModelNode::makeTreeFromObject(Value(display), paths)),
+              "ARFCNs: 95 98\nOne: 7\nCells\n  0: ARFCN 95 | BSIC 12\nEmpty (empty)\n");
 }
