@@ -60,6 +60,7 @@ TEST(C2K1xDecoders, SubpacketSearchFindsTheFrameFlagOrSaysWhyNot) {
         {demod(false).u8(14, 3).u8(17, 5).u16(19, 8).u8(25, 7).u16(27, 4).u8(29, 11).u16(31, 20).u8(53, 1), "1.56%|"},
         {demod(true).u8(17, 5).u16(19, 8).u8(25, 11).u16(27, 20).u8(49, 1), "|" + missing},
         {demod(true).resize(16), "|3 Log code 0x119d is 16 bytes long but must be at least 17 bytes."},
+        {demod(true).resize(17), "|" + missing},  // 17 bytes pass the length rule; the subpacket is not there
     };
     for (const auto& [record, expected] : rows) {
         Screen screen;
