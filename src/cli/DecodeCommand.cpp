@@ -119,6 +119,13 @@ int DecodeCommand::run(const QStringList& args) {
     std::fprintf(stderr, "%llu messages read, %llu skipped (message id not 0), %llu bad frames\n",
                  static_cast<unsigned long long>(read), static_cast<unsigned long long>(skipped),
                  static_cast<unsigned long long>(badFrames));
+    // The IFX decoder shows only messages that are whole displays: a file of log records
+    // gives it none, which is said rather than printed as an empty screen.
+    if (!display) {
+        std::fprintf(stderr, "vantorel-cli decode: no display: the %s decoder could read none of these messages\n",
+                     TechnologyNames::displayName(decoderTechnology).c_str());
+        return 1;
+    }
     return failures ? 1 : 0;
 }
 

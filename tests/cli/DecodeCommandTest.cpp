@@ -91,6 +91,8 @@ TEST(VantorelCli, CommandsAreDispatchedInfoAccountsForEveryFrameAndBadUseIsAClea
         {{"decode", "--format", "yaml", "x"}, 2, "unknown --format 'yaml'"},
         {{"decode", "--technology", "wimax", "x"}, 2, "unknown technology 'wimax'"},
         {{"decode", "--technology", "utran", "/nonexistent/file.qmdl"}, 1, "/nonexistent/file.qmdl"},
+        {{"decode", "--technology", "ifx", VANTOREL_CAPTURES_DIR "/qmdl_example.qmdl"}, 1,
+         "no display: the GSM (IFX) decoder could read none of these messages"},
     };
     for (const auto& row : rows) {
         QProcess cli;
