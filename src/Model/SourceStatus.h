@@ -29,6 +29,9 @@ struct SourceStatus {
     std::vector<std::string> logTechnologies;   // identifiers the stream's log codes belong to
     // The stream has run long enough without a record this decoder reads.
     bool noRecordForDecoder = false;
+    // The backend's trouble as the service words it ("device /dev/ttyUSB0: the device went
+    // away ..."), while it lasts; empty when all is well.
+    std::string backendProblem;
 };
 
 }  // namespace vantorel

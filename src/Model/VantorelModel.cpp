@@ -6,6 +6,7 @@
 #include "Platform/LocalMessagePort.h"
 #include "Platform/RemoteMessagePort.h"
 #include "Platform/SystemLog.h"
+#include "Platform/TechnologyNames.h"
 #include "Platform/TelephonyServiceConnection.h"
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
@@ -141,7 +142,20 @@ void VantorelModel::readBackendState(const Value& info) {
     if (const ArrayRef list = codes ? codes->asArray() : ArrayRef())
         for (const Value& element : *list)
             if (element.asString()) status_.logTechnologies.push_back(*element.asString());
+    const Value* problem = d->find("Problem");
+    const bool failed = stateName && *stateName == "Failed";
+    status_.backendProblem = failed && problem && problem->asString() ? *problem->asString() : std::string();
     statusChanged_ = true;
+
+    // The modem moved to another technology (a live device): the decoder follows, on the
+    // same state, so the history goes on.
+    const Value* technology = d->find("Technology");
+    const std::string* identifier = technology ? technology->asString() : nullptr;
+    if (identifier && _logGenerator && *identifier != status_.decoderTechnology &&
+        TechnologyNames::shortName(*identifier) != *identifier) {
+        SystemLog::log(SystemLog::kNotice, "The modem is now on %s: restarting with its decoder", identifier->c_str());
+        QMetaObject::invokeMethod(this, [this] { restartMonitor(); }, Qt::QueuedConnection);
+    }
 }
 
 void VantorelModel::setSource(std::string description, bool isReplay, bool authoritative) {

@@ -21,8 +21,15 @@ void MonitorLauncher::addOptions(QCommandLineParser& parser) {
                           QString::fromStdString(EmulatorBackend::availableScenarios()) + "; default utran).",
                       "TECH"});
     parser.addOption({"replay", "Replay a recorded stream: QXDM DLF, QMDL/mi2log or a Vantorel capture.", "FILE"});
+    parser.addOption({"device",
+                      "Watch a modem live on its DIAG port: /dev/ttyUSB0, a character device such as\n"
+                      "/dev/wwan0qcdm0, or tcp:HOST:PORT (docs/devices.md).",
+                      "PATH"});
     parser.addOption({"service", "Watch a running vantorel-telephonyd listening on port NAME.", "NAME"});
-    parser.addOption({"technology", "Technology of a replayed file that does not carry one (" + techs + ").", "TECH"});
+    parser.addOption({"technology",
+                      "Technology of a replayed file that does not carry one, or of the --device modem\n"
+                      "(default: learnt from its serving-cell records) (" + techs + ").",
+                      "TECH"});
     parser.addOption({"speed", "Replay pace: 1 = as recorded, 2 = twice as fast, 0 = as fast as taken.", "X", "1"});
     parser.addOption({"loop", "Start the replay again at its end."});
 }
@@ -33,6 +40,7 @@ std::optional<MonitorLauncher::Source> MonitorLauncher::sourceFrom(const QComman
     s.emulate = parser.value("emulate").toStdString();
     s.replay = parser.value("replay").toStdString();
     s.service = parser.value("service").toStdString();
+    s.device = parser.value("device").toStdString();
     s.technology = parser.value("technology").toStdString();
     s.loop = parser.isSet("loop");
     bool ok = false;
@@ -41,15 +49,15 @@ std::optional<MonitorLauncher::Source> MonitorLauncher::sourceFrom(const QComman
         *error = "--speed takes a number of 0 or more (1 = as recorded, 0 = as fast as taken)";
         return std::nullopt;
     }
-    const int chosen = !s.emulate.empty() + !s.replay.empty() + !s.service.empty();
+    const int chosen = !s.emulate.empty() + !s.replay.empty() + !s.service.empty() + !s.device.empty();
     if (chosen > 1) {
-        *error = "choose one of --emulate, --replay and --service";
+        *error = "choose one of --emulate, --replay, --device and --service";
         return std::nullopt;
     }
     // Options that only shape a replay mean nothing without one: say so rather than ignore them.
     if (s.replay.empty()) {
         for (const char* option : {"technology", "speed", "loop"}) {
-            if (!parser.isSet(option)) continue;
+            if (!parser.isSet(option) || (!s.device.empty() && std::string(option) == "technology")) continue;
             *error = std::string("--") + option + " applies to a replay: add --replay FILE";
             return std::nullopt;
         }
@@ -86,6 +94,7 @@ bool MonitorLauncher::start(const Source& source, ApplicationObject* application
         options.portName = "vantorel.embedded." + std::to_string(getpid());
         options.emulate = source.emulate;
         options.replay = source.replay;
+        options.device = source.device;
         options.technology = source.technology;
         options.speed = source.speed;
         options.loop = source.loop;
@@ -93,8 +102,9 @@ bool MonitorLauncher::start(const Source& source, ApplicationObject* application
         if (!service_->start(error)) return false;
         serviceName = service_->portName();
         const auto emulated = TechnologyNames::identifierFor(source.emulate);
-        description_ = !source.replay.empty() ? "replay of " + source.replay
-                                              : "emulator (" + (emulated ? TechnologyNames::displayName(*emulated)
+        description_ = !source.replay.empty()   ? "replay of " + source.replay
+                       : !source.device.empty() ? "device " + source.device
+                                                : "emulator (" + (emulated ? TechnologyNames::displayName(*emulated)
                                                                          : source.emulate) + ")";
     } else {
         description_ = "service " + source.service;
@@ -105,6 +115,8 @@ bool MonitorLauncher::start(const Source& source, ApplicationObject* application
     // service names its own in its notifications.
     if (!source.replay.empty())
         model->setSource("replay " + QFileInfo(QString::fromStdString(source.replay)).fileName().toStdString(), true, true);
+    else if (!source.device.empty())
+        model->setSource("device " + source.device, false, true);
     else if (!source.emulate.empty())
         model->setSource("emulator " + TechnologyNames::displayName(TechnologyNames::identifierFor(source.emulate)
                                                                       .value_or(source.emulate)),

@@ -20,12 +20,13 @@ public:
         std::string emulate;     // --emulate TECH
         std::string replay;      // --replay FILE
         std::string service;     // --service NAME: a running vantorel-telephonyd
+        std::string device;      // --device PATH: a modem's DIAG port (tty, character device, tcp:HOST:PORT)
         std::string technology;  // --technology TECH (replays of files that carry none)
         double speed = 1.0;
         bool loop = false;
     };
 
-    // --emulate, --replay, --service, --technology, --speed, --loop.
+    // --emulate, --replay, --device, --service, --technology, --speed, --loop.
     static void addOptions(QCommandLineParser& parser);
     // The source the options name; with none of --emulate/--replay/--service, the
     // embedded default: the emulator's UTRAN scenario. Empty with *error on bad use:
@@ -41,7 +42,7 @@ public:
     // loop. False with *error when the service cannot start.
     bool start(const Source& source, ApplicationObject* application, std::string* error);
     VantorelModel* model() const { return model_.get(); }
-    // "emulator (UTRAN (TD-SCDMA))", "replay of FILE", "service NAME".
+    // "emulator (UTRAN (TD-SCDMA))", "replay of FILE", "device PATH", "service NAME".
     std::string description() const { return description_; }
 
 private:

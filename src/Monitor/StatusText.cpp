@@ -59,6 +59,8 @@ std::string StatusText::line(const SourceStatus& status) {
     case SourceStatus::Phase::Streaming:
         break;
     }
+    // A modem that went away: the values shown are its last ones.
+    if (!status.backendProblem.empty()) return status.backendProblem + source;
     if (status.noRecordForDecoder) return noRecordText(status) + source;
     std::string text = status.updatedAt.isValid() ? updated(status.updatedAt) : std::string("Streaming");
     text += source;

@@ -48,6 +48,9 @@ public:
 
 
     bool forwards(ByteView message) const;
+    // Every message (no code lists), or exactly the ordinary codes listed.
+    bool forwardsAll() const { return all_; }
+    const std::set<uint16_t>& ordinaryCodes() const { return ordinary_; }
     // "all codes" or "<n> log codes, <m> extra codes", for status lines.
     std::string description() const;
 

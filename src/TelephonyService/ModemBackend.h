@@ -7,6 +7,7 @@
 
 #include <cstdint>
 #include <optional>
+#include <set>
 #include <string>
 
 namespace vantorel {
@@ -45,6 +46,15 @@ public:
     // Stops streaming; the state becomes Idle.
     virtual void stop() = 0;
 
+    // The ordinary log codes the streaming channels want (all: at least one wants every
+    // code); a backend that talks to a real modem sets the modem's log mask from it.
+    virtual void setLogCodes(const std::optional<std::set<uint16_t>>& codes) { (void)codes; }
+    // True for a backend that must run from the service's start (a modem whose technology
+    // is learnt from its stream before any client asks).
+    virtual bool startsWithService() const { return false; }
+    // What went wrong last, for people ("no DIAG reply from ..."); empty when all is well.
+    virtual std::string problem() const { return {}; }
+
     void setPaused(bool paused);
     bool isPaused() const { return paused_; }
 
@@ -59,6 +69,10 @@ public:
 signals:
     void messageReady(int32_t messageId, const vantorel::Bytes& data);
     void stateChanged(vantorel::ModemBackend::State state);
+    // technology() now answers differently (a modem that moved to another radio technology).
+    void technologyChanged();
+    // A line for the service's status output ("device ...: 12 log codes enabled").
+    void statusLine(const std::string& line);
 
 protected:
     void setState(State state);

@@ -10,6 +10,7 @@
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
 #include "PropertyList/PropertyListSerialization.h"
+#include "TelephonyService/Device/DeviceBackend.h"
 #include "TelephonyService/EmulatorBackend.h"
 #include "TelephonyService/ReplayBackend.h"
 #include "TelephonyService/Replay/CaptureWriter.h"
@@ -68,8 +69,23 @@ std::unique_ptr<ModemBackend> TelephonyService::createBackend(const TelephonySer
         if (!backend) return fail("the backend could not be made");
         return backend;
     }
-    if (options.emulate.empty() == options.replay.empty())
-        return fail("give exactly one of --emulate TECH and --replay FILE");
+    const int sources = !options.emulate.empty() + !options.replay.empty() + !options.device.empty();
+    if (sources != 1) return fail("give exactly one of --emulate TECH, --replay FILE and --device PATH");
+    if (!options.recordQmdl.empty() && options.device.empty()) return fail("--record-qmdl applies to --device only");
+    if (!options.device.empty()) {
+        std::string technology;
+        if (!options.technology.empty()) {
+            const std::optional<std::string> identifier = ModemBackend::technologyIdentifier(options.technology, error);
+            if (!identifier) return nullptr;
+            if (*identifier == TechnologyNames::identifierFor("ifx"))
+                return fail("the IFX modem has no DIAG port: --device reads LTE, GSM/UMTS, CDMA and UTRAN modems");
+            technology = *identifier;
+        }
+        auto device = std::make_unique<DeviceBackend>(options.device, technology);
+        if (!options.recordQmdl.empty() && !device->recordQmdl(options.recordQmdl, options.replaceRecording, error))
+            return nullptr;
+        return device;
+    }
     if (!options.emulate.empty()) {
         std::unique_ptr<EmulatorScenario> scenario = EmulatorBackend::scenarioFor(options.emulate, error, options.seed);
         if (!scenario) return nullptr;
@@ -149,9 +165,24 @@ bool TelephonyService::start(std::string* error) {
 
     connect(backend_.get(), &ModemBackend::messageReady, this, &TelephonyService::sendMessage);
     connect(backend_.get(), &ModemBackend::stateChanged, this, &TelephonyService::backendStateChanged);
+    connect(backend_.get(), &ModemBackend::statusLine, this, &TelephonyService::statusLine);
+    connect(backend_.get(), &ModemBackend::technologyChanged, this, [this] { notifyBackendState(); });
     healthTimer_.start(kHealthIntervalMs);
-    // A recording starts with the modem, not with the first client.
-    if (recorder_) backend_->start();
+    // A recording starts with the modem, not with the first client; so does a modem whose
+    // technology is learnt from its stream.
+    if (recorder_ || backend_->startsWithService()) {
+        backend_->setLogCodes(std::set<uint16_t>{});
+        starting_ = true;
+        backend_->start();
+        starting_ = false;
+        // A device that cannot even be opened is a mistake on the command line, said at once.
+        if (backend_->state() == ModemBackend::State::Failed && !backend_->problem().empty()) {
+            if (error) *error = backend_->problem();
+            stop();
+            backend_.reset();
+            return false;
+        }
+    }
     return true;
 }
 
@@ -215,6 +246,18 @@ void TelephonyService::statusLine(const std::string& line) {
 
 // ---- the well-known port ----
 
+void TelephonyService::updateLogCodes() {
+    if (!backend_) return;
+    std::set<uint16_t> codes;
+    for (const auto& entry : channels_) {
+        const Channel& channel = *entry.second;
+        if (!channel.streaming || channel.closing) continue;
+        if (channel.mask.forwardsAll()) return backend_->setLogCodes(std::nullopt);
+        codes.insert(channel.mask.ordinaryCodes().begin(), channel.mask.ordinaryCodes().end());
+    }
+    backend_->setLogCodes(codes);
+}
+
 std::optional<Bytes> TelephonyService::receiveOnServicePort(int32_t messageId, const Bytes& data) {
     auto malformed = [&](const char* why) {
         ++counters_.malformedRequests;
@@ -233,7 +276,8 @@ std::optional<Bytes> TelephonyService::receiveOnServicePort(int32_t messageId, c
 }
 
 Bytes TelephonyService::createLogChannel(const std::string& clientPortName) {
-    if (!backend_ || backend_->state() == ModemBackend::State::Failed) {
+    // A device that went away is tried again by its backend: clients may wait for it.
+    if (!backend_ || (backend_->state() == ModemBackend::State::Failed && !backend_->startsWithService())) {
         SystemLog::log(SystemLog::kError, "Telephony service: no log channel for %s: the backend failed",
                        clientPortName.c_str());
         return channelReply(kBackendFailed, "");
@@ -317,6 +361,7 @@ std::optional<Bytes> TelephonyService::receiveOnChannel(uint64_t number, int32_t
         } else if (channel.streaming) {
             channel.streaming = false;
             statusLine(StringFormat::format("channel %llu stopped streaming", static_cast<unsigned long long>(number)));
+            updateLogCodes();
             updateFlow();
         }
         return std::nullopt;
@@ -334,6 +379,7 @@ void TelephonyService::startStreaming(Channel& channel, const Dictionary& comman
     for (const auto& entry : channels_)
         if (entry.second.get() != &channel && entry.second->streaming && !entry.second->closing) othersStreaming = true;
     channel.streaming = true;
+    updateLogCodes();
     statusLine(StringFormat::format("channel %llu streaming (%s)", static_cast<unsigned long long>(channel.number),
                                     channel.mask.description().c_str()));
     const ModemBackend::State state = backend_->state();
@@ -369,7 +415,10 @@ void TelephonyService::closeChannel(uint64_t number, const std::string& why) {
                                     static_cast<unsigned long long>(channel->dropped), channels_.size()));
     if (stopping_) return;
     // Nobody listens any more: the modem's logging is switched off (docs/protocol.md).
-    if (channels_.empty() && !recorder_ && backend_ && backend_->state() == ModemBackend::State::Streaming) {
+    updateLogCodes();
+    if (channels_.empty() && !recorder_ && backend_ &&
+        (backend_->state() == ModemBackend::State::Streaming ||
+         (backend_->state() == ModemBackend::State::Failed && backend_->startsWithService()))) {
         backend_->stop();
         statusLine("no client left: backend stopped");
     }
@@ -483,6 +532,7 @@ void TelephonyService::notifyBackendState() {
     auto technologies = Array::create();
     for (const std::string& identifier : logTechnologies_) technologies->append(Value(identifier));
     info->set("LogTechnologies", Value(technologies));
+    if (const std::string problem = backend_->problem(); !problem.empty()) info->set("Problem", Value(problem));
     auto notification = Dictionary::create();
     notification->set("Name", Value("BackendStateChanged"));
     notification->set("Info", Value(info));
@@ -507,8 +557,8 @@ void TelephonyService::backendStateChanged(ModemBackend::State state) {
             static_cast<unsigned long long>(counters_.messagesDropped),
             report ? report->badCrc + report->malformed + report->truncated : 0,
             static_cast<unsigned long long>(portCountsNow().malformed)));
-    } else if (state == ModemBackend::State::Failed) {
-        statusLine("backend failed");
+    } else if (state == ModemBackend::State::Failed && !starting_) {
+        statusLine(backend_->problem().empty() ? "backend failed" : "backend failed: " + backend_->problem());
     }
 }
 

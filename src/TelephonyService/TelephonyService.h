@@ -30,6 +30,8 @@ struct TelephonyServiceOptions {
     std::string portName;    // the well-known port; empty: TelephonyServiceConnection::defaultServiceName()
     std::string emulate;     // --emulate TECH (exactly one of emulate / replay)
     std::string replay;      // --replay FILE
+    std::string device;      // --device PATH or tcp:HOST:PORT: a modem's DIAG port
+    std::string recordQmdl;  // --record-qmdl FILE: the device's raw DIAG stream (device only)
     std::string technology;  // --technology TECH, for files that do not carry one
     double speed = 1.0;      // --speed X (replay)
     bool loop = false;       // --loop (replay)
@@ -170,6 +172,8 @@ private:
     // True when the port named is one this service listens on (the same socket file).
     bool servesPort(const RemoteMessagePort& port) const;
     void backendStateChanged(ModemBackend::State state);
+    // Tells the backend the ordinary codes the streaming channels want.
+    void updateLogCodes();
     void notifyBackendState();
     void updateFlow();
     void checkHealth();
@@ -188,6 +192,7 @@ private:
     PortCounts closedPorts_;  // of the ports closed already
     PortCounts reported_;
     bool stopping_ = false;
+    bool starting_ = false;  // the backend's first start, whose failure start() reports itself
     std::vector<std::string> logTechnologies_;  // of the ordinary log codes seen this run, first-seen order
     uint64_t notifiedSent_ = 0;                 // "Sent" of the last notification
     QElapsedTimer notified_;                    // since the last notification

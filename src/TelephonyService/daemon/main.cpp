@@ -1,4 +1,4 @@
-// vantorel-telephonyd: the telephony service as a program of its own, on the modem emulator or a recorded stream (docs/protocol.md).
+// vantorel-telephonyd: the telephony service as a program of its own, on the modem emulator, a recorded stream or a real modem (docs/protocol.md).
 #include "Platform/QuitOnSignal.h"
 #include "Platform/SystemLog.h"
 #include "Platform/TechnologyNames.h"
@@ -32,7 +32,7 @@ int main(int argc, char** argv) {
     QCommandLineParser parser;
     parser.setApplicationDescription(QStringLiteral(
         "Vantorel's telephony service: answers GetTechnology, applies each log channel's log mask and streams "
-        "the modem's records, from the modem emulator or a recorded stream."));
+        "the modem's records, from the modem emulator, a recorded stream or a real modem's DIAG port."));
     parser.addHelpOption();
     const QCommandLineOption emulate(QStringLiteral("emulate"),
                                      QStringLiteral("Run the modem emulator for TECH (scenarios: %1).")
@@ -41,6 +41,17 @@ int main(int argc, char** argv) {
     const QCommandLineOption replay(QStringLiteral("replay"),
                                     QStringLiteral("Replay FILE: a capture, a QXDM DLF or a QMDL / mi2log file."),
                                     QStringLiteral("FILE"));
+    const QCommandLineOption device(
+        QStringLiteral("device"),
+        QStringLiteral("Read a modem's DIAG port live: a serial port (/dev/ttyUSB0), a character device "
+                       "(/dev/wwan0qcdm0) or tcp:HOST:PORT (a phone-side bridge). The log mask follows the clients; "
+                       "logging is switched off again when the last client leaves and at exit (docs/devices.md)."),
+        QStringLiteral("PATH"));
+    const QCommandLineOption recordQmdl(
+        QStringLiteral("record-qmdl"),
+        QStringLiteral("With --device: also write the raw DIAG stream to FILE as a QMDL file (readable by SCAT, "
+                       "MobileInsight, QCSuper). An existing FILE is refused unless --force is given."),
+        QStringLiteral("FILE"));
     const QCommandLineOption speed(QStringLiteral("speed"),
                                    QStringLiteral("Replay pace: 1 as recorded, 2 twice as fast, 0 as fast as the "
                                                   "client takes it (default 1). Recorded pauses over 10 s are cut to 10 s."),
@@ -48,7 +59,8 @@ int main(int argc, char** argv) {
     const QCommandLineOption loop(QStringLiteral("loop"), QStringLiteral("Start the replay over at its end."));
     const QCommandLineOption technology(
         QStringLiteral("technology"),
-        QStringLiteral("The technology of a replayed file that does not carry one (QMDL, DLF): %1.").arg(names),
+        QStringLiteral("The technology of a replayed file that does not carry one (QMDL, DLF), or of the --device "
+                       "modem (default: learnt from its serving-cell records): %1.").arg(names),
         QStringLiteral("TECH"));
     const QCommandLineOption record(
         QStringLiteral("record"),
@@ -62,26 +74,35 @@ int main(int argc, char** argv) {
                                       .arg(QString::fromStdString(TelephonyServiceConnection::defaultServiceName())),
                                   QStringLiteral("NAME"));
     const QCommandLineOption verbose(QStringLiteral("verbose"), QStringLiteral("Mirror the system log to stderr."));
-    parser.addOptions({emulate, replay, speed, loop, technology, record, force, port, verbose});
+    parser.addOptions({emulate, replay, device, speed, loop, technology, record, recordQmdl, force, port, verbose});
     parser.process(app);  // --help and unknown options end here
 
     if (!parser.positionalArguments().isEmpty())
         return fail("unexpected argument " + parser.positionalArguments().first().toStdString() + " (see --help)");
-    if (parser.isSet(emulate) == parser.isSet(replay)) return fail("give exactly one of --emulate TECH and --replay FILE");
+    if (parser.isSet(emulate) + parser.isSet(replay) + parser.isSet(device) != 1)
+        return fail("give exactly one of --emulate TECH, --replay FILE and --device PATH");
     if (parser.isSet(emulate) && (parser.isSet(speed) || parser.isSet(loop) || parser.isSet(technology)))
-        return fail("--speed, --loop and --technology apply to --replay only");
-    if (parser.isSet(force) && !parser.isSet(record)) return fail("--force applies to --record only");
+        return fail("--speed, --loop and --technology apply to --replay (and --technology to --device) only");
+    if (parser.isSet(device) && (parser.isSet(speed) || parser.isSet(loop)))
+        return fail("--speed and --loop apply to --replay only: a modem runs at its own pace");
+    if (parser.isSet(recordQmdl) && !parser.isSet(device)) return fail("--record-qmdl applies to --device only");
+    if (parser.isSet(force) && !parser.isSet(record) && !parser.isSet(recordQmdl))
+        return fail("--force applies to --record and --record-qmdl only");
     // Checked before anything starts; the writer's exclusive create still guards a file that appears meanwhile.
-    const QFileInfo recordFile(parser.value(record));
-    if (parser.isSet(record) && !parser.isSet(force) && (recordFile.exists() || recordFile.isSymLink())) {
-        std::fprintf(stderr, "vantorel-telephonyd: %s exists already; it is left as it is (--force replaces it)\n",
-                     parser.value(record).toLocal8Bit().constData());
-        return 2;
+    for (const QCommandLineOption* option : {&record, &recordQmdl}) {
+        const QFileInfo file(parser.value(*option));
+        if (parser.isSet(*option) && !parser.isSet(force) && (file.exists() || file.isSymLink())) {
+            std::fprintf(stderr, "vantorel-telephonyd: %s exists already; it is left as it is (--force replaces it)\n",
+                         parser.value(*option).toLocal8Bit().constData());
+            return 2;
+        }
     }
 
     TelephonyServiceOptions options;
     options.emulate = parser.value(emulate).toStdString();
     options.replay = parser.value(replay).toStdString();
+    options.device = parser.value(device).toStdString();
+    options.recordQmdl = parser.value(recordQmdl).toStdString();
     options.technology = parser.value(technology).toStdString();
     options.loop = parser.isSet(loop);
     options.record = parser.value(record).toStdString();

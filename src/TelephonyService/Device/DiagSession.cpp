@@ -1,0 +1,272 @@
+// DiagSession: request queue with retransmission, the open and clearing sequences, and the modem's unsolicited traffic.
+#include "TelephonyService/Device/DiagSession.h"
+
+#include "Platform/StringFormat.h"
+#include "Platform/SystemLog.h"
+#include "TelephonyService/Device/DiagPort.h"
+#include "TelephonyService/Replay/DiagPacket.h"
+
+#include <QEventLoop>
+
+namespace vantorel {
+
+DiagSession::DiagSession(DiagPort* port, QObject* parent)
+    : QObject(parent),
+      port_(port),
+      deframer_([this](ByteView body, uint64_t) { onFrame(body); },
+                [this](HdlcDeframer::Problem problem, uint64_t, const std::string& why) {
+                    // The bytes before the first good frame may be the end of a frame sent
+                    // before we listened: dropped without counting.
+                    if (!sawGoodFrame_) return;
+                    if (problem == HdlcDeframer::Problem::BadCrc)
+                        ++counters_.badCrc;
+                    else
+                        ++counters_.malformed;
+                    if (counters_.badCrc + counters_.malformed == 1)
+                        SystemLog::log(SystemLog::kWarning, "Device %s: dropped a bad frame (%s); later ones are counted",
+                                       portName().c_str(), why.c_str());
+                }) {
+    replyTimer_.setSingleShot(true);
+    connect(&replyTimer_, &QTimer::timeout, this, &DiagSession::timedOut);
+    connect(port_, &DiagPort::received, this, &DiagSession::onBytes);
+}
+
+DiagSession::~DiagSession() = default;
+
+std::string DiagSession::portName() const { return port_->name(); }
+
+void DiagSession::send(Bytes body, std::function<void(const Reply&)> done) {
+    queue_.push_back({std::move(body), std::move(done), 0});
+    if (queue_.size() == 1) transmit();
+}
+
+void DiagSession::transmit() {
+    if (queue_.empty()) return;
+    Request& request = queue_.front();
+    if (request.attempts++ > 0) ++counters_.retransmits;
+    port_->write(DiagCommand::frame(request.body));
+    replyTimer_.start(kReplyTimeoutMs);
+}
+
+void DiagSession::timedOut() {
+    if (queue_.empty()) return;
+    if (queue_.front().attempts < kAttempts) {
+        transmit();
+        return;
+    }
+    Request request = std::move(queue_.front());
+    queue_.pop_front();
+    if (request.done) request.done(std::nullopt);
+    transmit();
+}
+
+void DiagSession::onBytes(const Bytes& bytes) { deframer_.feed(bytes); }
+
+void DiagSession::onFrame(ByteView body) {
+    sawGoodFrame_ = true;
+    if (!queue_.empty() && DiagCommand::answers(body, queue_.front().body)) {
+        replyTimer_.stop();
+        Request request = std::move(queue_.front());
+        queue_.pop_front();
+        if (request.done) request.done(Bytes(body.begin(), body.end()));
+        transmit();
+        return;
+    }
+    const DiagPacket packet(body);
+    if (packet.kind() == DiagPacket::Kind::Malformed) {
+        ++counters_.malformed;
+        return;
+    }
+    if (!packet.isLogPacket()) {
+        ++counters_.notLog;
+        return;
+    }
+    if (!ready_ || (!all_ && !enabled_.count(packet.logCode()))) {
+        ++counters_.unsubscribed;
+        return;
+    }
+    ++counters_.logPackets;
+    emit record(packet.morvekRecord(), packet.logCode(), packet.subscriptionId());
+}
+
+void DiagSession::fail(const std::string& why) {
+    opening_ = false;
+    ready_ = false;
+    replyTimer_.stop();
+    queue_.clear();
+    emit failed(why);
+}
+
+void DiagSession::open(std::optional<std::set<uint16_t>> codes) {
+    wanted_ = std::move(codes);
+    queue_.clear();
+    replyTimer_.stop();
+    opening_ = true;
+    ready_ = false;
+    sawGoodFrame_ = false;
+    enabled_.clear();
+    all_ = false;
+    equipmentsOn_.clear();
+    applied_.clear();
+    refusals_.clear();
+    counts_.reset();
+    buildId_.clear();
+    port_->discardPending();
+    deframer_.finish();  // a frame cut by the discard is not carried into the new stream
+
+    const std::string name = portName();
+    // A modem that ignores the very first request is not a DIAG port at all.
+    send(DiagCommand::eventReportsOff(), [this, name](const Reply& reply) {
+        if (!reply)
+            fail(StringFormat::format("no DIAG reply from %s within %d s: is this the diagnostic interface?",
+                                      name.c_str(), kReplyTimeoutMs * kAttempts / 1000));
+    });
+    auto required = [this](const Bytes& request) {
+        return [this, request](const Reply& reply) {
+            if (!reply && opening_) fail("no reply to " + DiagCommand::describe(request) + " from " + portName());
+        };
+    };
+    const Bytes disable = DiagCommand::logConfig(DiagLogConfigOp::kDisable);
+    send(disable, required(disable));
+    send(DiagCommand::messageLevelsOff(), required(DiagCommand::messageLevelsOff()));
+    send(DiagCommand::version(), [this](const Reply& reply) {
+        if (!opening_) return;
+        if (!reply) return fail("no reply to the version request from " + portName());
+        const std::string error = DiagCommand::errorName(*reply);
+        if (!error.empty())
+            fail(StringFormat::format("%s answered the version request with \"%s\": not a DIAG port?",
+                                      portName().c_str(), error.c_str()));
+    });
+    send(DiagCommand::buildId(), [this](const Reply& reply) {
+        // Some modems answer 7C with an error: the build ID is only shown.
+        if (reply && DiagCommand::errorName(*reply).empty() && reply->size() > 4)
+            for (auto it = reply->begin() + 4; it != reply->end() && *it != 0; ++it)
+                if (*it >= 0x20 && *it < 0x7F) buildId_.push_back(static_cast<char>(*it));
+    });
+    send(DiagCommand::logConfig(DiagLogConfigOp::kRetrieveRanges), [this](const Reply& reply) {
+        if (!opening_) return;
+        const std::string error = reply ? DiagCommand::errorName(*reply) : std::string();
+        if (reply && error.empty()) counts_ = DiagCommand::itemCounts(*reply);
+        if (!counts_)
+            return fail(StringFormat::format("%s did not say how many log items it has (%s)", portName().c_str(),
+                                             !reply ? "no reply" : !error.empty() ? error.c_str() : "a bad reply"));
+        applyCodes();
+        // Ready once the last set-mask has its reply (sent after those applyCodes queued).
+        send(DiagCommand::version(), [this](const Reply&) {
+            if (!opening_) return;
+            opening_ = false;
+            ready_ = true;
+            emit ready();
+        });
+    });
+}
+
+void DiagSession::setCodes(std::optional<std::set<uint16_t>> codes) {
+    wanted_ = std::move(codes);
+    if (ready_) applyCodes();
+}
+
+void DiagSession::applyCodes() {
+    if (!counts_) return;
+    const DiagCommand::ItemCounts counts = *counts_;
+    std::map<uint32_t, Bytes> requests;
+    std::map<uint32_t, std::set<uint16_t>> codesOf;
+    std::vector<Refusal> refused;
+    if (!wanted_) {
+        for (uint32_t equipment = 0; equipment < DiagCommand::kEquipmentCount; ++equipment) {
+            if (counts[equipment] == 0) continue;
+            std::set<uint32_t> items;
+            for (uint32_t item = 0; item < counts[equipment] && item < 0x1000; ++item) items.insert(item);
+            requests[equipment] = DiagCommand::setMask(equipment, counts[equipment], items);
+        }
+    } else {
+        const DiagCommand::MaskPlan plan = DiagCommand::planMasks(*wanted_, counts);
+        requests = plan.requests;
+        for (uint16_t code : *wanted_) {
+            const DiagLogItem item = DiagLogItem::of(code);
+            if (plan.requests.count(item.equipment) && item.item < counts[item.equipment]) codesOf[item.equipment].insert(code);
+        }
+        for (uint16_t code : plan.skipped) {
+            const DiagLogItem item = DiagLogItem::of(code);
+            refused.push_back({code, StringFormat::format("item 0x%03X is beyond the modem's %u items of equipment 0x%X",
+                                                          item.item, counts[item.equipment], item.equipment)});
+            SystemLog::log(SystemLog::kWarning, "Device %s: log code 0x%04X skipped: %s", portName().c_str(), code,
+                           refused.back().why.c_str());
+        }
+    }
+    // An equipment enabled before and wanted no more gets an empty mask.
+    for (uint32_t equipment : equipmentsOn_)
+        if (!requests.count(equipment)) requests[equipment] = DiagCommand::setMask(equipment, counts[equipment], {});
+
+    // Refusals of codes still wanted are kept; the new plan's are added.
+    std::erase_if(refusals_, [&](const Refusal& r) { return !wanted_ || !wanted_->count(r.code); });
+    for (const Refusal& r : refused)
+        if (std::none_of(refusals_.begin(), refusals_.end(), [&](const Refusal& k) { return k.code == r.code; }))
+            refusals_.push_back(r);
+
+    const bool all = !wanted_;
+    for (auto& [equipment, request] : requests) {
+        // The modem has this mask already.
+        if (const auto it = applied_.find(equipment); it != applied_.end() && it->second == request) continue;
+        const std::set<uint16_t> codes = codesOf[equipment];
+        send(request, [this, equipment, codes, all, request](const Reply& reply) {
+            std::string why;
+            if (!reply)
+                why = "no reply";
+            else if (!DiagCommand::errorName(*reply).empty())
+                why = DiagCommand::errorName(*reply);
+            else if (const auto status = DiagCommand::logConfigStatus(*reply); status != 0u)
+                why = status ? StringFormat::format("status %u", *status) : std::string("a short reply");
+            std::erase_if(enabled_, [&](uint16_t c) { return DiagLogItem::of(c).equipment == equipment; });
+            applied_.erase(equipment);
+            if (why.empty()) {
+                applied_[equipment] = request;
+                if (codes.empty() && !all)
+                    equipmentsOn_.erase(equipment);
+                else
+                    equipmentsOn_.insert(equipment);
+                enabled_.insert(codes.begin(), codes.end());
+                if (all) all_ = true;
+                return;
+            }
+            SystemLog::log(SystemLog::kWarning, "Device %s: the modem refused the log mask of equipment 0x%X (%s)",
+                           portName().c_str(), equipment, why.c_str());
+            for (uint16_t code : codes)
+                if (std::none_of(refusals_.begin(), refusals_.end(), [&](const Refusal& k) { return k.code == code; }))
+                    refusals_.push_back({code, why});
+        });
+    }
+    if (!all) all_ = false;
+}
+
+bool DiagSession::clear(int timeoutMs) {
+    opening_ = false;
+    ready_ = false;
+    queue_.clear();
+    replyTimer_.stop();
+    enabled_.clear();
+    all_ = false;
+    equipmentsOn_.clear();
+    applied_.clear();
+    int answered = 0;
+    QEventLoop loop;
+    QTimer deadline;
+    deadline.setSingleShot(true);
+    connect(&deadline, &QTimer::timeout, &loop, &QEventLoop::quit);
+    const std::vector<Bytes> sequence = DiagCommand::clearingSequence();
+    for (size_t i = 0; i < sequence.size(); ++i) {
+        const bool last = i + 1 == sequence.size();
+        send(sequence[i], [&answered, &loop, last](const Reply& reply) {
+            if (reply) ++answered;
+            if (last) loop.quit();
+        });
+    }
+    deadline.start(timeoutMs);
+    connect(port_, &DiagPort::closed, &loop, &QEventLoop::quit);
+    loop.exec();
+    queue_.clear();
+    replyTimer_.stop();
+    return answered == static_cast<int>(sequence.size());
+}
+
+}  // namespace vantorel
