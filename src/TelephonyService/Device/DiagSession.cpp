@@ -57,7 +57,12 @@ void DiagSession::timedOut() {
     Request request = std::move(queue_.front());
     queue_.pop_front();
     if (request.done) request.done(std::nullopt);
-    transmit();
+    sendNext();
+}
+
+void DiagSession::sendNext() {
+    // The callback that just ran may have queued (and so sent) a request itself.
+    if (!queue_.empty() && queue_.front().attempts == 0) transmit();
 }
 
 void DiagSession::onBytes(const Bytes& bytes) { deframer_.feed(bytes); }
@@ -69,7 +74,7 @@ void DiagSession::onFrame(ByteView body) {
         Request request = std::move(queue_.front());
         queue_.pop_front();
         if (request.done) request.done(Bytes(body.begin(), body.end()));
-        transmit();
+        sendNext();
         return;
     }
     const DiagPacket packet(body);

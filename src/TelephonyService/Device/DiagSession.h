@@ -91,6 +91,7 @@ private:
 
     void send(Bytes body, std::function<void(const Reply&)> done);
     void transmit();
+    void sendNext();
     void timedOut();
     void onBytes(const Bytes& bytes);
     void onFrame(ByteView body);
