@@ -14,6 +14,7 @@
 #include <grp.h>
 #include <sys/ioctl.h>
 #include <sys/stat.h>
+#include <sys/sysmacros.h>
 #include <termios.h>
 #include <unistd.h>
 
@@ -22,6 +23,9 @@ namespace vantorel {
 namespace {
 
 constexpr size_t kReadChunk = 16384;
+// Device numbers of Unix98 pseudo-terminal slaves (/dev/pts/N).
+constexpr unsigned kPtySlaveMajorFirst = 136;
+constexpr unsigned kPtySlaveMajorLast = 143;
 
 std::string openError(const std::string& path, int err) {
     switch (err) {
@@ -117,7 +121,10 @@ std::unique_ptr<DiagPort> SerialDiagPort::open(const std::string& path, std::str
         ::ioctl(fd, TIOCMBIS, &lines);
         ::ioctl(fd, TIOCEXCL);
     }
-    const std::vector<Holder> others = holders(path);
+    // A pseudo-terminal is a modem in software (or a bridge) whose other end holds it by
+    // design; only real devices are checked for other programs.
+    const bool pseudoTerminal = ::major(st.st_rdev) >= kPtySlaveMajorFirst && ::major(st.st_rdev) <= kPtySlaveMajorLast;
+    const std::vector<Holder> others = pseudoTerminal ? std::vector<Holder>{} : holders(path);
     if (!others.empty()) {
         ::close(fd);
         std::string names;
