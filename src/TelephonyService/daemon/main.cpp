@@ -49,8 +49,8 @@ int main(int argc, char** argv) {
         QStringLiteral("PATH"));
     const QCommandLineOption recordQmdl(
         QStringLiteral("record-qmdl"),
-        QStringLiteral("With --device: also write the raw DIAG stream to FILE as a QMDL file (readable by SCAT, "
-                       "MobileInsight, QCSuper). An existing FILE is refused unless --force is given."),
+        QStringLiteral("With --device: also write the raw DIAG stream to FILE as a QMDL file (readable by SCAT and "
+                       "MobileInsight). An existing FILE is refused unless --force is given."),
         QStringLiteral("FILE"));
     const QCommandLineOption speed(QStringLiteral("speed"),
                                    QStringLiteral("Replay pace: 1 as recorded, 2 twice as fast, 0 as fast as the "
