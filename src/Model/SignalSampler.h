@@ -15,7 +15,8 @@ namespace vantorel {
 // its display string; a missing leaf or a text without a number is a gap), and compares the
 // technology and the serving cell's identity with the previous tick: a change of technology
 // adds a TechnologyChange mark, a changed identity (the identity leaves of
-// identityKeys(technology), all read as text, none missing) a Handover mark.
+// identityKeys(technology), all read as text, none missing) a Handover mark. A leaf that
+// shows nothing yet ("-") is text like any other; an identity showing nothing is none.
 class SignalSampler {
 public:
     // The values that matter per technology (identifier as "GetTechnology" answers):
@@ -41,7 +42,12 @@ public:
     const std::vector<std::optional<double>>& lastRow() const { return lastRow_; }
 
 private:
-    ...
+    std::vector<std::string> keys_;
+    bool keysChosen_ = false;  // setKeys/addKey: the defaults no longer apply
+    SignalSeries series_;
+    std::vector<std::optional<double>> lastRow_;
+    std::string technology_;
+    std::vector<std::string> identity_;  // empty until a tick showed all identity leaves
 };
 
 }  // namespace vantorel

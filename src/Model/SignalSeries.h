@@ -45,7 +45,17 @@ public:
     size_t pointCount() const;  // over all keys
 
 private:
-    ...
+    struct Track {
+        std::deque<Point> points;
+        bool lastHadValue = false;
+    };
+    template <typename T>
+    static void thinOlderHalf(std::deque<T>& items);
+
+    std::vector<std::string> order_;
+    std::map<std::string, Track> tracks_;
+    std::deque<Mark> marks_;
+    size_t pointCount_ = 0;
 };
 
 }  // namespace vantorel
