@@ -62,7 +62,7 @@ TEST(SignalCsvWriter, RowsHoldCNumbersGapsAndQuotedNames) {
 TEST(Sparkline, BarsSpanTheRangeShownWithGapsAsSpaces) {
     const std::pair<std::deque<std::optional<double>>, const char*> rows[] = {
         {{-120, -110, std::nullopt, -100}, "▁▅ █"}, {{5, 5}, "▄▄"}, {{}, ""}, {{std::nullopt}, " "},
-        {{0, 1, 2, 3, 4, 5, 6, 7}, "▁▂▃▄▅▆▇█"},
+        {{0, 1, 2, 3, 4, 5, 6, 7}, "▁▂▃▄▅▆▇█"}, {{-1e308, 1e308}, "▁█"},
     };
     for (const auto& [values, bars] : rows) EXPECT_EQ(Sparkline::bars(values), bars);
 }
