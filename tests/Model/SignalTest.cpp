@@ -22,13 +22,13 @@ namespace {
 
 TEST(SignalValue, TakesTheLeadingNumberWhateverTheLocale) {
     const struct {
-        const char* display;
+        std::string display;
         std::optional<double> value;
     } rows[] = {
         {"-95.50 dBm", -95.5}, {"  +3 dB", 3},       {"0.179688", 0.179688}, {"12 (old)", 12}, {"17", 17},
         {"1.5.6", 1.5},        {"2,5 dB", 2},        {"-0.25%", -0.25},      {"5.dB", 5},      {"Not Present", {}},
         {"Unknown", {}},       {"-", {}},            {"", {}},               {"0x1A", {}},     {"nan dBm", {}},
-        {"- 3 dB", {}},        {"N/A", {}},          {"inf", {}},            {std::string(400, '9').c_str(), {}},
+        {"- 3 dB", {}},        {"N/A", {}},          {"inf", {}},            {std::string(400, '9'), {}},
     };
     // A German locale writes and reads "1,5": the parse must not follow it.
     const std::string previous = std::setlocale(LC_ALL, nullptr);
