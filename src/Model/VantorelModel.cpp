@@ -302,8 +302,10 @@ void VantorelModel::refresh() {
         _nodes.reset();
         _nodesByPath.clear();
     }
+    const bool ticked = _updated;
     _updated = false;
     statusChanged_ = false;
+    if (ticked) emit displayTicked();
     tellApplication();
 }
 
@@ -331,6 +333,11 @@ NodeRef VantorelModel::nodeAtPath(const std::string& path) {
     if (_nodesByPath.empty()) topLevelNodes();
     auto it = _nodesByPath.find(path);
     return it == _nodesByPath.end() ? nullptr : it->second;
+}
+
+const PathDictionary& VantorelModel::pathIndex() {
+    if (_nodesByPath.empty()) topLevelNodes();
+    return _nodesByPath;
 }
 
 Value VantorelModel::getSaveContents() {

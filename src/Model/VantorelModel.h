@@ -51,6 +51,8 @@ public:
     // The display tree, rebuilt at most once per refresh that saw new data.
     NodeRef topLevelNodes();
     NodeRef nodeAtPath(const std::string& path);
+    // The tree's path index (built if needed), as nodeAtPath reads it.
+    const PathDictionary& pathIndex();
     Value getSaveContents();
 
     // Observers for the terminal view, the status line and tests.
@@ -65,6 +67,11 @@ public:
     // service's notifications name it.
     void setSource(std::string description, bool isReplay, bool authoritative);
     SourceStatus sourceStatus() const;
+
+signals:
+    // A display tick that found new data: the tree is rebuilt on the next read, and
+    // observers that sample it (plots, exports) take one value per tick.
+    void displayTicked();
 
 private:
     // The receive port's message and invalidation callbacks and the service's notifications.

@@ -1,0 +1,138 @@
+// Tests the signal series: numbers read from display strings, the bounded series, the sampler's marks, and its keys on every emulated modem's tree.
+#include "Model/SignalSampler.h"
+#include "Model/SignalValue.h"
+
+#include "LogGenerator/LogGenerator.h"
+#include "Platform/TelephonyIdentifiers.h"
+#include "PropertyList/Dictionary.h"
+#include "TelephonyService/Emulator/CDMAScenario.h"
+#include "TelephonyService/Emulator/GSMScenario.h"
+#include "TelephonyService/Emulator/IFXScenario.h"
+#include "TelephonyService/Emulator/LTEScenario.h"
+#include "TelephonyService/Emulator/UTRANScenario.h"
+
+#include <gtest/gtest.h>
+
+#include <clocale>
+#include <memory>
+
+using namespace vantorel;
+
+namespace {
+
+TEST(SignalValue, TakesTheLeadingNumberWhateverTheLocale) {
+    const struct {
+        std::string display;
+        std::optional<double> value;
+    } rows[] = {
+        {"-95.50 dBm", -95.5}, {"  +3 dB", 3},       {"0.179688", 0.179688}, {"12 (old)", 12}, {"17", 17},
+        {"1.5.6", 1.5},        {"2,5 dB", 2},        {"-0.25%", -0.25},      {"5.dB", 5},      {"Not Present", {}},
+        {"Unknown", {}},       {"-", {}},            {"", {}},               {"0x1A", {}},     {"nan dBm", {}},
+        {"- 3 dB", {}},        {"N/A", {}},          {"inf", {}},            {std::string(400, '9'), {}},
+    };
+    // A German locale writes and reads "1,5": the parse must not follow it.
+    const std::string previous = std::setlocale(LC_ALL, nullptr);
+    for (const char* locale : {"C", "de_DE.utf8"}) {
+        if (!std::setlocale(LC_ALL, locale)) continue;
+        for (const auto& row : rows) {
+            SCOPED_TRACE(std::string(locale) + " '" + row.display + "'");
+            EXPECT_EQ(SignalValue::parse(row.display), row.value);
+        }
+    }
+    std::setlocale(LC_ALL, previous.c_str());
+}
+
+TEST(SignalSeries, ADayOfTicksStaysBoundedKeepingOrderAndBothEnds) {
+    SignalSeries series;
+    constexpr int64_t kTicks = 24 * 3600 / 2, kKeys = 10;
+    for (int64_t t = 0; t < kTicks; ++t)
+        for (int k = 0; k < kKeys; ++k)
+            series.add("k" + std::to_string(k), t * 2000, k == 9 && t % 2 ? std::nullopt : std::optional<double>(t));
+    size_t total = 0;
+    for (const std::string& key : series.keys()) {
+        const auto& points = series.points(key);
+        SCOPED_TRACE(key);
+        ASSERT_LE(points.size(), SignalSeries::kMaxPoints);
+        EXPECT_GT(points.size(), SignalSeries::kMaxPoints / 2);
+        EXPECT_EQ(points.front().timeMs, 0);
+        for (size_t i = 1; i < points.size(); ++i) ASSERT_LT(points[i - 1].timeMs, points[i].timeMs);
+        // The latest minutes stay at full resolution.
+        EXPECT_EQ(points[points.size() - 2].timeMs, points.back().timeMs - (key == "k9" ? 4000 : 2000));
+        total += points.size();
+    }
+    EXPECT_EQ(series.pointCount(), total);
+    EXPECT_EQ(series.points("k0").back().timeMs, (kTicks - 1) * 2000);
+    EXPECT_EQ(series.latest("k0"), double(kTicks - 1));
+    EXPECT_EQ(series.latest("k9"), std::nullopt);  // the last tick was a gap
+    for (int m = 0; m < 5000; ++m) series.addMark({m, SignalSeries::Mark::Kind::Handover, ""});
+    EXPECT_LE(series.marks().size(), SignalSeries::kMaxMarks);
+    EXPECT_EQ(series.marks().front().timeMs, 0);
+    EXPECT_EQ(series.marks().back().timeMs, 4999);
+}
+
+TEST(SignalSampler, MarksHandoversAndTechnologyChangesOncePerChange) {
+    const std::string lte = kTSLogChannelTechnology_Morvek_LTE, utran = kTSLogChannelTechnology_Morvek_UTRAN2;
+    SignalSampler sampler;
+    sampler.setKeys({"/Serving Cell/Serving Cell Info/Physical Cell ID", "/nowhere"});
+    // Leaves under "/Serving Cell/Serving Cell Info", one tick each.
+    const std::pair<std::string, std::vector<std::pair<const char*, const char*>>> ticks[] = {
+        {lte, {{"Physical Cell ID", "-"}, {"Download Frequency", "-"}}},     // nothing shown yet
+        {lte, {{"Physical Cell ID", "301"}, {"Download Frequency", "6300"}}},  // first cell: no handover
+        {lte, {{"Physical Cell ID", "301"}, {"Download Frequency", "6300"}}},
+        {lte, {{"Physical Cell ID", "17"}}},                                   // frequency missing: no verdict
+        {lte, {{"Physical Cell ID", "17"}, {"Download Frequency", "6300"}}},   // handover
+        {utran, {{"Cell Scrambling Code", "11"}, {"Downlink UARFCN", "10055"}}},  // technology change only
+        {utran, {{"Cell Scrambling Code", "24"}, {"Downlink UARFCN", "10055"}}},  // handover
+    };
+    int64_t time = 0;
+    for (const auto& [technology, leaves] : ticks) {
+        auto info = Dictionary::create(), serving = Dictionary::create(), top = Dictionary::create();
+        for (const auto& [name, value] : leaves) info->set(name, Value(value));
+        serving->set("Serving Cell Info", Value(info));
+        top->set("Serving Cell", Value(serving));
+        PathDictionary index;
+        VantorelModelNode::makeTreeFromObject(Value(top), index);
+        sampler.sample(time, technology, index);
+        time += 2000;
+    }
+
+    std::vector<std::string> marks;
+    for (const auto& m : sampler.series().marks())
+        marks.push_back(std::to_string(m.timeMs) + (m.kind == SignalSeries::Mark::Kind::Handover ? " H " : " T ") + m.text);
+    EXPECT_EQ(marks, (std::vector<std::string>{"8000 H Physical Cell ID 301 → 17", "10000 T LTE → UTRAN (TD-SCDMA)",
+                                               "12000 H Cell Scrambling Code 11 → 24"}));
+    // Chosen keys stay chosen across the technology change; the last tick had neither value.
+    EXPECT_EQ(sampler.keys().size(), 2u);
+    EXPECT_EQ(sampler.series().points("/Serving Cell/Serving Cell Info/Physical Cell ID").size(), 4u);
+    EXPECT_EQ(sampler.lastRow(), (std::vector<std::optional<double>>{std::nullopt, std::nullopt}));
+}
+
+// Every default key holds a number at some tick of that technology's emulated modem,
+// read through its decoder as the monitor does.
+// Every default key holds a number at some tick of each emulated modem, read through
+// its decoder as the monitor does, and the modem's cell changes are marked.
+TEST(SignalSampler, DefaultKeysExistInEachDecodersTree) {
+    std::unique_ptr<EmulatorScenario> modems[] = {std::make_unique<LTEScenario>(3), std::make_unique<UTRANScenario>(3),
+                                                  std::make_unique<GSMScenario>(3), std::make_unique<CDMAScenario>(3),
+                                                  std::make_unique<IFXScenario>(3)};
+    for (auto& scenario : modems) {
+        const std::string technology = scenario->technology();
+        SCOPED_TRACE(technology);
+        auto decoder = LogGenerator::generatorFromTechnology(technology);
+        Dictionary state;
+        SignalSampler sampler;
+        for (uint64_t tick = 0; tick < 150; ++tick) {
+            for (const Bytes& record : scenario->recordsForTick(tick)) decoder->updateState(state, record);
+            DictionaryRef display = decoder->generateLogUsingState(state);
+            PathDictionary index;
+            VantorelModelNode::makeTreeFromObject(display ? Value(display) : Value(), index);
+            sampler.sample(int64_t(tick) * 2000, technology, index);
+        }
+        ASSERT_FALSE(SignalSampler::defaultKeys(technology).empty());
+        for (const std::string& key : SignalSampler::defaultKeys(technology))
+            EXPECT_FALSE(sampler.series().points(key).empty()) << key;
+        EXPECT_FALSE(sampler.series().marks().empty()) << "no handover in 150 ticks";
+    }
+}
+
+}  // namespace
