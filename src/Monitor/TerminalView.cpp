@@ -21,7 +21,18 @@ TerminalView::TerminalView(std::FILE* out)
 
 TerminalView::~TerminalView() = default;
 
+void TerminalView::setPlots(const std::vector<std::string>& keys) {
+    sparklines_.clear();
+    for (const std::string& key : keys) sparklines_.emplace_back(key);
+}
+
 void TerminalView::setModel(VantorelModel* model) {
+    if (model && model != model_)
+        connect(model, &VantorelModel::displayTicked, this, [this, model] {
+            if (sparklines_.empty()) return;
+            const PathDictionary& nodes = model->pathIndex();
+            for (Sparkline& s : sparklines_) s.sample(nodes);
+        });
     model_ = model;
     if (!connectionTimer_) {
         // "Connecting..." while the channel is down, said once per loss; on a
@@ -71,7 +82,9 @@ std::string TerminalView::statusLine() const {
 }
 
 std::string TerminalView::screen() const {
-    std::string text = statusLine() + "\n\n";
+    std::string text = statusLine() + "\n";
+    for (const Sparkline& s : sparklines_) text += s.line(1 << 16) + "\n";
+    text += "\n";
     if (model_) text += TreeFormatter::compactTree(model_->topLevelNodes());
     return text;
 }
@@ -84,7 +97,8 @@ void TerminalView::readKeys() {
         return;
     }
     pendingKeys_.append(buffer, static_cast<size_t>(n));
-    const int rows = std::max(1, height_ - TerminalNavigator::kHeaderLines - TerminalNavigator::kFooterLines);
+    const int rows = std::max(1, height_ - static_cast<int>(sparklines_.size()) - TerminalNavigator::kHeaderLines -
+                                     TerminalNavigator::kFooterLines);
     for (TerminalKeys::Key key : TerminalKeys::take(pendingKeys_)) {
         if (!navigator_.handle(key, rows)) {
             QCoreApplication::exit(0);
@@ -102,9 +116,13 @@ void TerminalView::draw() {
     // Home, then every line cleared to its end; the last line without a newline so
     // that the window never scrolls; the rest of the screen cleared.
     std::string text = "\x1b[H";
-    const auto lines = navigator_.render(statusLine(), width_, height_);
+    // The sparklines go under the status line; the tree gets the lines left.
+    const int plots = std::min(static_cast<int>(sparklines_.size()), std::max(0, height_ - 1));
+    auto lines = navigator_.render(statusLine(), width_, height_ - plots);
+    for (int i = 0; i < plots && !lines.empty(); ++i)
+        lines.insert(lines.begin() + 1 + i, sparklines_[static_cast<size_t>(i)].line(width_));
     for (size_t i = 0; i < lines.size(); ++i) {
-        const bool cursor = lines[i].starts_with("> ") && i >= TerminalNavigator::kHeaderLines;
+        const bool cursor = lines[i].starts_with("> ") && i >= TerminalNavigator::kHeaderLines + static_cast<size_t>(plots);
         text += cursor ? "\x1b[7m" + lines[i] + "\x1b[0m" : lines[i];
         text += i + 1 < lines.size() ? "\x1b[K\n" : "\x1b[K";
     }
@@ -128,9 +146,11 @@ void TerminalView::updateViewControllerFromModel() {
     std::fflush(out_);
 }
 
-int TerminalView::run(const MonitorLauncher::Source& source, const char* program) {
+int TerminalView::run(const MonitorLauncher::Source& source, const char* program,
+                      const std::vector<std::string>& plots, const std::function<void(VantorelModel&)>& started) {
     std::string error;
     TerminalView view;
+    view.setPlots(plots);
     MonitorLauncher launcher;
     if (!launcher.start(source, &view, &error)) {
         std::fprintf(stderr, "%s: %s\n", program, error.c_str());
@@ -140,6 +160,7 @@ int TerminalView::run(const MonitorLauncher::Source& source, const char* program
                  view.interactive_ ? "q or Ctrl-C" : "Ctrl-C");
     QuitOnSignal quit;
     view.setModel(launcher.model());
+    if (started) started(*launcher.model());
     return QCoreApplication::exec();
 }
 

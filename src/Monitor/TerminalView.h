@@ -3,14 +3,17 @@
 
 #include "Model/ApplicationObject.h"
 #include "Monitor/MonitorLauncher.h"
+#include "Monitor/Sparkline.h"
 #include "Monitor/StatusText.h"
 #include "Monitor/TerminalNavigator.h"
 
 #include <QObject>
 
 #include <cstdio>
+#include <functional>
 #include <memory>
 #include <string>
+#include <vector>
 
 class QSocketNotifier;
 class QTimer;
@@ -31,17 +34,24 @@ public:
     ~TerminalView() override;
 
     void setModel(VantorelModel* model);
+    // One sparkline per key (a display-tree path), drawn under the status line and
+    // sampled at every display tick that brought new data.
+    void setPlots(const std::vector<std::string>& keys);
     void updateViewControllerFromModel() override;
     int refreshes() const { return refreshes_; }
 
     // The status line: "Vantorel - Updated ... - 12 messages decoded".
     std::string statusLine() const;
-    // The text of one plain screen: the status line, then the tree.
+    // The text of one plain screen: the status line, the sparklines, then the tree.
     std::string screen() const;
 
     // The terminal view on `source` until q (on a terminal) or SIGINT/SIGTERM;
-    // `program` prefixes messages. Needs a running QCoreApplication. Returns the exit code.
-    static int run(const MonitorLauncher::Source& source, const char* program);
+    // `program` prefixes messages. `plots`: setPlots; `started`: called with the model
+    // once it exists (observers such as an export attach there). Needs a running
+    // QCoreApplication. Returns the exit code.
+    static int run(const MonitorLauncher::Source& source, const char* program,
+                   const std::vector<std::string>& plots = {},
+                   const std::function<void(VantorelModel&)>& started = {});
 
 private:
     void watchConnection();
@@ -62,6 +72,7 @@ private:
     QSocketNotifier* keys_ = nullptr;
     std::string pendingKeys_;
     int width_ = 0, height_ = 0;
+    std::vector<Sparkline> sparklines_;
 };
 
 }  // namespace vantorel

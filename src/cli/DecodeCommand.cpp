@@ -2,10 +2,13 @@
 #include "cli/DecodeCommand.h"
 
 #include "LogGenerator/LogGenerator.h"
+#include "Model/MonitorClock.h"
 #include "Platform/SystemLog.h"
 #include "Platform/TechnologyNames.h"
 #include "PropertyList/Dictionary.h"
+#include "TelephonyService/Replay/DiagPacket.h"
 #include "TelephonyService/Replay/RecordedStream.h"
+#include "cli/SignalExport.h"
 #include "cli/StdoutToStderr.h"
 #include "Monitor/TreeFormatter.h"
 
@@ -14,6 +17,53 @@
 #include <cstdio>
 
 namespace vantorel {
+
+namespace {
+
+// The display ticks of a replay, on the messages' recorded times: a tick every
+// MonitorClock::kDisplayUpdateInterval that brought new messages (as the model only
+// redraws after new data), stamped with its recorded time. A message without a time
+// (a zero DIAG time stamp) joins the tick it arrives in; a stream in which no message
+// has a time gives one row, at the end, with an empty time cell. The last messages'
+// tick is at the 2 s mark after them, as a replay would show it.
+class ReplayTicks {
+public:
+    explicit ReplayTicks(SignalExport& out) : out_(out) {}
+
+    void beforeMessage(const TimedMessage& m, LogGenerator& decoder, Dictionary& state, const std::string& technology) {
+        if (m.timeMicros == kNoTime) return;
+        const int64_t ms = m.timeMicros / 1000;
+        if (!next_) {
+            next_ = ms + kInterval;
+        } else if (ms >= *next_) {
+            if (pending_) tick(*next_, decoder, state, technology);
+            *next_ += ((ms - *next_) / kInterval + 1) * kInterval;  // the first mark after ms
+        }
+    }
+    void afterMessage() { pending_ = true; }
+    void atEnd(LogGenerator& decoder, Dictionary& state, const std::string& technology) {
+        if (pending_) tick(next_, decoder, state, technology);
+    }
+
+private:
+    static constexpr int64_t kInterval = MonitorClock::kDisplayUpdateInterval.count();
+    static inline const int64_t kNoTime = DiagPacket::microsecondsSince1970(0);
+
+    void tick(std::optional<int64_t> timeMs, LogGenerator& decoder, Dictionary& state, const std::string& technology) {
+        DictionaryRef display = decoder.generateLogUsingState(state);
+        if (!display) display = decoder.generateLogUsingState(state);  // the call that builds it returns null
+        PathDictionary index;
+        VantorelModelNode::makeTreeFromObject(display ? Value(display) : Value(), index);
+        out_.tick(timeMs, technology, index);
+        pending_ = false;
+    }
+
+    SignalExport& out_;
+    std::optional<int64_t> next_;
+    bool pending_ = false;
+};
+
+}  // namespace
 
 int DecodeCommand::run(const QStringList& args) {
     QCommandLineParser parser;
@@ -28,6 +78,7 @@ int DecodeCommand::run(const QStringList& args) {
                       "Output: tree (as the panes show it), json or plist (the tree's names in its order),\n"
                       "or display (the display dictionary as the decoder keeps it, as JSON).",
                       "FORMAT", "tree"});
+    SignalExport::addOptions(parser, false);
     parser.addOption({"verbose", "Mirror the system log to stderr."});
     parser.addPositionalArgument("FILE", "QXDM DLF, QMDL/mi2log or Vantorel capture files, decoded in order.",
                                  "FILE...");
@@ -54,6 +105,13 @@ int DecodeCommand::run(const QStringList& args) {
         }
         technology = *id;
     }
+    SignalExport csv;
+    std::string csvError;
+    if (!csv.configure(parser, false, &csvError)) {
+        std::fprintf(stderr, "vantorel-cli decode: %s\n", csvError.c_str());
+        return 2;
+    }
+    ReplayTicks ticks(csv);
 
     std::unique_ptr<LogGenerator> decoder;
     std::string decoderTechnology;
@@ -103,8 +161,15 @@ int DecodeCommand::run(const QStringList& args) {
                 ++skipped;
                 continue;
             }
+            if (csv.enabled()) ticks.beforeMessage(m, *decoder, state, decoderTechnology);
             decoder->updateState(state, m.data);
+            ticks.afterMessage();
         }
+    }
+    if (decoder && csv.enabled()) ticks.atEnd(*decoder, state, decoderTechnology);
+    if (!csv.finish(decoderTechnology, &csvError)) {
+        std::fprintf(stderr, "vantorel-cli decode: %s\n", csvError.c_str());
+        ++failures;
     }
     if (!decoder) return failures ? 1 : 0;
 
@@ -119,6 +184,9 @@ int DecodeCommand::run(const QStringList& args) {
     std::fprintf(stderr, "%llu messages read, %llu skipped (message id not 0), %llu bad frames\n",
                  static_cast<unsigned long long>(read), static_cast<unsigned long long>(skipped),
                  static_cast<unsigned long long>(badFrames));
+    if (csv.enabled())
+        std::fprintf(stderr, "%llu CSV rows written to %s\n", static_cast<unsigned long long>(csv.rows()),
+                     qPrintable(parser.value("csv")));
     // The IFX decoder shows only messages that are whole displays: a file of log records
     // gives it none, which is said rather than printed as an empty screen.
     if (!display) {

@@ -1,12 +1,16 @@
 // WatchCommand: `vantorel-cli watch` runs the monitor with the terminal view as its application object.
 #include "cli/WatchCommand.h"
 
+#include "Model/MonitorClock.h"
+#include "Model/VantorelModel.h"
 #include "Platform/SystemLog.h"
 #include "Monitor/MonitorLauncher.h"
 #include "Monitor/TerminalView.h"
+#include "cli/SignalExport.h"
 
 #include <QCommandLineParser>
 
+#include <chrono>
 #include <cstdio>
 
 namespace vantorel {
@@ -19,6 +23,11 @@ int WatchCommand::run(const QStringList& args) {
         "Keys in a terminal: arrows move, Enter opens, Backspace goes back, PgUp/PgDn scroll, q quits.");
     parser.addHelpOption();
     MonitorLauncher::addOptions(parser);
+    SignalExport::addOptions(parser, true);
+    parser.addOption({"plot",
+                      "Draw a sparkline of the value at this display path under the status\n"
+                      "line (the last 40 display ticks); repeat for several values.",
+                      "KEY"});
     parser.addOption({"verbose", "Mirror the system log to stderr."});
     parser.process(QStringList{"vantorel-cli watch"} + args);
     SystemLog::setMirrorToStderr(parser.isSet("verbose"));
@@ -29,7 +38,27 @@ int WatchCommand::run(const QStringList& args) {
         std::fprintf(stderr, "vantorel-cli watch: %s\n", error.c_str());
         return 2;
     }
-    return TerminalView::run(*source, "vantorel-cli watch");
+    SignalExport csv;
+    if (!csv.configure(parser, true, &error)) {
+        std::fprintf(stderr, "vantorel-cli watch: %s\n", error.c_str());
+        return 2;
+    }
+    std::vector<std::string> plots;
+    for (const QString& key : parser.values("plot")) plots.push_back(key.toStdString());
+
+    const int code = TerminalView::run(*source, "vantorel-cli watch", plots, [&csv](VantorelModel& model) {
+        if (!csv.enabled()) return;
+        QObject::connect(&model, &VantorelModel::displayTicked, &model, [&csv, &model] {
+            const auto now = MonitorClock::current().now().time_since_epoch();
+            csv.tick(std::chrono::duration_cast<std::chrono::milliseconds>(now).count(),
+                     model.sourceStatus().decoderTechnology, model.pathIndex());
+        });
+    });
+    if (!csv.finish("", &error)) {
+        std::fprintf(stderr, "vantorel-cli watch: %s\n", error.c_str());
+        return code ? code : 1;
+    }
+    return code;
 }
 
 }  // namespace vantorel

@@ -1,0 +1,109 @@
+// SignalCsvWriter: formats ticks as CSV rows with std::to_chars (locale-free) and writes them line by line.
+#include "Monitor/SignalCsvWriter.h"
+
+#include <QDateTime>
+
+#include <charconv>
+#include <cerrno>
+#include <cstring>
+#include <map>
+
+namespace vantorel {
+
+SignalCsvWriter::SignalCsvWriter(std::vector<std::string> keys, bool positionColumns)
+    : keys_(std::move(keys)), positionColumns_(positionColumns) {}
+
+SignalCsvWriter::~SignalCsvWriter() {
+    if (file_) std::fclose(file_);
+}
+
+std::string SignalCsvWriter::isoTime(int64_t timeMs) {
+    return QDateTime::fromMSecsSinceEpoch(timeMs, Qt::UTC).toString("yyyy-MM-ddThh:mm:ss.zzzZ").toStdString();
+}
+
+std::string SignalCsvWriter::number(double value) {
+    char buffer[32];
+    const auto [end, error] = std::to_chars(buffer, buffer + sizeof buffer, value);
+    return error == std::errc() ? std::string(buffer, end) : std::string();
+}
+
+std::string SignalCsvWriter::field(const std::string& text) {
+    if (text.find_first_of(",\"\r\n") == std::string::npos) return text;
+    std::string quoted = "\"";
+    for (char c : text) quoted += c == '"' ? std::string("\"\"") : std::string(1, c);
+    return quoted + "\"";
+}
+
+std::string SignalCsvWriter::header() const {
+    std::string line = "time";
+    for (const std::string& key : keys_) line += "," + field(key);
+    if (positionColumns_) line += ",latitude,longitude,speed";
+    return line + "\r\n";
+}
+
+std::string SignalCsvWriter::row(std::optional<int64_t> timeMs, const std::vector<std::optional<double>>& values,
+                                 const std::optional<Position>& position) const {
+    std::string line = timeMs ? isoTime(*timeMs) : std::string();
+    for (size_t i = 0; i < keys_.size(); ++i) {
+        line += ",";
+        if (i < values.size() && values[i]) line += number(*values[i]);
+    }
+    if (positionColumns_) {
+        if (position)
+            line += "," + number(position->latitude) + "," + number(position->longitude) + "," +
+                    (position->speed ? number(*position->speed) : std::string());
+        else
+            line += ",,,";
+    }
+    return line + "\r\n";
+}
+
+std::string SignalCsvWriter::fromSeries(const SignalSeries& series) const {
+    // Keys are sampled on the same ticks; thinning and gaps leave some keys without a
+    // point at a tick, which shows as an empty cell.
+    std::map<int64_t, std::vector<std::optional<double>>> rows;
+    for (size_t k = 0; k < keys_.size(); ++k)
+        for (const SignalSeries::Point& p : series.points(keys_[k])) {
+            auto& values = rows[p.timeMs];
+            values.resize(keys_.size());
+            values[k] = p.value;
+        }
+    std::string text = header();
+    for (const auto& [time, values] : rows) text += row(time, values);
+    return text;
+}
+
+bool SignalCsvWriter::open(const std::string& path, std::string* error) {
+    if (file_) std::fclose(file_);
+    rows_ = 0;
+    file_ = std::fopen(path.c_str(), "wb");
+    if (!file_) {
+        if (error) *error = path + ": " + std::strerror(errno);
+        return false;
+    }
+    const std::string line = header();
+    if (std::fwrite(line.data(), 1, line.size(), file_) != line.size() || std::fflush(file_) != 0) {
+        if (error) *error = path + ": " + std::strerror(errno);
+        return false;
+    }
+    return true;
+}
+
+bool SignalCsvWriter::writeRow(std::optional<int64_t> timeMs, const std::vector<std::optional<double>>& values,
+                               const std::optional<Position>& position) {
+    if (!file_) return false;
+    const std::string line = row(timeMs, values, position);
+    if (std::fwrite(line.data(), 1, line.size(), file_) != line.size() || std::fflush(file_) != 0) return false;
+    ++rows_;
+    return true;
+}
+
+bool SignalCsvWriter::close(std::string* error) {
+    if (!file_) return true;
+    const bool ok = std::fclose(file_) == 0;
+    file_ = nullptr;
+    if (!ok && error) *error = std::strerror(errno);
+    return ok;
+}
+
+}  // namespace vantorel

@@ -1,0 +1,105 @@
+// SignalExport: samples the display tree at each tick and appends the row to the CSV file, with the gpsd position when asked.
+#include "cli/SignalExport.h"
+
+#include "Monitor/GpsPosition.h"
+
+#include <QCommandLineParser>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+
+namespace vantorel {
+
+void SignalExport::addOptions(QCommandLineParser& parser, bool live) {
+    parser.addOption({"csv",
+                      live ? "Write the plotted values to FILE as CSV, one row per display tick\n"
+                             "(wall-clock time, flushed at once)."
+                           : "Write the plotted values to FILE as CSV, one row per 2 s of recorded\n"
+                             "time that brought messages (stamped with the tick's recorded time).",
+                      "FILE"});
+    parser.addOption({"csv-keys",
+                      "Comma-separated display paths to write (\"/Serving Cell/Serving Cell\n"
+                      "Measurements/Measured RSRP\"); default: the technology's signal values.",
+                      "KEYS"});
+    if (live)
+        parser.addOption({"gps", "Add latitude, longitude and speed (m/s) columns from gpsd on\n"
+                                 "localhost:2947; empty without a fix or without gpsd."});
+}
+
+std::vector<std::string> SignalExport::splitKeys(const QString& list) {
+    std::vector<std::string> keys;
+    for (const QString& part : list.split(',', Qt::SkipEmptyParts)) {
+        const QString key = part.trimmed();
+        if (!key.isEmpty()) keys.push_back(key.toStdString());
+    }
+    return keys;
+}
+
+SignalExport::SignalExport() = default;
+SignalExport::~SignalExport() = default;
+
+bool SignalExport::configure(const QCommandLineParser& parser, bool live, std::string* error) {
+    const bool csv = parser.isSet("csv");
+    if (!csv && parser.isSet("csv-keys")) return *error = "--csv-keys needs --csv FILE", false;
+    if (live && !csv && parser.isSet("gps")) return *error = "--gps needs --csv FILE", false;
+    if (!csv) return true;
+    path_ = parser.value("csv").toStdString();
+    if (path_.empty()) return *error = "--csv needs a file name", false;
+    if (parser.isSet("csv-keys")) {
+        chosenKeys_ = splitKeys(parser.value("csv-keys"));
+        if (chosenKeys_.empty()) return *error = "--csv-keys names no key", false;
+        sampler_.setKeys(chosenKeys_);
+    }
+    // Created now so that a bad path is said before any decoding; the header follows
+    // at the first tick.
+    std::FILE* file = std::fopen(path_.c_str(), "wb");
+    if (!file) return *error = path_ + ": " + std::strerror(errno), false;
+    std::fclose(file);
+    gps_ = live && parser.isSet("gps");
+    if (gps_) {
+        position_ = std::make_unique<GpsPosition>();
+        position_->start();
+        if (!position_->isConnected())
+            std::fprintf(stderr, "vantorel-cli: no gpsd on localhost:2947: the position columns stay empty until it runs\n");
+    }
+    return true;
+}
+
+bool SignalExport::openWriter(const std::string& technology) {
+    if (writer_) return !failed_;
+    std::vector<std::string> keys = chosenKeys_.empty() ? SignalSampler::defaultKeys(technology) : chosenKeys_;
+    if (chosenKeys_.empty()) sampler_.setKeys(keys);  // the columns stay those of the first technology
+    writer_ = std::make_unique<SignalCsvWriter>(std::move(keys), gps_);
+    failed_ = !writer_->open(path_, &error_);
+    return !failed_;
+}
+
+void SignalExport::tick(std::optional<int64_t> timeMs, const std::string& technology, const PathDictionary& nodes) {
+    if (!enabled() || !openWriter(technology)) return;
+    sampler_.sample(timeMs.value_or(0), technology, nodes);
+    for (const std::string& key : chosenKeys_)
+        if (!seen_.count(key) && nodes.count(key)) seen_.insert(key);
+    const auto position = position_ ? position_->position() : std::nullopt;
+    if (!writer_->writeRow(timeMs, sampler_.lastRow(), position)) {
+        failed_ = true;
+        error_ = path_ + ": " + std::strerror(errno);
+    }
+}
+
+bool SignalExport::finish(const std::string& technology, std::string* error) {
+    if (!enabled()) return true;
+    openWriter(technology);
+    // Only keys the user named: a default key (a third neighbour) may well never show.
+    std::string unseen;
+    for (const std::string& key : chosenKeys_)
+        if (!seen_.count(key)) unseen += "\n  " + key;
+    if (!unseen.empty())
+        std::fprintf(stderr, "vantorel-cli: no display tick held these --csv-keys (their columns are empty):%s\n",
+                     unseen.c_str());
+    if (!failed_ && !writer_->close(&error_)) failed_ = true;
+    if (failed_) *error = error_;
+    return !failed_;
+}
+
+}  // namespace vantorel
