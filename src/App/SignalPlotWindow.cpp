@@ -2,11 +2,13 @@
 #include "App/SignalPlotWindow.h"
 
 #include "Model/SignalSampler.h"
+#include "Monitor/SignalCsvWriter.h"
 
 #include <QChart>
 #include <QChartView>
 #include <QDateTimeAxis>
 #include <QFileDialog>
+#include <QGraphicsRectItem>
 #include <QGraphicsSimpleTextItem>
 #include <QHBoxLayout>
 #include <QLabel>
@@ -14,6 +16,7 @@
 #include <QLineSeries>
 #include <QMessageBox>
 #include <QPushButton>
+#include <QSaveFile>
 #include <QScrollBar>
 #include <QValueAxis>
 #include <QVBoxLayout>
@@ -25,8 +28,6 @@
 namespace vantorel {
 
 namespace {
-
-constexpr int kMarkRows = 3;  // neighbouring marks' texts are staggered over this many lines
 
 QColor markColour(SignalSeries::Mark::Kind kind) {
     return kind == SignalSeries::Mark::Kind::TechnologyChange ? QColor(190, 40, 40) : QColor(110, 110, 110);
@@ -129,12 +130,19 @@ void SignalPlotWindow::addLine(const std::string& key) {
     line.unit = units_ ? units_(key) : std::string();
     line.axis = axisFor(line.unit);
     line.label = labelOf(key);
-    line.series = new QLineSeries;
+    line.series = newSeries(line.axis, true);
     line.series->setName(line.label);
-    chart_->addSeries(line.series);
-    line.series->attachAxis(timeAxis_);
-    line.series->attachAxis(line.axis);
     lines_[key] = line;
+}
+
+QLineSeries* SignalPlotWindow::newSeries(QValueAxis* axis, bool inLegend) {
+    auto* series = new QLineSeries;
+    chart_->addSeries(series);
+    series->attachAxis(timeAxis_);
+    series->attachAxis(axis);
+    if (!inLegend)
+        for (QLegendMarker* marker : chart_->legend()->markers(series)) marker->setVisible(false);
+    return series;
 }
 
 void SignalPlotWindow::refresh() {
@@ -191,7 +199,26 @@ void SignalPlotWindow::draw() {
                 high = std::max(high, p->value);
             }
         }
-        line.series->replace(shown);
+        // A gap (ticks without a value) breaks the line: a step longer than the steps on
+        // either side of it. Thinned older points are evenly spaced too, so only gaps break.
+        std::vector<double> steps;
+        for (qsizetype i = 1; i < shown.size(); ++i) steps.push_back(shown[i].x() - shown[i - 1].x());
+        auto gapAt = [&](std::size_t i) {
+            const bool before = i > 0, after = i + 1 < steps.size();
+            return (before || after) && (!before || steps[i] > 1.5 * steps[i - 1]) &&
+                   (!after || steps[i] > 1.5 * steps[i + 1]);
+        };
+        std::vector<QList<QPointF>> pieces(1);
+        for (qsizetype i = 0; i < shown.size(); ++i) {
+            if (i > 0 && gapAt(std::size_t(i - 1))) pieces.emplace_back();
+            pieces.back().append(shown[i]);
+        }
+        line.series->replace(pieces.front());
+        while (line.pieces.size() + 1 < pieces.size()) line.pieces.push_back(newSeries(line.axis, false));
+        for (std::size_t i = 0; i < line.pieces.size(); ++i) {
+            line.pieces[i]->setPen(line.series->pen());
+            line.pieces[i]->replace(i + 1 < pieces.size() ? pieces[i + 1] : QList<QPointF>());
+        }
         const std::optional<double> latest = series.latest(key);
         line.series->setName(latest ? QStringLiteral("%1  %2 %3").arg(line.label).arg(*latest, 0, 'g', 4).arg(QString::fromStdString(line.unit))
                                     : line.label);
@@ -218,8 +245,12 @@ void SignalPlotWindow::draw() {
             item.line->attachAxis(timeAxis_);
             item.line->attachAxis(markAxis);
             for (QLegendMarker* marker : chart_->legend()->markers(item.line)) marker->setVisible(false);
-            item.text = new QGraphicsSimpleTextItem(chart_);
-            item.text->setZValue(10);
+            // The text on a pale box, readable over the lines it crosses.
+            item.back = new QGraphicsRectItem(chart_);
+            item.back->setPen(Qt::NoPen);
+            item.back->setBrush(QColor(255, 255, 255, 200));
+            item.back->setZValue(1000);
+            item.text = new QGraphicsSimpleTextItem(item.back);
             marks_.push_back(item);
         }
         MarkItem& item = marks_[shownMarks_++];
@@ -228,13 +259,13 @@ void SignalPlotWindow::draw() {
         item.line->setPen(pen);
         item.line->replace({QPointF(double(mark.timeMs), markAxis->min()), QPointF(double(mark.timeMs), markAxis->max())});
         item.line->setVisible(true);
-        item.text->setText(QString::fromStdString(mark.text));
+        item.text->setToolTip(QString::fromStdString(mark.text));
         item.text->setBrush(markColour(mark.kind));
-        item.text->setVisible(true);
+        item.back->setVisible(true);
     }
     for (std::size_t i = shownMarks_; i < marks_.size(); ++i) {
         marks_[i].line->setVisible(false);
-        marks_[i].text->setVisible(false);
+        marks_[i].back->setVisible(false);
     }
     placeMarkTexts();
 
@@ -247,21 +278,24 @@ void SignalPlotWindow::draw() {
 }
 
 void SignalPlotWindow::placeMarkTexts() {
+    // Each text runs up along its line, on its right, elided to the plot's height (whole in
+    // the tooltip): marks a few pixels apart then never write over each other.
     const QRectF area = chart_->plotArea();
     for (std::size_t i = 0; i < shownMarks_; ++i) {
         MarkItem& item = marks_[i];
         const QPointF at = chart_->mapToPosition(QPointF(double(item.timeMs), 0), item.line);
-        const qreal height = item.text->boundingRect().height();
-        qreal x = at.x() + 3;
-        // Texts near the right edge go left of their line.
-        if (x + item.text->boundingRect().width() > area.right()) x = at.x() - 3 - item.text->boundingRect().width();
-        item.text->setPos(x, area.top() + 2 + qreal(i % kMarkRows) * height);
+        const QFontMetrics metrics(item.text->font());
+        item.text->setText(metrics.elidedText(item.text->toolTip(), Qt::ElideRight, int(area.height()) - 8));
+        const QRectF box = item.text->boundingRect();
+        item.back->setRect(box.adjusted(-2, 0, 2, 0));
+        item.back->setRotation(-90);
+        item.back->setPos(at.x() + 1, area.top() + 6 + box.width());
     }
 }
 
 std::vector<QString> SignalPlotWindow::shownMarks() const {
     std::vector<QString> texts;
-    for (std::size_t i = 0; i < shownMarks_; ++i) texts.push_back(marks_[i].text->text());
+    for (std::size_t i = 0; i < shownMarks_; ++i) texts.push_back(marks_[i].text->toolTip());
     return texts;
 }
 
@@ -271,7 +305,15 @@ QLineSeries* SignalPlotWindow::seriesOf(const std::string& key) const {
 }
 
 bool SignalPlotWindow::exportCsv(const QString& path, std::string* error) const {
-    return false;
+    // The command line's CSV of the whole session; the file appears only once complete.
+    const std::string text = SignalCsvWriter(sampler_.keys(), false).fromSeries(sampler_.series());
+    QSaveFile file(path);
+    if (!file.open(QIODevice::WriteOnly) || file.write(text.data(), qint64(text.size())) != qint64(text.size()) ||
+        !file.commit()) {
+        if (error) *error = path.toStdString() + ": " + file.errorString().toStdString();
+        return false;
+    }
+    return true;
 }
 
 void SignalPlotWindow::exportPressed() {

@@ -12,6 +12,7 @@
 class QChart;
 class QChartView;
 class QDateTimeAxis;
+class QGraphicsRectItem;
 class QGraphicsSimpleTextItem;
 class QLabel;
 class QLineSeries;
@@ -56,18 +57,21 @@ public:
 
 private:
     struct Line {
-        QLineSeries* series = nullptr;
+        QLineSeries* series = nullptr;       // the first piece, and the legend's entry
+        std::vector<QLineSeries*> pieces;    // the pieces after a gap, in the same colour
         QValueAxis* axis = nullptr;
         QString label;
         std::string unit;
     };
     struct MarkItem {
         QLineSeries* line = nullptr;
+        QGraphicsRectItem* back = nullptr;        // holds the text
         QGraphicsSimpleTextItem* text = nullptr;
         int64_t timeMs = 0;
     };
 
     void addLine(const std::string& key);
+    QLineSeries* newSeries(QValueAxis* axis, bool inLegend);
     QValueAxis* axisFor(const std::string& unit);
     void draw();
     void placeMarkTexts();
