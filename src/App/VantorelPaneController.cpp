@@ -241,7 +241,9 @@ void VantorelPaneController::createToolbarItems() {
         tableItem_->setToolTip(tr("Show the list as a sortable table"));
         tableItem_->setCheckable(true);
         tableItem_->setChecked(showsTable_);
-        connect(tableItem_, &QAction::toggled, this, [this](bool on) { setShowsTable(on); });
+        // Only the user's click changes the setting: a list that empties for a tick unchecks the
+        // item without changing the choice.
+        connect(tableItem_, &QAction::triggered, this, [this](bool on) { setShowsTable(on); });
     }
 
     // 5. The save button, on internal installs only.

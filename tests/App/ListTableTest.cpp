@@ -105,6 +105,9 @@ TEST(ListTablePane, TheTableChoiceIsRememberedEnterDrillsIntoTheEntryAndOnlyNumb
     pane->tableItem()->trigger();
     VantorelPaneController again(child(root, "Neighbours"), "/Neighbours", &app);
     EXPECT_TRUE(again.showsTable());  // remembered
+    again.reloadWithNode(child(neighbours({}), "Neighbours"));  // a tick without neighbours
+    again.reloadWithNode(child(root, "Neighbours"));
+    EXPECT_TRUE(again.showsTable());
     ListTableView& table = *again.listTableView();
     EXPECT_EQ(offered(table.model()->index(1, 1), &again), "/Neighbours/1/RSRP");
 
