@@ -67,7 +67,7 @@ void VantorelApp::applicationWillTerminate() {
         _saveViewController->deleteLater();
         _saveViewController = nullptr;
     }
-    plotWindow_.reset();
+    plotWindow_ = nullptr;  // deleted with the window
     if (_window) _window->hide();
     _window.reset();
     _navController = nullptr;
@@ -166,12 +166,13 @@ void VantorelApp::sampleSignals() {
 }
 
 void VantorelApp::showSignalPlot() {
+    if (!_window) return;
     if (!plotWindow_) {
         // The unit of a key is the one its display string shows now.
-        plotWindow_ = std::make_unique<SignalPlotWindow>(sampler_, [this](const std::string& key) {
+        plotWindow_ = new SignalPlotWindow(sampler_, [this](const std::string& key) {
             const NodeRef leaf = model() ? model()->nodeAtPath(key) : nullptr;
             return leaf && leaf->value() ? SignalPlotWindow::unitOf(*leaf->value()) : std::string();
-        });
+        }, _window.get());
     }
     plotWindow_->refresh();
     plotWindow_->show();

@@ -67,7 +67,7 @@ public:
     VantorelSaveViewController* saveViewController() const { return _saveViewController; }
     VantorelModel* model() const { return launcher_ ? launcher_->model() : nullptr; }
     const SignalSampler& signalSampler() const { return sampler_; }
-    SignalPlotWindow* signalPlotWindow() const { return plotWindow_.get(); }
+    SignalPlotWindow* signalPlotWindow() const { return plotWindow_; }
 
 private:
     std::unique_ptr<QMainWindow> _window;
@@ -83,7 +83,8 @@ private:
     std::string savedPath_;        // shown instead of the status for a few seconds after a save
     int saveNotices_ = 0;          // the newest notice's number, so an older timer leaves it alone
     SignalSampler sampler_;        // sampled for the whole session, whether the plot is open or not
-    std::unique_ptr<SignalPlotWindow> plotWindow_;
+    // A window of its own owned by the main window: closing the main window still quits.
+    SignalPlotWindow* plotWindow_ = nullptr;
 };
 
 }  // namespace vantorel

@@ -128,6 +128,7 @@ TEST(Screenshots, TenMinutesOfTheLTEModemAsASignalPlotWithHandoversAndANeighbour
         nav.topPane()->didSelectRowAtIndexPath(panetest::rowOf(*nav.topPane(), name));
     nav.topPane()->setShowsTable(true);
     nav.topPane()->listTableView()->selectEntry(1);
+    nav.topPane()->listTableView()->sortByColumn(1, Qt::DescendingOrder);  // strongest first
     EXPECT_GT(nav.topPane()->listTableView()->model()->rowCount(), 1);
     shoot(app, "neighbour-table.png");
     clock.frozen.reset();
