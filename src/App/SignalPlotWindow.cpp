@@ -220,7 +220,9 @@ void SignalPlotWindow::draw() {
             line.pieces[i]->replace(i + 1 < pieces.size() ? pieces[i + 1] : QList<QPointF>());
         }
         const std::optional<double> latest = series.latest(key);
-        line.series->setName(latest ? QStringLiteral("%1  %2 %3").arg(line.label).arg(*latest, 0, 'g', 4).arg(QString::fromStdString(line.unit))
+        // The legend shows each value's latest reading beside its name.
+        const QString unit = QString::fromStdString(line.unit);
+        line.series->setName(latest ? QStringLiteral("%1  %2 %3").arg(line.label).arg(*latest, 0, 'g', 4).arg(unit)
                                     : line.label);
     }
     for (auto& [axis, range] : ranges) {
@@ -269,7 +271,6 @@ void SignalPlotWindow::draw() {
     }
     placeMarkTexts();
 
-    const QLocale locale;
     hint_->setText(lines_.empty() ? tr("Waiting for values: they are read at every display tick.")
                                   : tr("%1 \u2013 %2 \u00b7 session from %3")
                                         .arg(QDateTime::fromMSecsSinceEpoch(start_).toString("HH:mm:ss"),

@@ -161,7 +161,9 @@ namespace vantorel {
 void VantorelApp::sampleSignals() {
     VantorelModel* m = model();
     if (!m) return;
-    sampler_.sample(std::chrono::duration_cast<std::chrono::milliseconds>(MonitorClock::current().now().time_since_epoch()).count(), m->sourceStatus().decoderTechnology, m->pathIndex());
+    const auto now = MonitorClock::current().now().time_since_epoch();
+    sampler_.sample(std::chrono::duration_cast<std::chrono::milliseconds>(now).count(),
+                    m->sourceStatus().decoderTechnology, m->pathIndex());
     if (plotWindow_ && plotWindow_->isVisible()) plotWindow_->refresh();
 }
 
