@@ -29,9 +29,10 @@ GpsPosition::GpsPosition(std::string host, std::string port, QObject* parent)
 }
 
 GpsPosition::~GpsPosition() {
+    // No WATCH_DISABLE: gpsd ends the watch when the socket closes, and a write to a
+    // gpsd that has just gone would raise SIGPIPE.
     if (data_) {
         delete notifier_;
-        gps_stream(data_.get(), WATCH_DISABLE, nullptr);
         gps_close(data_.get());
     }
 }

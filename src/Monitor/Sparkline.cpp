@@ -46,9 +46,12 @@ std::string Sparkline::bars(const std::deque<std::optional<double>>& values) {
             out += ' ';
             continue;
         }
-        // A flat line sits in the middle; otherwise the range fills all eight heights.
-        const int level = high > low ? static_cast<int>(std::lround((*v - low) / (high - low) * 7)) : 3;
-        out += kBars[std::clamp(level, 0, 7)];
+        // A flat line sits in the middle; otherwise the range fills all eight heights
+        // (halved first, so that a range wider than a double's still scales).
+        double share = 3.0 / 7;
+        if (high > low) share = (*v / 2 - low / 2) / (high / 2 - low / 2);
+        if (!std::isfinite(share)) share = 3.0 / 7;
+        out += kBars[std::clamp(static_cast<int>(std::lround(std::clamp(share, 0.0, 1.0) * 7)), 0, 7)];
     }
     return out;
 }

@@ -13,18 +13,18 @@ namespace vantorel {
 
 void SignalExport::addOptions(QCommandLineParser& parser, bool live) {
     parser.addOption({"csv",
-                      live ? "Write the plotted values to FILE as CSV, one row per display tick\n"
-                             "(wall-clock time, flushed at once)."
-                           : "Write the plotted values to FILE as CSV, one row per 2 s of recorded\n"
-                             "time that brought messages (stamped with the tick's recorded time).",
+                      live ? "Write the signal values to FILE as CSV, one row per display tick (wall-clock time, "
+                             "each row flushed)."
+                           : "Write the signal values to FILE as CSV, one row per 2 s of recorded time that "
+                             "brought messages, stamped with that recorded time.",
                       "FILE"});
     parser.addOption({"csv-keys",
-                      "Comma-separated display paths to write (\"/Serving Cell/Serving Cell\n"
+                      "The CSV's columns: display paths separated by commas (\"/Serving Cell/Serving Cell "
                       "Measurements/Measured RSRP\"); default: the technology's signal values.",
                       "KEYS"});
     if (live)
-        parser.addOption({"gps", "Add latitude, longitude and speed (m/s) columns from gpsd on\n"
-                                 "localhost:2947; empty without a fix or without gpsd."});
+        parser.addOption({"gps", "Add latitude, longitude and speed (m/s) columns to the CSV from gpsd on "
+                                 "localhost:2947; empty while there is no fix or no gpsd."});
 }
 
 std::vector<std::string> SignalExport::splitKeys(const QString& list) {

@@ -25,8 +25,8 @@ int WatchCommand::run(const QStringList& args) {
     MonitorLauncher::addOptions(parser);
     SignalExport::addOptions(parser, true);
     parser.addOption({"plot",
-                      "Draw a sparkline of the value at this display path under the status\n"
-                      "line (the last 40 display ticks); repeat for several values.",
+                      "Draw a sparkline of the value at this display path (the last 40 display ticks) "
+                      "under the status line; repeat for several values.",
                       "KEY"});
     parser.addOption({"verbose", "Mirror the system log to stderr."});
     parser.process(QStringList{"vantorel-cli watch"} + args);

@@ -1,0 +1,70 @@
+// Tests `vantorel-cli decode --csv`: rows on the recorded 2 s ticks of real captures, chosen keys, and option misuse.
+#include "cli/DecodeCommand.h"
+
+#include "support/CommandOutput.h"
+
+#include <QDateTime>
+#include <QFile>
+#include <QTemporaryDir>
+#include <gtest/gtest.h>
+
+using vantorel::testing::CommandOutput;
+
+namespace {
+
+CommandOutput decode(const QStringList& args) { return vantorel::testing::runCommand(&vantorel::DecodeCommand::run, args); }
+
+QStringList csvLines(const QString& path) {
+    QFile file(path);
+    if (!file.open(QIODevice::ReadOnly)) return {};
+    return QString::fromUtf8(file.readAll()).split("\r\n", Qt::SkipEmptyParts);
+}
+
+const QString kCaptures = VANTOREL_CAPTURES_DIR;
+
+}  // namespace
+
+TEST(SignalCsv, AReplayGivesOneRowPerRecordedTickWithTheSignalColumns) {
+    QTemporaryDir dir;
+    const QString out = dir.filePath("cmcc.csv");
+    CommandOutput run = decode({"--technology", "lte", "--csv", out, kCaptures + "/cmcc.mi2log"});
+    ASSERT_EQ(run.code, 0) << run.err;
+    const QStringList lines = csvLines(out);
+    ASSERT_GT(lines.size(), 1000);  // 2 h 48 min of recording with gaps
+    EXPECT_TRUE(lines[0].startsWith("time,/Serving Cell/Serving Cell Measurements/Measured RSRP,")) << lines[0].toStdString();
+    const qsizetype columns = lines[0].count(',');
+    qint64 previous = 0;
+    for (const QString& line : lines.mid(1)) {
+        const QDateTime time = QDateTime::fromString(line.section(',', 0, 0), Qt::ISODateWithMs);
+        ASSERT_TRUE(time.isValid()) << line.toStdString();
+        ASSERT_EQ(line.count(','), columns);
+        // Ticks 2 s apart from the first message (02:11:40.985), rising.
+        ASSERT_EQ((time.toMSecsSinceEpoch() - 1438395100985) % 2000, 0) << line.toStdString();
+        ASSERT_GT(time.toMSecsSinceEpoch(), previous);
+        previous = time.toMSecsSinceEpoch();
+    }
+    EXPECT_EQ(lines[1].section(',', 0, 0), "2015-08-01T02:11:42.985Z");
+
+    // A capture with measurements fills the RSRP column; chosen keys replace the defaults.
+    const QString measured = dir.filePath("measured.csv");
+    run = decode({"--technology", "lte", "--csv", measured, "--csv-keys",
+                  "/Serving Cell/Serving Cell Measurements/Measured RSRP, /No Such/Key",
+                  kCaptures + "/offline_log_example.mi2log"});
+    ASSERT_EQ(run.code, 0) << run.err;
+    EXPECT_EQ(csvLines(measured), (QStringList{"time,/Serving Cell/Serving Cell Measurements/Measured RSRP,/No Such/Key",
+                                               "2016-03-23T21:55:50.881Z,-96.56,"}));
+    EXPECT_NE(run.err.find("--csv-keys (their columns are empty):\n  /No Such/Key\n"), std::string::npos) << run.err;
+}
+
+TEST(SignalCsv, MisuseIsRefusedBeforeDecoding) {
+    const std::pair<QStringList, const char*> rows[] = {
+        {{"--csv-keys", "/a"}, "--csv-keys needs --csv FILE"},
+        {{"--csv", "/nonexistent/dir/out.csv"}, "/nonexistent/dir/out.csv: "},
+        {{"--csv", "/tmp/unused.csv", "--csv-keys", " , "}, "--csv-keys names no key"},
+    };
+    for (const auto& [args, error] : rows) {
+        CommandOutput run = decode(args + QStringList{"--technology", "lte", kCaptures + "/cmcc.mi2log"});
+        EXPECT_EQ(run.code, 2);
+        EXPECT_NE(run.err.find(error), std::string::npos) << run.err;
+    }
+}
