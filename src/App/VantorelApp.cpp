@@ -2,8 +2,10 @@
 #include "App/VantorelApp.h"
 
 #include "App/NavigationController.h"
+#include "App/SignalPlotWindow.h"
 #include "App/VantorelPaneController.h"
 #include "App/VantorelSaveViewController.h"
+#include "Model/MonitorClock.h"
 #include "Model/VantorelModel.h"
 #include "Monitor/StatusText.h"
 #include "Platform/Preferences.h"
@@ -53,6 +55,7 @@ bool VantorelApp::applicationDidFinishLaunching(std::string* error) {
     // Creates the model and queues restartMonitor on the main queue: connecting
     // starts after launch returns.
     if (!launcher_->start(options_.source, this, error)) return false;
+    connect(model(), &VantorelModel::displayTicked, this, &VantorelApp::sampleSignals);
     return true;
 }
 
@@ -64,6 +67,7 @@ void VantorelApp::applicationWillTerminate() {
         _saveViewController->deleteLater();
         _saveViewController = nullptr;
     }
+    plotWindow_ = nullptr;  // deleted with the window
     if (_window) _window->hide();
     _window.reset();
     _navController = nullptr;
@@ -148,6 +152,39 @@ void VantorelApp::closeSaveView() {
     _saveViewController->hide();
     _saveViewController->deleteLater();
     _saveViewController = nullptr;
+}
+
+}  // namespace vantorel
+
+namespace vantorel {
+
+void VantorelApp::sampleSignals() {
+    VantorelModel* m = model();
+    if (!m) return;
+    const auto now = MonitorClock::current().now().time_since_epoch();
+    sampler_.sample(std::chrono::duration_cast<std::chrono::milliseconds>(now).count(),
+                    m->sourceStatus().decoderTechnology, m->pathIndex());
+    if (plotWindow_ && plotWindow_->isVisible()) plotWindow_->refresh();
+}
+
+void VantorelApp::showSignalPlot() {
+    if (!_window) return;
+    if (!plotWindow_) {
+        // The unit of a key is the one its display string shows now.
+        plotWindow_ = new SignalPlotWindow(sampler_, [this](const std::string& key) {
+            const NodeRef leaf = model() ? model()->nodeAtPath(key) : nullptr;
+            return leaf && leaf->value() ? SignalPlotWindow::unitOf(*leaf->value()) : std::string();
+        }, _window.get());
+    }
+    plotWindow_->refresh();
+    plotWindow_->show();
+    plotWindow_->raise();
+    plotWindow_->activateWindow();
+}
+
+void VantorelApp::plotValue(const std::string& path) {
+    sampler_.addKey(path);
+    showSignalPlot();
 }
 
 }  // namespace vantorel

@@ -1,9 +1,10 @@
-// VantorelApp: the application object and its own delegate: launch and exit, the preferences, the status line, refreshing the panes, and the save screen.
+// VantorelApp: the application object and its own delegate: launch and exit, the preferences, the status line, refreshing the panes, the save screen and the signal plot.
 #pragma once
 
 #include "App/NavigationControllerDelegate.h"
 #include "App/PaneApplication.h"
 #include "Model/ApplicationObject.h"
+#include "Model/SignalSampler.h"
 #include "Monitor/MonitorLauncher.h"
 
 #include <QDateTime>
@@ -17,6 +18,7 @@ class QMainWindow;
 namespace vantorel {
 
 class NavigationController;
+class SignalPlotWindow;
 class VantorelModel;
 class VantorelPaneController;
 class VantorelSaveViewController;
@@ -54,12 +56,18 @@ public:
     void showSaveView() override;
     void closeSaveView() override;
     bool allowSaveButton() const override { return _allowSaveButton; }
+    void showSignalPlot() override;
+    void plotValue(const std::string& path) override;
+    // Takes the plotted values from the display tree; run at every display tick.
+    void sampleSignals();
 
     // Properties and observers.
     QMainWindow* window() const { return _window.get(); }
     NavigationController* navigationController() const { return _navController; }
     VantorelSaveViewController* saveViewController() const { return _saveViewController; }
     VantorelModel* model() const { return launcher_ ? launcher_->model() : nullptr; }
+    const SignalSampler& signalSampler() const { return sampler_; }
+    SignalPlotWindow* signalPlotWindow() const { return plotWindow_; }
 
 private:
     std::unique_ptr<QMainWindow> _window;
@@ -74,6 +82,9 @@ private:
     QDateTime updatedAt_;
     std::string savedPath_;        // shown instead of the status for a few seconds after a save
     int saveNotices_ = 0;          // the newest notice's number, so an older timer leaves it alone
+    SignalSampler sampler_;        // sampled for the whole session, whether the plot is open or not
+    // A window of its own owned by the main window: closing the main window still quits.
+    SignalPlotWindow* plotWindow_ = nullptr;
 };
 
 }  // namespace vantorel

@@ -2,15 +2,21 @@
 #include "App/VantorelPaneController.h"
 
 #include "App/ActivityIndicator.h"
+#include "App/ListTableModel.h"
+#include "App/ListTableView.h"
 #include "App/NavigationController.h"
 #include "App/PaneApplication.h"
 #include "App/VantorelCell.h"
+#include "Model/SignalValue.h"
+#include "Platform/Preferences.h"
 
 #include <QAction>
 #include <QApplication>
 #include <QHeaderView>
 #include <QKeyEvent>
 #include <QLabel>
+#include <QMenu>
+#include <QSortFilterProxyModel>
 #include <QStyle>
 #include <QTableWidget>
 #include <QToolBar>
@@ -32,7 +38,8 @@ VantorelPaneController::VantorelPaneController(NodeRef node, std::string atPath,
       _keyPath(std::move(atPath)),
       application_(application),
       table_(new QTableWidget(this)),
-      toolbar_(new QToolBar(this)) {
+      toolbar_(new QToolBar(this)),
+      listView_(new ListTableView(this)) {
     table_->setColumnCount(1);
     table_->horizontalHeader()->hide();
     table_->horizontalHeader()->setStretchLastSection(true);
@@ -53,6 +60,15 @@ VantorelPaneController::VantorelPaneController(NodeRef node, std::string atPath,
         didSelectRowAtIndexPath(index.isValid() ? std::optional<int>(index.row()) : std::nullopt);
     });
 
+    listView_->hide();
+    connect(listView_, &ListTableView::entryActivated, this, [this](int entry) { didSelectRowAtIndexPath(entry); });
+    for (QAbstractItemView* view : {static_cast<QAbstractItemView*>(table_), static_cast<QAbstractItemView*>(listView_)}) {
+        view->setContextMenuPolicy(Qt::CustomContextMenu);
+        connect(view, &QWidget::customContextMenuRequested, this, [this, view](const QPoint& pos) {
+            if (QMenu* menu = contextMenu(view->indexAt(pos))) menu->popup(view->viewport()->mapToGlobal(pos));
+        });
+    }
+
     toolbar_->setMovable(false);
     toolbar_->setFloatable(false);
     toolbar_->setToolButtonStyle(Qt::ToolButtonTextBesideIcon);
@@ -61,11 +77,13 @@ VantorelPaneController::VantorelPaneController(NodeRef node, std::string atPath,
     layout->setContentsMargins(0, 0, 0, 0);
     layout->setSpacing(0);
     layout->addWidget(table_, 1);
+    layout->addWidget(listView_, 1);
     layout->addWidget(toolbar_);
     setFocusProxy(table_);
 
     updateTitle();
     reloadData();
+    updateListView();
     createToolbarItems();
 }
 
@@ -82,7 +100,9 @@ void VantorelPaneController::updateTitle() {
 void VantorelPaneController::viewWillAppear() {
     // Base behaviour of the platform's table pane: no row stays selected.
     table_->clearSelection();
+    listView_->clearSelection();
     updateTitle();
+    updateListView();  // the setting may have changed on another pane
     toolbar_->setVisible(true);
     createToolbarItems();
 }
@@ -107,10 +127,12 @@ void VantorelPaneController::reloadWithNode(NodeRef node) {
     if (current.isValid() && current.row() < numberOfRowsInSection())
         currentName = _nodes->childNodes()->at(std::size_t(current.row()))->displayName();
 
+    const bool wasList = ListTableModel::isList(_nodes);
     _nodes = std::move(node);
     updateTitle();
     reloadData();
-    createToolbarItems();
+    updateListView();
+    if (wasList != ListTableModel::isList(_nodes)) createToolbarItems();
 
     const std::vector<NodeRef>* children = _nodes ? _nodes->childNodes() : nullptr;
     for (std::size_t row = 0; currentName && children && row < children->size(); ++row) {
@@ -126,6 +148,50 @@ void VantorelPaneController::setStale(bool stale) {
     if (stale == stale_) return;
     stale_ = stale;
     for (VantorelCell* cell : rowCells_) cell->setEnabled(!stale_);
+    listView_->setEnabled(!stale_);
+}
+
+void VantorelPaneController::setShowsTable(bool shown) {
+    Preferences::setOwnBool(kListTablesPreference, shown);
+    updateListView();
+}
+
+void VantorelPaneController::updateListView() {
+    const bool table = ListTableModel::isList(_nodes) && Preferences::ownBool(kListTablesPreference).value_or(false);
+    if (table) listView_->setList(_nodes);
+    if (tableItem_) tableItem_->setChecked(table);
+    if (table == showsTable_) return;
+    showsTable_ = table;
+    if (!table) listView_->setList(nullptr);
+    const bool focused = hasFocus() || (focusProxy() && focusProxy()->hasFocus());
+    table_->setVisible(!table);
+    listView_->setVisible(table);
+    setFocusProxy(table ? static_cast<QWidget*>(listView_) : table_);
+    if (focused) setFocus();
+}
+
+QMenu* VantorelPaneController::contextMenu(const QModelIndex& index) {
+    if (!_nodes || !index.isValid()) return nullptr;
+    NodeRef leaf;
+    std::string path;
+    if (index.model() == table_->model()) {
+        if (index.row() >= numberOfRowsInSection()) return nullptr;
+        leaf = _nodes->childNodes()->at(std::size_t(index.row()));
+        path = VantorelModelNode::childPath(_keyPath, leaf->displayName());
+    } else if (const int entry = listView_->entryAt(index); entry >= 0) {
+        const NodeRef row = listView_->listModel()->entry(entry);
+        const std::string& key = listView_->listModel()->key(listView_->sortModel()->mapToSource(index).column());
+        for (const NodeRef& child : *row->childNodes())
+            if (child->displayName() == key) leaf = child;
+        path = VantorelModelNode::childPath(VantorelModelNode::childPath(_keyPath, row->displayName()), key);
+    }
+    if (!leaf || !leaf->value() || !SignalValue::parse(*leaf->value()) || !application_) return nullptr;
+    auto* menu = new QMenu(this);
+    menu->setAttribute(Qt::WA_DeleteOnClose);
+    PaneApplication* application = application_;
+    connect(menu->addAction(tr("Plot this value")), &QAction::triggered, this,
+            [application, path] { application->plotValue(path); });
+    return menu;
 }
 
 void VantorelPaneController::createToolbarItems() {
@@ -161,7 +227,26 @@ void VantorelPaneController::createToolbarItems() {
     space->setSizePolicy(QSizePolicy::Expanding, QSizePolicy::Preferred);
     toolbar_->addWidget(space);
 
-    // 4. The save button, on internal installs only.
+    // 4. The signal plot, and the table toggle on a list.
+    signalItem_ = nullptr;
+    if (application_) {
+        signalItem_ = toolbar_->addAction(tr("Signal"));
+        signalItem_->setToolTip(tr("Plot the signal values over time"));
+        PaneApplication* application = application_;
+        connect(signalItem_, &QAction::triggered, this, [application] { application->showSignalPlot(); });
+    }
+    tableItem_ = nullptr;
+    if (ListTableModel::isList(_nodes)) {
+        tableItem_ = toolbar_->addAction(tr("Table"));
+        tableItem_->setToolTip(tr("Show the list as a sortable table"));
+        tableItem_->setCheckable(true);
+        tableItem_->setChecked(showsTable_);
+        // Only the user's click changes the setting: a list that empties for a tick unchecks the
+        // item without changing the choice.
+        connect(tableItem_, &QAction::triggered, this, [this](bool on) { setShowsTable(on); });
+    }
+
+    // 5. The save button, on internal installs only.
     saveItem_ = nullptr;
     if (application_ && application_->allowSaveButton()) {
         saveItem_ = toolbar_->addAction(style()->standardIcon(QStyle::SP_DialogSaveButton), tr("Save"));
@@ -174,7 +259,8 @@ void VantorelPaneController::fitStatus() {
     if (!statusLabel_) return;
     const QString full = QString::fromStdString(_status);
     // The room the indicator, the save button and the toolbar's margins leave.
-    const int reserved = 24 + (_isLoading ? 32 : 0) + (application_ && application_->allowSaveButton() ? 96 : 0);
+    const int reserved = 24 + (_isLoading ? 32 : 0) + (application_ ? 64 : 0) + (ListTableModel::isList(_nodes) ? 56 : 0) +
+                         (application_ && application_->allowSaveButton() ? 96 : 0);
     const int room = std::max(80, width() - reserved);
     statusLabel_->setText(statusLabel_->fontMetrics().elidedText(full, Qt::ElideRight, room));
     statusLabel_->setToolTip(statusLabel_->text() == full ? QString() : full);

@@ -1,4 +1,4 @@
-// VantorelPaneController: one level of the display tree as a table pane with its toolbar (status, activity, save).
+// VantorelPaneController: one level of the display tree as a table pane with its toolbar (status, activity, signal plot, list table, save).
 #pragma once
 
 #include "Model/VantorelModelNode.h"
@@ -12,12 +12,15 @@
 
 class QAction;
 class QLabel;
+class QMenu;
+class QModelIndex;
 class QTableWidget;
 class QToolBar;
 
 namespace vantorel {
 
 class ActivityIndicator;
+class ListTableView;
 class NavigationController;
 class PaneApplication;
 class VantorelCell;
@@ -56,9 +59,21 @@ public:
     // `reloadWithNode:`: replaces the node (nullptr allowed), the title, the rows and
     // the toolbar. The current row follows its name, not its index.
     void reloadWithNode(NodeRef node);
-    // Rebuilds the toolbar: activity indicator, status label, flexible space, and the
-    // save button only when the application allows it.
+    // Rebuilds the toolbar: activity indicator, status label, flexible space, the signal
+    // plot button, the table toggle on a list pane, and the save button only when the
+    // application allows it.
     void createToolbarItems();
+
+    // A list of dictionaries (ListTableModel::isList) can be shown as a table instead of
+    // its rows of indices. The choice is one setting for every list pane, kept in the
+    // preferences.
+    static constexpr const char* kListTablesPreference = "ListTables";
+    bool showsTable() const { return showsTable_; }
+    void setShowsTable(bool shown);
+    ListTableView* listTableView() const { return listView_; }
+    // The context menu of a row (of the rows view) or a cell (of the table view): "Plot
+    // this value" when the leaf there reads as a number; nullptr when nothing is offered.
+    QMenu* contextMenu(const QModelIndex& index);
 
     // The table's data source and delegate, by row (the index path's last index).
     int numberOfRowsInSection() const;
@@ -84,6 +99,8 @@ public:
     QAction* activityIndicatorItem() const { return activityIndicatorItem_; }
     QLabel* statusLabel() const { return statusLabel_; }
     QAction* saveItem() const { return saveItem_; }  // nullptr without the save button
+    QAction* signalItem() const { return signalItem_; }
+    QAction* tableItem() const { return tableItem_; }  // nullptr unless the pane is a list
 
 signals:
     void titleChanged();
@@ -97,12 +114,15 @@ private:
     // Fits the status into the toolbar's room (elided, whole in the tooltip), so that
     // a long status never pushes the save button into the toolbar's overflow menu.
     void fitStatus();
+    // Shows the rows or the table, as the node and the setting say, and refills the table.
+    void updateListView();
 
     NodeRef _nodes;
     std::string _keyPath;
     std::string _status;
     bool _isLoading = true;
     bool stale_ = false;
+    bool showsTable_ = false;
 
     PaneApplication* application_;
     NavigationController* navigationController_ = nullptr;
@@ -115,6 +135,9 @@ private:
     QAction* activityIndicatorItem_ = nullptr;
     QLabel* statusLabel_ = nullptr;
     QAction* saveItem_ = nullptr;
+    QAction* signalItem_ = nullptr;
+    QAction* tableItem_ = nullptr;
+    ListTableView* listView_;
 };
 
 }  // namespace vantorel

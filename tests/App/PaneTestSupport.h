@@ -23,9 +23,12 @@ public:
     bool allowSaveButton() const override { return allowSave; }
     void showSaveView() override { ++showSaveViewCalls; }
     void closeSaveView() override { ++closeSaveViewCalls; }
+    void showSignalPlot() override {}
+    void plotValue(const std::string& path) override { plotted.push_back(path); }
     bool allowSave;
     int showSaveViewCalls = 0;
     int closeSaveViewCalls = 0;
+    std::vector<std::string> plotted;
 };
 
 // A dictionary holding `entries` in order.

@@ -1,17 +1,23 @@
-// Screenshots (PNG) of the window for a person to look at, under build/<dir>/screenshots/: the emulator streaming (root and a drilled-down pane), a replay finished, and a lost service with its stale rows.
+// Screenshots (PNG) of the window for a person to look at, under build/<dir>/screenshots/: the emulator streaming (root and a drilled-down pane), a replay finished, a lost service with its stale rows, and ten minutes of the LTE modem as a signal plot and a neighbour table.
+#include "App/ListTableView.h"
 #include "App/NavigationController.h"
+#include "App/SignalPlotWindow.h"
 #include "App/VantorelApp.h"
 #include "Model/VantorelModel.h"
 #include "PaneTestSupport.h"
 #include "Platform/Preferences.h"
 #include "Platform/RecordBuilder.h"
 #include "PropertyList/Dictionary.h"
+#include "TelephonyService/EmulatorBackend.h"
+#include "TelephonyService/Emulator/EmulatorScenario.h"
 #include "support/EventLoopWait.h"
+#include "support/FastMonitorClock.h"
 #include "support/FakeTelephonyService.h"
 
 #include <QDir>
 #include <QMainWindow>
 #include <QTemporaryDir>
+#include <QTimer>
 #include <gtest/gtest.h>
 
 using namespace vantorel;
@@ -19,11 +25,12 @@ using namespace vantorel::testing;
 
 namespace {
 
-void shoot(VantorelApp& app, const char* file) {
+void shoot(QWidget* window, const char* file) {
     QDir().mkpath(VANTOREL_SCREENSHOT_DIR);
     spin(300);
-    EXPECT_TRUE(app.window()->grab().save(QDir(VANTOREL_SCREENSHOT_DIR).filePath(file), "PNG"));
+    EXPECT_TRUE(window->grab().save(QDir(VANTOREL_SCREENSHOT_DIR).filePath(file), "PNG"));
 }
+void shoot(VantorelApp& app, const char* file) { shoot(app.window(), file); }
 
 MonitorLauncher::Source sourceOf(const std::string& emulate, const std::string& service) {
     MonitorLauncher::Source source;
@@ -83,4 +90,46 @@ TEST(Screenshots, AReplayFinishedThenTheServiceLostWithItsRowsGreyed) {
     ASSERT_TRUE(waitUntil([&] { return root.status().rfind("disconnected since ", 0) == 0; }, 3000));
     EXPECT_TRUE(root.isStale());
     shoot(app, "disconnected.png");
+}
+
+TEST(Screenshots, TenMinutesOfTheLTEModemAsASignalPlotWithHandoversAndANeighbourTable) {
+    // The modem's scenario is played one tick per display tick on a clock that moves two
+    // seconds a tick: ten minutes of plot in a few seconds.
+    FakeTelephonyService service({.technology = kTSLogChannelTechnology_Morvek_LTE});
+    std::string error;
+    std::unique_ptr<EmulatorScenario> modem = EmulatorBackend::scenarioFor("lte", &error);
+    FastMonitorClock& clock = FastMonitorClock::installed();
+    clock.frozen = std::chrono::system_clock::from_time_t(1777888800);
+    uint64_t tick = 0, samples = 0;
+    Launched launched(sourceOf("", service.name()));
+    VantorelApp& app = launched.app;
+    ASSERT_TRUE(waitUntil([&] { return app.model()->isRunning(); }, 3000));
+    QObject::connect(app.model(), &VantorelModel::displayTicked, &app, [&] {
+        *clock.frozen += std::chrono::seconds(2);
+        ++samples;
+    });
+    QTimer modemTicks;
+    QObject::connect(&modemTicks, &QTimer::timeout, [&] {
+        for (const Bytes& record : modem->recordsForTick(tick++)) service.send(record);
+    });
+    modemTicks.start(FastMonitorClock::kTick);
+    ASSERT_TRUE(waitUntil([&] { return samples > 330; }, 60000));
+    modemTicks.stop();  // no new data: no more ticks move the clock
+    spin(200);
+
+    app.showSignalPlot();
+    SignalPlotWindow& plot = *app.signalPlotWindow();
+    plot.resize(900, 520);
+    EXPECT_FALSE(plot.shownMarks().empty());
+    shoot(&plot, "signal-plot.png");
+
+    NavigationController& nav = *app.navigationController();
+    for (const char* name : {"Neighbours", "Measured Neighbor Cells"})
+        nav.topPane()->didSelectRowAtIndexPath(panetest::rowOf(*nav.topPane(), name));
+    nav.topPane()->setShowsTable(true);
+    nav.topPane()->listTableView()->selectEntry(1);
+    nav.topPane()->listTableView()->sortByColumn(1, Qt::DescendingOrder);  // strongest first
+    EXPECT_GT(nav.topPane()->listTableView()->model()->rowCount(), 1);
+    shoot(app, "neighbour-table.png");
+    clock.frozen.reset();
 }

@@ -1,0 +1,54 @@
+// ListTableModel: a list of dictionaries in the display tree (neighbours, cell sets, PDP contexts) as rows and columns.
+#pragma once
+
+#include "Model/VantorelModelNode.h"
+
+#include <QAbstractTableModel>
+
+#include <string>
+#include <vector>
+
+class QSortFilterProxyModel;
+
+namespace vantorel {
+
+// One row per entry ("0", "1", ... in the tree), one column per leaf key, the union of the
+// entries' keys in the order they are first seen. Nested dictionaries of an entry are not
+// columns: they are reached by drilling into the entry.
+class ListTableModel : public QAbstractTableModel {
+    Q_OBJECT
+public:
+    // The leaves that name a cell or a context, in the order they count for an entry's
+    // identity: a row stays selected across refreshes by these, not by its index.
+    static const std::vector<std::string>& identityKeys();
+    // True for a node whose children are the entries "0".."n-1" (at least one), each a
+    // dictionary with at least one leaf.
+    static bool isList(const NodeRef& node);
+    // A sort model over a ListTableModel: numbers by value (SignalValue) when both cells
+    // hold one, text otherwise.
+    static QSortFilterProxyModel* makeSortModel(QObject* parent);
+
+    explicit ListTableModel(QObject* parent = nullptr);
+
+    // Replaces the list (a reset); a node that is not a list gives an empty table.
+    void setList(NodeRef node);
+    const NodeRef& list() const { return list_; }
+    NodeRef entry(int row) const;
+    const std::string& key(int column) const { return keys_.at(std::size_t(column)); }
+    // The entry's identity leaves as "key=value" pairs, or its index name without any.
+    std::string identity(int row) const;
+    int rowOfIdentity(const std::string& id) const;  // -1 when no entry has it
+
+    int rowCount(const QModelIndex& parent = QModelIndex()) const override;
+    int columnCount(const QModelIndex& parent = QModelIndex()) const override;
+    QVariant data(const QModelIndex& index, int role = Qt::DisplayRole) const override;
+    QVariant headerData(int section, Qt::Orientation orientation, int role = Qt::DisplayRole) const override;
+
+private:
+    const std::string* leaf(int row, const std::string& key) const;
+
+    NodeRef list_;
+    std::vector<std::string> keys_;
+};
+
+}  // namespace vantorel

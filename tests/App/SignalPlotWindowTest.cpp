@@ -1,0 +1,52 @@
+// Tests for the signal plot window: the shown ten minutes of each key, a gap breaking its line, marks, scrolling back, one axis per unit, the CSV export.
+#include "App/SignalPlotWindow.h"
+
+#include "Model/SignalSampler.h"
+#include "PaneTestSupport.h"
+
+#include <QFile>
+#include <QLineSeries>
+#include <QScrollBar>
+#include <QTemporaryDir>
+#include <gtest/gtest.h>
+
+using namespace vantorel;
+using panetest::dict;
+
+TEST(SignalPlotWindow, ShowsTheNewestTenMinutesOfEachKeyWithItsMarksScrollsBackAndExportsTheSession) {
+    SignalSampler sampler;
+    sampler.setKeys({"/Cell/RSRP", "/Cell/Load"});
+    SignalPlotWindow plot(sampler, [](const std::string& key) { return std::string(key == "/Cell/RSRP" ? "dBm" : "%"); });
+    const int64_t t0 = 1'700'000'000'000;
+    for (int i = 0; i <= 600; ++i) {  // 20 minutes, a tick every 2 s; the technology changes at 15 minutes
+        PathDictionary paths;
+        const std::string rsrp = "-" + std::to_string(80 + i % 30) + ".50 dBm";
+        VantorelModelNode::makeTreeFromObject(
+            dict({{"Cell", dict({{"RSRP", rsrp.c_str()}, {"Load", i % 100 == 50 ? "Unknown" : "40 %"}})}}), paths);
+        sampler.sample(t0 + i * 2000, i < 450 ? "A" : "B", paths);
+    }
+    plot.refresh();
+    EXPECT_EQ(plot.spanEnd(), t0 + 1'200'000);  // following the newest
+    ASSERT_TRUE(plot.seriesOf("/Cell/RSRP") && plot.seriesOf("/Cell/Load"));
+    EXPECT_EQ(plot.seriesOf("/Cell/RSRP")->count(), 302);  // the span and one point before it
+    EXPECT_EQ(plot.seriesOf("/Cell/RSRP")->at(301), QPointF(double(t0 + 1'200'000), -80.5));
+    EXPECT_NE(plot.seriesOf("/Cell/RSRP")->attachedAxes(), plot.seriesOf("/Cell/Load")->attachedAxes());
+    EXPECT_EQ(plot.shownMarks().size(), 1u);
+
+    plot.scrollBar()->setValue(0);
+    EXPECT_EQ(plot.spanStart(), t0);
+    EXPECT_TRUE(plot.shownMarks().empty());
+    EXPECT_EQ(plot.seriesOf("/Cell/Load")->count(), 50);  // up to its first gap
+    plot.refresh();
+    EXPECT_EQ(plot.spanStart(), t0);  // a refresh leaves a scrolled-back view where it is
+
+    QTemporaryDir dir;
+    std::string error;
+    ASSERT_TRUE(plot.exportCsv(dir.filePath("signal.csv"), &error)) << error;
+    QFile csv(dir.filePath("signal.csv"));
+    ASSERT_TRUE(csv.open(QIODevice::ReadOnly));
+    const QList<QByteArray> lines = csv.readAll().split('\n');
+    EXPECT_EQ(lines.front().trimmed(), "time,/Cell/RSRP,/Cell/Load");
+    EXPECT_EQ(lines.size(), 603);  // header, 601 rows, the empty text after the last line end
+    EXPECT_FALSE(plot.exportCsv(dir.filePath("no/such/dir/signal.csv"), &error));
+}
