@@ -54,7 +54,7 @@ TEST(MonitorLauncher, TheEmbeddedDefaultIsTheUTRANEmulatorAndBadSourcesAreClearE
     std::string error;
     EXPECT_EQ(parse({}, &error)->emulate, "utran");
     EXPECT_FALSE(parse({"--emulate", "utran", "--service", "x"}, &error));
-    EXPECT_EQ(error, "choose one of --emulate, --replay and --service");
+    EXPECT_EQ(error, "choose one of --emulate, --replay, --device and --service");
     EXPECT_FALSE(parse({"--speed", "fast"}, &error));
     MonitorLauncher launcher;
     EXPECT_FALSE(launcher.start(*parse({"--emulate", "wimax"}, &error), nullptr, &error));

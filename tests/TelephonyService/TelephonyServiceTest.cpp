@@ -377,7 +377,7 @@ TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
     const std::vector<std::pair<TelephonyServiceOptions, std::string>> failures = {  // options, start of the error
         {running, "cannot listen on port " + running.portName + ": the name is in use (is another service running?)"},
         {with([](auto& o) { o.emulate = "wimax"; }), "unknown technology \"wimax\" (names: ifx, gsm, cdma, lte, utran"},
-        {with([](auto&) {}), "give exactly one of --emulate TECH and --replay FILE"},
+        {with([](auto&) {}), "give exactly one of --emulate TECH, --replay FILE and --device PATH"},
         {with([](auto& o) { o.replay = "/nonexistent-vantorel.qmdl"; }), "/nonexistent-vantorel.qmdl: No such file or directory"},
         {with([&](auto& o) { o.replay = qmdl; }), qmdl + " is a QMDL file, which does not say which modem recorded it"},
         {with([](auto& o) { o.replay = "x"; o.speed = -1; }), "speed -1: give 0"},
