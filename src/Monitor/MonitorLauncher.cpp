@@ -69,7 +69,7 @@ std::optional<MonitorLauncher::Source> MonitorLauncher::sourceFrom(const QComman
             return std::nullopt;
         }
         // A capture says its technology; another one on the command line is a contradiction.
-        const Capture capture = CaptureReader::readFile(s.replay);
+        const Capture capture = s.replay.empty() ? Capture() : CaptureReader::readFile(s.replay);
         if (capture.ok() && !capture.technology.empty() && capture.technology != *id) {
             *error = s.replay + " is a " + TechnologyNames::displayName(capture.technology) +
                      " capture: --technology " + s.technology + " contradicts it";

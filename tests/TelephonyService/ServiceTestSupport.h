@@ -9,7 +9,9 @@
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
 #include "PropertyList/PropertyListSerialization.h"
+#include "TelephonyService/Device/DiagCommand.h"
 #include "TelephonyService/Emulator/UTRANScenario.h"
+#include "TelephonyService/Replay/DiagPacket.h"
 #include "TelephonyService/Replay/CaptureWriter.h"
 #include "TelephonyService/Replay/HdlcDeframer.h"
 #include "TelephonyService/Replay/RecordedStream.h"
@@ -32,19 +34,7 @@ inline std::string capturePath(const std::string& name) { return std::string(VAN
 inline void append(Bytes& out, ByteView more) { out.insert(out.end(), more.begin(), more.end()); }
 
 // escape(body + CRC16 LE) + 7E; a non-zero crcXor spoils the CRC on purpose.
-inline Bytes hdlcFrame(ByteView body, uint16_t crcXor = 0) {
-    Bytes raw(body.begin(), body.end());
-    const uint16_t crc = static_cast<uint16_t>(HdlcDeframer::crc16(body) ^ crcXor);
-    raw.push_back(static_cast<uint8_t>(crc));
-    raw.push_back(static_cast<uint8_t>(crc >> 8));
-    Bytes out;
-    for (uint8_t b : raw) {
-        if (b == 0x7E || b == 0x7D) out.push_back(0x7D);
-        out.push_back(b == 0x7E || b == 0x7D ? static_cast<uint8_t>(b ^ 0x20) : b);
-    }
-    out.push_back(0x7E);
-    return out;
-}
+inline Bytes hdlcFrame(ByteView body, uint16_t crcXor = 0) { return DiagCommand::frame(body, crcXor); }
 
 inline Bytes morvekRecord(uint16_t code, uint64_t timeStamp, std::initializer_list<uint8_t> payload) {
     return RecordBuilder::ordinary(code).timestamp(timeStamp).bytes(13, ByteView(payload.begin(), payload.size())).build();
@@ -52,11 +42,7 @@ inline Bytes morvekRecord(uint16_t code, uint64_t timeStamp, std::initializer_li
 
 // A DIAG log packet: 10 00 <len LE>, then the Morvek record without its type byte.
 inline Bytes logPacketBody(uint16_t code, uint64_t timeStamp, std::initializer_list<uint8_t> payload) {
-    const Bytes morvek = morvekRecord(code, timeStamp, payload);
-    Bytes body{0x10, 0x00};
-    RecordBuilder::put(body, 2, morvek.size() - 1, 2);
-    body.insert(body.end(), morvek.begin() + 1, morvek.end());
-    return body;
+    return DiagPacket::logPacketFromRecord(morvekRecord(code, timeStamp, payload));
 }
 
 // An in-memory UTRAN capture of the messages at the given times (1 ms apart when none are given).

@@ -31,14 +31,15 @@ bool isErrorOpcode(uint8_t opcode) {
 constexpr size_t kLogConfigOpOffset = 4;
 constexpr size_t kLogConfigStatusOffset = 8;
 constexpr size_t kLogConfigCountsOffset = 12;
+constexpr size_t kBuildIdOffset = 12;
 
 }  // namespace
 
-Bytes DiagCommand::frame(ByteView body) {
+Bytes DiagCommand::frame(ByteView body, uint16_t crcXor) {
     Bytes out;
     out.reserve(body.size() + body.size() / 8 + 4);
     for (uint8_t byte : body) putEscaped(out, byte);
-    const uint16_t crc = HdlcDeframer::crc16(body);
+    const uint16_t crc = static_cast<uint16_t>(HdlcDeframer::crc16(body) ^ crcXor);
     putEscaped(out, static_cast<uint8_t>(crc & 0xFF));
     putEscaped(out, static_cast<uint8_t>(crc >> 8));
     out.push_back(HdlcDeframer::kFlag);
@@ -126,6 +127,17 @@ std::optional<DiagCommand::ItemCounts> DiagCommand::itemCounts(ByteView reply) {
         counts[i] = *count;
     }
     return counts;
+}
+
+std::string DiagCommand::buildIdOf(ByteView reply) {
+    const ByteReader r(reply);
+    std::string id;
+    if (r.u8(0) != DiagOpcode::kBuildId) return id;
+    for (uint8_t c : r.from(kBuildIdOffset)) {
+        if (c == 0 || id.size() == kMaxBuildIdLength) break;
+        if (c >= 0x20 && c < 0x7F) id.push_back(static_cast<char>(c));
+    }
+    return id;
 }
 
 std::string DiagCommand::describe(ByteView request) {

@@ -60,7 +60,8 @@ public:
 
     // HDLC frame of a request: body, CRC-16/X.25 low byte first, 7D/7E escaped (the CRC
     // bytes too), closing 7E; no leading flag. "01 02 03 04" -> "01 02 03 04 91 39 7E".
-    static Bytes frame(ByteView body);
+    // A non-zero crcXor spoils the CRC on purpose (a modem's bad frame, played by a fake one).
+    static Bytes frame(ByteView body, uint16_t crcXor = 0);
 
     // Request bodies (unframed).
     static Bytes eventReportsOff();      // 60 00
@@ -86,6 +87,11 @@ public:
     static std::optional<uint32_t> logConfigStatus(ByteView reply);
     // The 16 item counts of a retrieve-ranges reply; empty when too short or status not 0.
     static std::optional<ItemCounts> itemCounts(ByteView reply);
+    // The build ID string of a build-ID reply: 7C <version u8> <reserved u16> <MSM revision u32>
+    // <model u32> <build ID, NUL> <model name, NUL>; printable characters only, at most
+    // kMaxBuildIdLength; empty for an error reply or one cut before the string.
+    static std::string buildIdOf(ByteView reply);
+    static constexpr size_t kMaxBuildIdLength = 80;
     // "73 op 3", "60", "7C": how a request is named in messages.
     static std::string describe(ByteView request);
 };

@@ -144,9 +144,7 @@ void DiagSession::open(std::optional<std::set<uint16_t>> codes) {
     });
     send(DiagCommand::buildId(), [this](const Reply& reply) {
         // Some modems answer 7C with an error: the build ID is only shown.
-        if (reply && DiagCommand::errorName(*reply).empty() && reply->size() > 4)
-            for (auto it = reply->begin() + 4; it != reply->end() && *it != 0; ++it)
-                if (*it >= 0x20 && *it < 0x7F) buildId_.push_back(static_cast<char>(*it));
+        if (reply) buildId_ = DiagCommand::buildIdOf(*reply);
     });
     send(DiagCommand::logConfig(DiagLogConfigOp::kRetrieveRanges), [this](const Reply& reply) {
         if (!opening_) return;

@@ -4,6 +4,7 @@
 #include "Platform/ByteReader.h"
 #include "Platform/LogCodes.h"
 #include "Platform/StringFormat.h"
+#include "TelephonyService/LogMask.h"
 
 namespace vantorel {
 
@@ -82,6 +83,18 @@ Bytes DiagPacket::morvekRecordFromDlf(ByteView dlfRecord) {
     record.push_back(LogCode::kOrdinaryType);
     record.insert(record.end(), dlfRecord.begin(), dlfRecord.end());
     return record;
+}
+
+Bytes DiagPacket::logPacketFromRecord(ByteView morvekRecord) {
+    const std::optional<LogMask::Classification> kind = LogMask::classify(morvekRecord);
+    if (!kind || !kind->isOrdinary()) return {};
+    const ByteReader whole(morvekRecord);
+    const ByteView record = whole.u8(0) == LogMask::kPrefixByte ? whole.from(LogMask::kPrefixLength) : morvekRecord;
+    const ByteView dlf = ByteReader(record).from(1);
+    if (dlf.size() < kLogHeaderLength || dlf.size() > 0xFFFF) return {};
+    Bytes body{kLogCommand, 0x00, static_cast<uint8_t>(dlf.size() & 0xFF), static_cast<uint8_t>(dlf.size() >> 8)};
+    body.insert(body.end(), dlf.begin(), dlf.end());
+    return body;
 }
 
 int64_t DiagPacket::microsecondsSince1970(uint64_t diagTimeStamp) {

@@ -55,6 +55,10 @@ public:
     Bytes morvekRecord() const;
     // Type byte 1 + a DLF record <len> <code> <time stamp> <payload>: the Morvek record of any DLF record (DlfReader uses it too).
     static Bytes morvekRecordFromDlf(ByteView dlfRecord);
+    // The other way, as a modem sends it: the log packet body 10 00 <len u16> <DLF record>
+    // of an ordinary Morvek record (after the optional 0x81 prefix); empty for any other
+    // message (extra records, IFX messages, junk without a full log header).
+    static Bytes logPacketFromRecord(ByteView morvekRecord);
 
     // A DIAG time stamp as microseconds since 1970-01-01 00:00:00 UTC: the upper 48 bits
     // count 1.25 ms ticks since 1980-01-06 00:00:00 UTC (the GPS epoch), the lower 16 bits
