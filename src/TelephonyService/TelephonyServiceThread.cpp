@@ -75,6 +75,9 @@ void TelephonyServiceThread::run() {
 
 void TelephonyServiceThread::stop() {
     if (!thread_) return;
+    // The service stops while its event loop still runs: a modem's backend waits there for
+    // the replies to its clearing sequence, and a thread told to quit runs no loop again.
+    invoke([](TelephonyService& service) { service.stop(); });
     thread_->quit();  // honoured even when the loop has not begun yet
     thread_->wait();
     thread_.reset();

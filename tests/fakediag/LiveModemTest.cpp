@@ -276,7 +276,26 @@ struct Program {
         process.terminate();
         EXPECT_TRUE(process.waitForFinished(10000));
     }
+    // Waits until the program's standard error (all of it so far, kept in `said`) holds text.
+    bool says(const std::string& text, int ms) {
+        return waitUntil(
+            [&] {
+                said += process.readAllStandardError().toStdString();
+                return said.find(text) != std::string::npos;
+            },
+            ms);
+    }
+    std::string said;
 };
+
+// The last requests the fake modem was sent (its --requests file), joined by " | ".
+std::string lastRequests(const QString& file, int count) {
+    QFile sent(file);
+    if (!sent.open(QIODevice::ReadOnly)) return {};
+    const QStringList lines = QString::fromUtf8(sent.readAll()).trimmed().split('\n');
+    return lines.mid(std::max(0, int(lines.size()) - count)).join(" | ").toStdString();
+}
+const std::string kClearingLines = "60 00 | 73 00 00 00 00 00 00 00 | 7D 05 00 00 00 00 00 00";
 
 // The display as `decode` prints it: from "Technology:" up to the end of that tree.
 std::string displayOf(const std::string& text) {
@@ -308,26 +327,13 @@ TEST(LiveModemPrograms, ACaptureThroughTheFakeModemShowsWhatDecodeShowsAndTheMod
     ASSERT_TRUE(terminal.startsWith("/dev/pts/")) << terminal.toStdString();
     Program service(VANTOREL_TELEPHONYD_PROGRAM,
                     {"--device", terminal, "--technology", "lte", "--record-qmdl", qmdl, "--port", port});
-    std::string serviceSaid;
-    ASSERT_TRUE(waitUntil(
-        [&] {
-            serviceSaid += service.process.readAllStandardError().toStdString();
-            return serviceSaid.find("listening on") != std::string::npos;
-        },
-        5000))
-        << serviceSaid;
+    ASSERT_TRUE(service.says("listening on", 5000)) << service.said;
     Program watch(VANTOREL_CLI_PROGRAM, {"watch", "--service", port});
 
-    std::string fakeSaid, shown;
-    ASSERT_TRUE(waitUntil(
-        [&] {
-            fakeSaid += fake.process.readAllStandardError().toStdString();
-            return fakeSaid.find("the recording has ended") != std::string::npos;
-        },
-        20000))
-        << fakeSaid;
+    ASSERT_TRUE(fake.says("the recording has ended", 20000)) << fake.said;
     const std::string expected = decode({capture});
     ASSERT_FALSE(expected.empty());
+    std::string shown;
     EXPECT_TRUE(waitUntil(
         [&] {
             shown += watch.process.readAllStandardOutput().toStdString();
@@ -338,15 +344,24 @@ TEST(LiveModemPrograms, ACaptureThroughTheFakeModemShowsWhatDecodeShowsAndTheMod
 
     watch.terminate();
     service.terminate();  // SIGTERM, as Ctrl-C
-    QFile sent(requests);
-    ASSERT_TRUE(sent.open(QIODevice::ReadOnly));
-    const QStringList lines = QString::fromUtf8(sent.readAll()).trimmed().split('\n');
-    ASSERT_GE(lines.size(), 3);
-    EXPECT_EQ(lines.mid(lines.size() - 3), (QStringList{"60 00", "73 00 00 00 00 00 00 00", "7D 05 00 00 00 00 00 00"}));
+    EXPECT_EQ(lastRequests(requests, 3), kClearingLines);
     EXPECT_EQ(decode({qmdl}), expected) << "the raw stream the service recorded decodes as the capture did";
     fake.terminate();
-    fakeSaid += fake.process.readAllStandardError().toStdString();
-    EXPECT_NE(fakeSaid.find("logging off at exit"), std::string::npos) << fakeSaid;
+    EXPECT_TRUE(fake.says("logging off at exit", 1000)) << fake.said;
+}
+
+// The window and the terminal view run the service in-process: ending them ends logging too.
+TEST(LiveModemPrograms, AMonitorWithItsOwnServiceLeavesTheModemQuietWhenItEnds) {
+    QTemporaryDir dir;
+    const QString requests = dir.filePath("requests");
+    Program fake(VANTOREL_FAKEDIAG_PROGRAM, {"--emulate", "lte", "--requests", requests});
+    ASSERT_TRUE(fake.process.waitForReadyRead(5000));
+    const QString terminal = QString::fromUtf8(fake.process.readLine()).trimmed();
+    Program watch(VANTOREL_CLI_PROGRAM, {"watch", "--device", terminal});
+    ASSERT_TRUE(fake.says("logging on", 10000)) << fake.said;
+    watch.terminate();
+    EXPECT_TRUE(fake.says("logging off", 3000)) << fake.said;
+    EXPECT_EQ(lastRequests(requests, 3), kClearingLines);
 }
 
 }  // namespace
