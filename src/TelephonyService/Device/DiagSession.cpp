@@ -208,7 +208,10 @@ void DiagSession::applyCodes() {
             refusals_.push_back(r);
 
     const bool all = !wanted_;
-    for (auto& [equipment, request] : requests) {
+    for (const auto& entry : requests) {
+        // Named variables: clang 14 (the fuzz build) cannot capture structured bindings in a lambda.
+        const uint32_t equipment = entry.first;
+        const Bytes& request = entry.second;
         // The modem has this mask already.
         if (const auto it = applied_.find(equipment); it != applied_.end() && it->second == request) continue;
         const std::set<uint16_t> codes = codesOf[equipment];
