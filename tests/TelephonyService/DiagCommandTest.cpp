@@ -1,10 +1,14 @@
 // Tests the DIAG request side: framing vectors, log masks per equipment, reply matching, and the raw mode a serial port is put in.
 #include "TelephonyService/Device/DiagCommand.h"
 #include "TelephonyService/Device/DiagPort.h"
+#include "TelephonyService/Device/SerialDiagPort.h"
 #include "TelephonyService/Replay/HdlcDeframer.h"
 
 #include <QCoreApplication>
 #include <QElapsedTimer>
+#include <QFile>
+#include <QProcess>
+#include <QTemporaryDir>
 
 #include <gtest/gtest.h>
 
@@ -147,6 +151,45 @@ TEST(DiagPort, PutsATerminalInRawMode) {
     ASSERT_EQ(::write(master, out.data(), out.size()), static_cast<ssize_t>(out.size()));
     while (got.size() < out.size() && clock.elapsed() < 4000) QCoreApplication::processEvents(QEventLoop::AllEvents, 20);
     EXPECT_EQ(got, out);
+    ::close(master);
+}
+
+// What a user who typed the wrong --device reads.
+TEST(DiagPort, AWrongDeviceIsRefusedWithWhatToDo) {
+    QTemporaryDir dir;
+    const std::string file = dir.filePath("capture.qmdl").toStdString();
+    QFile(QString::fromStdString(file)).open(QIODevice::WriteOnly);
+    const std::vector<std::pair<std::string, std::string>> rows = {
+        {"/dev/ttyUSB97", "/dev/ttyUSB97: no such device (is the modem plugged in"},
+        {file, file + ": a regular file, not a device (to play a recorded capture use --replay FILE)"},
+        {dir.path().toStdString(), dir.path().toStdString() + ": a directory, not a device"},
+        {"tcp:2500", "tcp:2500: give tcp:HOST:PORT, such as tcp:127.0.0.1:2500"},
+        {"tcp:127.0.0.1:70000", "tcp:127.0.0.1:70000: the port must be a number from 1 to 65535"},
+        {"tcp:127.0.0.1:1", "tcp:127.0.0.1:1: Connection refused (is the bridge running and the port forwarded?)"},
+    };
+    for (const auto& [spec, message] : rows) {
+        std::string error;
+        EXPECT_FALSE(DiagPort::open(spec, &error)) << spec;
+        EXPECT_EQ(error.substr(0, message.size()), message) << spec;
+    }
+}
+
+// Another program on the port would take the modem's replies: the service names it.
+TEST(DiagPort, FindsTheProgramsThatHoldAPort) {
+    int master = -1, slave = -1;
+    char name[128] = {};
+    ASSERT_EQ(::openpty(&master, &slave, name, nullptr, nullptr), 0);
+    ::close(slave);
+    QProcess holder;
+    holder.setStandardInputFile(name);
+    holder.start("sleep", {"30"});
+    ASSERT_TRUE(holder.waitForStarted());
+    const std::vector<SerialDiagPort::Holder> holders = SerialDiagPort::holders(name);
+    ASSERT_EQ(holders.size(), 1u);
+    EXPECT_EQ(holders[0].pid, holder.processId());
+    EXPECT_EQ(holders[0].program, "sleep");
+    holder.kill();
+    holder.waitForFinished();
     ::close(master);
 }
 
