@@ -2,6 +2,7 @@
 #include "fakediag/DiagResponder.h"
 
 #include "Platform/ByteReader.h"
+#include "Platform/RecordBuilder.h"
 #include "Platform/StringFormat.h"
 #include "TelephonyService/Device/DiagCommand.h"
 
@@ -20,9 +21,7 @@ constexpr uint32_t kStatusOk = 0;
 constexpr uint32_t kStatusBadEquipment = 1;
 constexpr uint32_t kStatusNoItems = 2;
 
-void putU32(Bytes& out, uint32_t value) {
-    for (int i = 0; i < 4; ++i) out.push_back(static_cast<uint8_t>(value >> (8 * i)));
-}
+void putU32(Bytes& out, uint32_t value) { RecordBuilder::put(out, out.size(), value, 4); }
 
 void putText(Bytes& out, const std::string& text, size_t width) {
     for (size_t i = 0; i < width; ++i) out.push_back(i < text.size() ? static_cast<uint8_t>(text[i]) : ' ');

@@ -2,6 +2,7 @@
 #include "TelephonyService/Device/DiagCommand.h"
 
 #include "Platform/ByteReader.h"
+#include "Platform/RecordBuilder.h"
 #include "Platform/StringFormat.h"
 #include "TelephonyService/Replay/HdlcDeframer.h"
 
@@ -9,9 +10,7 @@ namespace vantorel {
 
 namespace {
 
-void putU32(Bytes& out, uint32_t value) {
-    for (int i = 0; i < 4; ++i) out.push_back(static_cast<uint8_t>(value >> (8 * i)));
-}
+void putU32(Bytes& out, uint32_t value) { RecordBuilder::put(out, out.size(), value, 4); }
 
 void putEscaped(Bytes& out, uint8_t byte) {
     if (byte == HdlcDeframer::kFlag || byte == HdlcDeframer::kEscape) {
