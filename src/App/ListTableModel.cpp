@@ -1,6 +1,7 @@
 // ListTableModel: the entries of a display-tree list as a table, with the identity that keeps a row selected and a numeric-aware sort.
 #include "App/ListTableModel.h"
 
+#include "Model/DisplayPath.h"
 #include "Model/SignalValue.h"
 
 #include <QSortFilterProxyModel>
@@ -30,16 +31,6 @@ const std::vector<NodeRef>* childrenOf(const NodeRef& node) { return node ? node
 
 }  // namespace
 
-const std::vector<std::string>& ListTableModel::identityKeys() {
-    // The names the decoders give these leaves (LTE, UMTS/UTRAN, GSM, CDMA, packet data).
-    static const std::vector<std::string> keys = {
-        "Physical Cell ID", "PCI",     "PSC",          "Scrambling Code", "Cell Scrambling Code",
-        "Cell Parameter ID", "Pilot PN", "PN",          "E-ARFCN",         "E ARFCN",
-        "EARFCN",            "UARFCN",  "U ARFCN",     "Downlink UARFCN", "ARFCN",
-        "BSIC",              "Cell ID", "Cell Identity", "NSAPI"};
-    return keys;
-}
-
 bool ListTableModel::isList(const NodeRef& node) {
     const std::vector<NodeRef>* entries = childrenOf(node);
     if (!entries || entries->empty()) return false;
@@ -60,7 +51,8 @@ ListTableModel::ListTableModel(QObject* parent) : QAbstractTableModel(parent) {}
 void ListTableModel::setList(NodeRef node) {
     beginResetModel();
     list_ = isList(node) ? std::move(node) : nullptr;
-    keys_.clear();
+    // Columns only ever grow: a key an entry lacks now keeps its column, so no column moves
+    // between refreshes and a sort stays on its key.
     if (const std::vector<NodeRef>* entries = childrenOf(list_)) {
         for (const NodeRef& entry : *entries)
             for (const NodeRef& child : *entry->childNodes())
@@ -84,12 +76,9 @@ const std::string* ListTableModel::leaf(int row, const std::string& key) const {
 }
 
 std::string ListTableModel::identity(int row) const {
-    std::string id;
-    for (const std::string& key : identityKeys())
-        if (const std::string* value = leaf(row, key)) id += key + "=" + *value + ";";
-    if (!id.empty()) return id;
     const NodeRef e = entry(row);
-    return e ? e->displayName() : std::string();
+    const std::string id = DisplayPath::identitySelector(e);
+    return !id.empty() || !e ? id : e->displayName();
 }
 
 int ListTableModel::rowOfIdentity(const std::string& id) const {

@@ -12,15 +12,12 @@ class QSortFilterProxyModel;
 
 namespace vantorel {
 
-// One row per entry ("0", "1", ... in the tree), one column per leaf key, the union of the
-// entries' keys in the order they are first seen. Nested dictionaries of an entry are not
-// columns: they are reached by drilling into the entry.
+// One row per entry ("0", "1", ... in the tree), one column per leaf key: the union of the
+// keys of every list shown so far, in the order first seen. Nested dictionaries of an entry
+// are not columns: they are reached by drilling into the entry.
 class ListTableModel : public QAbstractTableModel {
     Q_OBJECT
 public:
-    // The leaves that name a cell or a context, in the order they count for an entry's
-    // identity: a row stays selected across refreshes by these, not by its index.
-    static const std::vector<std::string>& identityKeys();
     // True for a node whose children are the entries "0".."n-1" (at least one), each a
     // dictionary with at least one leaf.
     static bool isList(const NodeRef& node);
@@ -35,7 +32,8 @@ public:
     const NodeRef& list() const { return list_; }
     NodeRef entry(int row) const;
     const std::string& key(int column) const { return keys_.at(std::size_t(column)); }
-    // The entry's identity leaves as "key=value" pairs, or its index name without any.
+    // The entry's identity (DisplayPath::identitySelector), or its index name without
+    // identity leaves: a row stays selected across refreshes by it, not by its index.
     std::string identity(int row) const;
     int rowOfIdentity(const std::string& id) const;  // -1 when no entry has it
 

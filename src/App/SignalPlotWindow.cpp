@@ -1,6 +1,7 @@
 // SignalPlotWindow: Qt Charts lines of the sampler's series, one value axis per unit, a time axis scrolled by a scroll bar, marks as labelled vertical lines.
 #include "App/SignalPlotWindow.h"
 
+#include "Model/DisplayPath.h"
 #include "Model/SignalSampler.h"
 #include "Monitor/SignalCsvWriter.h"
 
@@ -33,12 +34,21 @@ QColor markColour(SignalSeries::Mark::Kind kind) {
     return kind == SignalSeries::Mark::Kind::TechnologyChange ? QColor(190, 40, 40) : QColor(110, 110, 110);
 }
 
+// Twelve colours that tell apart on white and from each other, given to lines in the order
+// they are made; the chart theme's five would repeat on an LTE plot's first seven lines.
+const QColor& lineColour(std::size_t index) {
+    static const QColor colours[] = {
+        QColor(31, 119, 180), QColor(255, 127, 14), QColor(44, 160, 44),  QColor(214, 39, 40),
+        QColor(148, 103, 189), QColor(140, 86, 75), QColor(227, 119, 194), QColor(23, 190, 207),
+        QColor(188, 189, 34),  QColor(0, 0, 128),  QColor(128, 128, 0),   QColor(0, 128, 128)};
+    return colours[index % (sizeof colours / sizeof colours[0])];
+}
+
 }  // namespace
 
-SignalPlotWindow::SignalPlotWindow(const SignalSampler& sampler, UnitLookup units, QWidget* parent)
+SignalPlotWindow::SignalPlotWindow(const SignalSampler& sampler, QWidget* parent)
     : QWidget(parent, Qt::Window),
       sampler_(sampler),
-      units_(std::move(units)),
       chart_(new QChart),
       view_(new QChartView(chart_, this)),
       timeAxis_(new QDateTimeAxis),
@@ -76,25 +86,16 @@ SignalPlotWindow::SignalPlotWindow(const SignalSampler& sampler, UnitLookup unit
 
 SignalPlotWindow::~SignalPlotWindow() = default;
 
-std::string SignalPlotWindow::unitOf(const std::string& display) {
-    std::size_t i = display.find_first_not_of(' ');
-    if (i == std::string::npos) return {};
-    if (display[i] == '-' || display[i] == '+') ++i;
-    const std::size_t digits = display.find_first_not_of("0123456789.", i);
-    if (digits == i) return {};
-    const std::size_t from = display.find_first_not_of(' ', digits == std::string::npos ? display.size() : digits);
-    if (from == std::string::npos || display[from] == '(') return {};
-    return display.substr(from, display.find(' ', from) - from);
-}
-
 QString SignalPlotWindow::labelOf(const std::string& key) const {
-    // The key's last path component, with as many parents as it takes to tell two apart.
+    // A list entry picked by its cell or its rank is named by them: "Filtered RSRP (PCI 251)".
+    if (key.find("/[") != std::string::npos) return QString::fromStdString(DisplayPath::label(key));
+    // Otherwise the key's last path component, with as many parents as it takes to tell two apart.
     auto tail = [](const std::string& path, int parts) {
         std::size_t at = path.size();
         for (int i = 0; i < parts && at != std::string::npos && at > 0; ++i) at = path.rfind('/', at - 1);
         return at == std::string::npos ? path : path.substr(at + 1);
     };
-    const auto& keys = sampler_.keys();
+    const std::vector<std::string> keys = sampler_.plotKeys();
     for (int parts = 1; parts < 6; ++parts) {
         const std::string mine = tail(key, parts);
         if (std::any_of(keys.begin(), keys.end(), [&](const std::string& k) { return k != key && tail(k, parts) == mine; }))
@@ -125,12 +126,14 @@ QValueAxis* SignalPlotWindow::axisFor(const std::string& unit) {
     return axis;
 }
 
-void SignalPlotWindow::addLine(const std::string& key) {
+void SignalPlotWindow::addLine(const std::string& key, const std::string& unit) {
     Line line;
-    line.unit = units_ ? units_(key) : std::string();
+    line.unit = unit;
     line.axis = axisFor(line.unit);
     line.label = labelOf(key);
     line.series = newSeries(line.axis, true);
+    // A neighbour cell's line is thinner than the serving cell's values.
+    line.series->setPen(QPen(lineColour(colours_++), key.find("/[") != std::string::npos ? 1.2 : 2.2));
     line.series->setName(line.label);
     lines_[key] = line;
 }
@@ -149,13 +152,26 @@ void SignalPlotWindow::refresh() {
     const SignalSeries& series = sampler_.series();
     first_ = std::numeric_limits<int64_t>::max();
     last_ = std::numeric_limits<int64_t>::min();
-    for (const std::string& key : sampler_.keys()) {
+    for (const std::string& key : sampler_.plotKeys()) {
         const auto& points = series.points(key);
         if (points.empty()) continue;
-        // A line is made once its key has a value, so that its unit can be read.
-        if (!lines_.count(key)) addLine(key);
+        // A line is made once its key shows a value, so that its unit can be read.
+        if (!lines_.count(key))
+            if (const std::optional<std::string> unit = sampler_.unit(key)) addLine(key, *unit);
         first_ = std::min(first_, points.front().timeMs);
         last_ = std::max(last_, points.back().timeMs);
+    }
+    // Lines of cells the sampler no longer keeps go.
+    const std::vector<std::string> plotted = sampler_.plotKeys();
+    for (auto it = lines_.begin(); it != lines_.end();) {
+        if (std::find(plotted.begin(), plotted.end(), it->first) != plotted.end()) {
+            ++it;
+            continue;
+        }
+        for (QLineSeries* piece : it->second.pieces) chart_->removeSeries(piece), delete piece;
+        chart_->removeSeries(it->second.series);
+        delete it->second.series;
+        it = lines_.erase(it);
     }
     for (const SignalSeries::Mark& mark : series.marks()) {
         first_ = std::min(first_, mark.timeMs);
@@ -173,7 +189,9 @@ void SignalPlotWindow::refresh() {
 }
 
 void SignalPlotWindow::draw() {
-    start_ = first_ + int64_t(scroll_->value()) * 1000;
+    // Following, the span ends at the newest time (a young session starts in its middle).
+    start_ = following_ ? std::max(first_, last_ - kSpanMs) : first_ + int64_t(scroll_->value()) * 1000;
+    if (following_ && last_ - first_ < kSpanMs) start_ = last_ - kSpanMs;
     const int64_t end = start_ + kSpanMs;
     timeAxis_->setRange(QDateTime::fromMSecsSinceEpoch(start_), QDateTime::fromMSecsSinceEpoch(end));
 
@@ -188,39 +206,32 @@ void SignalPlotWindow::draw() {
                                    [](int64_t t, const SignalSeries::Point& p) { return t < p.timeMs; });
         if (from != points.begin()) --from;
         if (to != points.end()) ++to;
-        QList<QPointF> shown;
-        shown.reserve(int(std::distance(from, to)));
+        // A gap point (no value at that tick) breaks the line there.
+        std::vector<QList<QPointF>> pieces(1);
         auto& [low, high] = ranges.try_emplace(line.axis, std::numeric_limits<double>::max(),
                                                std::numeric_limits<double>::lowest()).first->second;
         for (auto p = from; p != to; ++p) {
-            shown.append(QPointF(double(p->timeMs), p->value));
+            if (SignalSeries::isGap(*p)) {
+                if (!pieces.back().isEmpty()) pieces.emplace_back();
+                continue;
+            }
+            pieces.back().append(QPointF(double(p->timeMs), p->value));
             if (p->timeMs >= start_ && p->timeMs <= end) {
                 low = std::min(low, p->value);
                 high = std::max(high, p->value);
             }
         }
-        // A gap (ticks without a value) breaks the line: a step longer than the steps on
-        // either side of it. Thinned older points are evenly spaced too, so only gaps break.
-        std::vector<double> steps;
-        for (qsizetype i = 1; i < shown.size(); ++i) steps.push_back(shown[i].x() - shown[i - 1].x());
-        auto gapAt = [&](std::size_t i) {
-            const bool before = i > 0, after = i + 1 < steps.size();
-            return (before || after) && (!before || steps[i] > 1.5 * steps[i - 1]) &&
-                   (!after || steps[i] > 1.5 * steps[i + 1]);
-        };
-        std::vector<QList<QPointF>> pieces(1);
-        for (qsizetype i = 0; i < shown.size(); ++i) {
-            if (i > 0 && gapAt(std::size_t(i - 1))) pieces.emplace_back();
-            pieces.back().append(shown[i]);
-        }
         line.series->replace(pieces.front());
         while (line.pieces.size() + 1 < pieces.size()) line.pieces.push_back(newSeries(line.axis, false));
         for (std::size_t i = 0; i < line.pieces.size(); ++i) {
-            line.pieces[i]->setPen(line.series->pen());
+            if (line.pieces[i]->pen() != line.series->pen()) line.pieces[i]->setPen(line.series->pen());
             line.pieces[i]->replace(i + 1 < pieces.size() ? pieces[i + 1] : QList<QPointF>());
         }
+        // The legend lists the lines drawn in the span, each with its latest reading.
+        const bool drawn = std::any_of(pieces.begin(), pieces.end(), [](const QList<QPointF>& p) { return !p.isEmpty(); });
+        for (QLegendMarker* marker : chart_->legend()->markers(line.series))
+            if (marker->isVisible() != drawn) marker->setVisible(drawn);
         const std::optional<double> latest = series.latest(key);
-        // The legend shows each value's latest reading beside its name.
         const QString unit = QString::fromStdString(line.unit);
         line.series->setName(latest ? QStringLiteral("%1  %2 %3").arg(line.label).arg(*latest, 0, 'g', 4).arg(unit)
                                     : line.label);
@@ -257,16 +268,18 @@ void SignalPlotWindow::draw() {
         }
         MarkItem& item = marks_[shownMarks_++];
         item.timeMs = mark.timeMs;
-        QPen pen(markColour(mark.kind), 1.5, Qt::DashLine);
-        item.line->setPen(pen);
+        item.whole = QString::fromStdString(mark.text);
+        const QPen pen(markColour(mark.kind), 1.5, Qt::DashLine);
+        if (item.line->pen() != pen) item.line->setPen(pen);
         item.line->replace({QPointF(double(mark.timeMs), markAxis->min()), QPointF(double(mark.timeMs), markAxis->max())});
-        item.line->setVisible(true);
-        item.text->setToolTip(QString::fromStdString(mark.text));
+        item.text->setText(shortMarkText(mark.text));
+        item.text->setToolTip(item.whole);
         item.text->setBrush(markColour(mark.kind));
-        item.back->setVisible(true);
     }
+    // Spare items of the pool draw nothing; they stay in the chart (hiding a series and
+    // showing it again would bring back its legend entry).
     for (std::size_t i = shownMarks_; i < marks_.size(); ++i) {
-        marks_[i].line->setVisible(false);
+        if (marks_[i].line->count()) marks_[i].line->clear();
         marks_[i].back->setVisible(false);
     }
     placeMarkTexts();
@@ -279,25 +292,43 @@ void SignalPlotWindow::draw() {
 }
 
 void SignalPlotWindow::placeMarkTexts() {
-    // Each text runs up along its line, on its right, elided to the plot's height (whole in
-    // the tooltip): marks a few pixels apart then never write over each other.
+    // Each short text at the top of its line, on its right, on a pale box; one that would
+    // overlap the text before it is left out, so that a busy span stays readable.
     const QRectF area = chart_->plotArea();
+    qreal freeFrom = std::numeric_limits<qreal>::lowest();
     for (std::size_t i = 0; i < shownMarks_; ++i) {
         MarkItem& item = marks_[i];
         const QPointF at = chart_->mapToPosition(QPointF(double(item.timeMs), 0), item.line);
-        const QFontMetrics metrics(item.text->font());
-        item.text->setText(metrics.elidedText(item.text->toolTip(), Qt::ElideRight, int(area.height()) - 8));
         const QRectF box = item.text->boundingRect();
         item.back->setRect(box.adjusted(-2, 0, 2, 0));
-        item.back->setRotation(-90);
-        item.back->setPos(at.x() + 1, area.top() + 6 + box.width());
+        item.back->setPos(at.x() + 2, area.top() + 2);
+        const bool room = at.x() + 2 >= freeFrom && at.x() >= area.left() && at.x() <= area.right();
+        item.back->setVisible(room);
+        if (room) freeFrom = at.x() + 2 + box.width() + 6;
     }
+}
+
+QString SignalPlotWindow::shortMarkText(const std::string& text) {
+    const QString whole = QString::fromStdString(text);
+    const qsizetype arrow = whole.indexOf(QStringLiteral("→"));
+    if (arrow < 0) return whole.left(12);
+    const qsizetype comma = whole.indexOf(',', arrow);
+    return whole.mid(arrow, comma < 0 ? -1 : comma - arrow).trimmed();
 }
 
 std::vector<QString> SignalPlotWindow::shownMarks() const {
     std::vector<QString> texts;
-    for (std::size_t i = 0; i < shownMarks_; ++i) texts.push_back(marks_[i].text->toolTip());
+    for (std::size_t i = 0; i < shownMarks_; ++i) texts.push_back(marks_[i].whole);
     return texts;
+}
+
+std::vector<QLineSeries*> SignalPlotWindow::piecesOf(const std::string& key) const {
+    auto it = lines_.find(key);
+    if (it == lines_.end()) return {};
+    std::vector<QLineSeries*> pieces{it->second.series};
+    for (QLineSeries* piece : it->second.pieces)
+        if (piece->count()) pieces.push_back(piece);
+    return pieces;
 }
 
 QLineSeries* SignalPlotWindow::seriesOf(const std::string& key) const {

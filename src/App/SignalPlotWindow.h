@@ -4,8 +4,8 @@
 #include <QWidget>
 
 #include <cstdint>
-#include <functional>
 #include <map>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -24,17 +24,19 @@ namespace vantorel {
 
 class SignalSampler;
 
-// One line per key of the sampler; a vertical axis per unit ("dBm", "dB", "%"), the first on
-// the left, the others on the right, so that values on different scales stay readable. The
-// view follows the newest values unless the scroll bar was moved back.
+// One line per plotted key of the sampler (SignalSampler::plotKeys: the chosen values and a
+// line per strong neighbour cell), each in a colour of its own; a vertical axis per unit
+// ("dBm", "dB", "%"), the first on the left, the others on the right, so that values on
+// different scales stay readable. A line is broken where its key had no value. The view
+// ends at the newest values unless the scroll bar was moved back. Marks are dashed vertical
+// lines with a short text ("→ 17"), the whole text in their tooltip; a text that would
+// overlap the one before it is left out (its line stays).
 class SignalPlotWindow : public QWidget {
     Q_OBJECT
 public:
     static constexpr int64_t kSpanMs = 10 * 60 * 1000;
-    // The unit a key's current display string shows, or "" (the app asks the display tree).
-    using UnitLookup = std::function<std::string(const std::string& key)>;
-
-    SignalPlotWindow(const SignalSampler& sampler, UnitLookup units, QWidget* parent = nullptr);
+    // A line is made once its key has a value, on the axis of the unit that value showed.
+    explicit SignalPlotWindow(const SignalSampler& sampler, QWidget* parent = nullptr);
     ~SignalPlotWindow() override;
 
     // Reads the sampler again (after a display tick or a new key) and redraws.
@@ -42,12 +44,13 @@ public:
     // Writes the sampler as CSV; false with *error when the file cannot be written.
     bool exportCsv(const QString& path, std::string* error) const;
 
-    // The text after a display string's number ("-95.50 dBm" -> "dBm"), "" without one.
-    static std::string unitOf(const std::string& display);
-
-    // The line of a key (nullptr until it has a point) and the marks shown in the span.
+    // The line of a key (nullptr until it has a point and a unit), its pieces after gaps,
+    // and the marks shown in the span (their whole texts).
     QLineSeries* seriesOf(const std::string& key) const;
+    std::vector<QLineSeries*> piecesOf(const std::string& key) const;
     std::vector<QString> shownMarks() const;
+    // "→ 17" for "Physical Cell ID 301 → 17, ...": what a mark's line is labelled with.
+    static QString shortMarkText(const std::string& text);
     QChart* chart() const { return chart_; }
     QScrollBar* scrollBar() const { return scroll_; }
     QPushButton* exportButton() const { return export_; }
@@ -68,9 +71,10 @@ private:
         QGraphicsRectItem* back = nullptr;        // holds the text
         QGraphicsSimpleTextItem* text = nullptr;
         int64_t timeMs = 0;
+        QString whole;
     };
 
-    void addLine(const std::string& key);
+    void addLine(const std::string& key, const std::string& unit);
     QLineSeries* newSeries(QValueAxis* axis, bool inLegend);
     QValueAxis* axisFor(const std::string& unit);
     void draw();
@@ -79,7 +83,6 @@ private:
     QString labelOf(const std::string& key) const;
 
     const SignalSampler& sampler_;
-    UnitLookup units_;
     QChart* chart_;
     QChartView* view_;
     QDateTimeAxis* timeAxis_;
@@ -93,6 +96,7 @@ private:
     int64_t first_ = 0, last_ = 0;               // the session's first and newest time
     int64_t start_ = 0;                          // the shown span's start
     bool following_ = true;                      // the span ends at the newest time
+    std::size_t colours_ = 0;                    // lines coloured so far
 };
 
 }  // namespace vantorel

@@ -5,7 +5,7 @@
 #include "App/SignalPlotWindow.h"
 #include "App/VantorelPaneController.h"
 #include "App/VantorelSaveViewController.h"
-#include "Model/MonitorClock.h"
+#include "Model/DisplayPath.h"
 #include "Model/VantorelModel.h"
 #include "Monitor/StatusText.h"
 #include "Platform/Preferences.h"
@@ -161,20 +161,14 @@ namespace vantorel {
 void VantorelApp::sampleSignals() {
     VantorelModel* m = model();
     if (!m) return;
-    const auto now = MonitorClock::current().now().time_since_epoch();
-    sampler_.sample(std::chrono::duration_cast<std::chrono::milliseconds>(now).count(),
-                    m->sourceStatus().decoderTechnology, m->pathIndex());
+    sampler_.sample(m->tickTimeMs(), m->sourceStatus().decoderTechnology, m->pathIndex());
     if (plotWindow_ && plotWindow_->isVisible()) plotWindow_->refresh();
 }
 
 void VantorelApp::showSignalPlot() {
     if (!_window) return;
     if (!plotWindow_) {
-        // The unit of a key is the one its display string shows now.
-        plotWindow_ = new SignalPlotWindow(sampler_, [this](const std::string& key) {
-            const NodeRef leaf = model() ? model()->nodeAtPath(key) : nullptr;
-            return leaf && leaf->value() ? SignalPlotWindow::unitOf(*leaf->value()) : std::string();
-        }, _window.get());
+        plotWindow_ = new SignalPlotWindow(sampler_, _window.get());
     }
     plotWindow_->refresh();
     plotWindow_->show();
@@ -183,7 +177,8 @@ void VantorelApp::showSignalPlot() {
 }
 
 void VantorelApp::plotValue(const std::string& path) {
-    sampler_.addKey(path);
+    // A value of a list entry follows its cell, not its position in the list.
+    sampler_.addKey(model() ? DisplayPath::following(path, model()->pathIndex()) : path);
     showSignalPlot();
 }
 

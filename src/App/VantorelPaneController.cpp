@@ -127,12 +127,11 @@ void VantorelPaneController::reloadWithNode(NodeRef node) {
     if (current.isValid() && current.row() < numberOfRowsInSection())
         currentName = _nodes->childNodes()->at(std::size_t(current.row()))->displayName();
 
-    const bool wasList = ListTableModel::isList(_nodes);
     _nodes = std::move(node);
     updateTitle();
     reloadData();
     updateListView();
-    if (wasList != ListTableModel::isList(_nodes)) createToolbarItems();
+    createToolbarItems();
 
     const std::vector<NodeRef>* children = _nodes ? _nodes->childNodes() : nullptr;
     for (std::size_t row = 0; currentName && children && row < children->size(); ++row) {

@@ -1,24 +1,51 @@
 // SignalSampler: reads the plotted leaves of the display tree once per display tick and notes technology changes and handovers.
 #include "Model/SignalSampler.h"
 
+#include "Model/DisplayPath.h"
 #include "Model/SignalValue.h"
 #include "Platform/TechnologyNames.h"
 #include "Platform/TelephonyIdentifiers.h"
 
 #include <algorithm>
+#include <set>
 
 namespace vantorel {
 
 namespace {
 
-// Neighbour lists are arrays shown as "0", "1", ... children in the decoder's order;
-// the LTE decoder lists measured neighbours strongest first, so the first entries are
-// the strongest ones.
-constexpr int kNeighbourEntries = 3;
+// A neighbour list whose strongest cells the plot follows, by the number at `leaf`, among
+// the entries `conditions` keep (DisplayPath's selector conditions).
+struct CellList {
+    const char* list;
+    const char* leaf;
+    const char* conditions;
+};
 
-std::vector<std::string> neighbourKeys(const std::string& list, const std::string& leaf) {
+std::vector<CellList> cellListsOf(const std::string& technology) {
+    if (technology == kTSLogChannelTechnology_Morvek_LTE) return {{"/Neighbours/Measured Neighbor Cells", "Filtered RSRP", ""}};
+    // The neighbour list holds the serving cell too, as its active-set entry.
+    if (technology == kTSLogChannelTechnology_Morvek_UTRAN2)
+        return {{"/Neighbours/Neighbor Cell List", "Filter RSCP", "Status!=ASET"}};
+    if (technology == kTSLogChannelTechnology_Morvek_GSM)
+        return {{"/GSM Neighbours/Neighboring Cells", "RSSI", ""}, {"/Cell Sets/Monitored Set", "RSCP", ""}};
+    if (technology == kTSLogChannelTechnology_IFX) return {{"/Neighbours", "RxLev", ""}};
+    return {};
+}
+
+// "<list>/[#n <leaf>,<conditions>]": the entry with the n-th highest number at leaf.
+std::string ranked(const CellList& cells, int n) {
+    std::string selector = "#" + std::to_string(n) + " " + cells.leaf;
+    if (*cells.conditions) selector += std::string(",") + cells.conditions;
+    return std::string(cells.list) + "/[" + selector + "]";
+}
+
+// The strongest cells' identity and value leaves, as CSV columns.
+std::vector<std::string> strongestKeys(const CellList& cells, const char* identity) {
     std::vector<std::string> keys;
-    for (int i = 0; i < kNeighbourEntries; ++i) keys.push_back(list + "/" + std::to_string(i) + "/" + leaf);
+    for (int n = 1; n <= SignalSampler::kStrongestCells; ++n) {
+        keys.push_back(ranked(cells, n) + "/" + identity);
+        keys.push_back(ranked(cells, n) + "/" + cells.leaf);
+    }
     return keys;
 }
 
@@ -27,43 +54,40 @@ std::vector<std::string> concat(std::vector<std::string> a, const std::vector<st
     return a;
 }
 
-const std::string* leafText(const PathDictionary& nodes, const std::string& path) {
-    auto it = nodes.find(path);
-    return it == nodes.end() || !it->second ? nullptr : it->second->value();
-}
-
 std::string lastComponent(const std::string& path) {
     const size_t slash = path.rfind('/');
     return slash == std::string::npos ? path : path.substr(slash + 1);
 }
 
+// Leaves a decoder does not show but its siblings give: UMTS transport-channel BLER as a
+// percentage of the CRC counts of the same window.
+constexpr const char* kBlerPercent = "BLER %";
+
 }  // namespace
 
-// Neighbour and cell-set lists take their first kNeighbourEntries entries (LTE's
-// connected-mode neighbours, UTRAN's neighbour list, whose first entry is the serving
-// cell), and of UTRAN's first CCTRCH its first time slot's SIR. GSM/UMTS shows no BLER ratio: its first transport channel's CRC error count
-// stands for it. The IFX decoder shows the modem's own display; these are the keys
-// of the IFX modem's serving cell and neighbour list.
 std::vector<std::string> SignalSampler::defaultKeys(const std::string& technology) {
+    const std::vector<CellList> cells = cellListsOf(technology);
     if (technology == kTSLogChannelTechnology_Morvek_LTE)
         return concat({"/Serving Cell/Serving Cell Measurements/Measured RSRP",
                        "/Serving Cell/Serving Cell Measurements/Measured RSRQ",
                        "/Serving Cell/Serving Cell Measurements/Measured RSSI",
                        "/Serving Cell/Connected mode LTE Intra-frequency Measurement/Serving Filtered RSRP"},
-                      neighbourKeys("/Neighbours/Measured Neighbor Cells", "Filtered RSRP"));
+                      strongestKeys(cells[0], "Physical Cell ID"));
+    // Of UTRAN's first CCTRCH its first time slot's SIR.
     if (technology == kTSLogChannelTechnology_Morvek_UTRAN2)
-        return concat(neighbourKeys("/Neighbours/Neighbor Cell List", "Filter RSCP"),
+        return concat(concat({"/Neighbours/Neighbor Cell List/[Status=ASET]/Filter RSCP"}, strongestKeys(cells[0], "Cell ID")),
                       {"/Link Quality/CCTRCH SIR/0/SIR/0", "/Link Quality/TRCH BLER/0/TRCH BLER Measurement"});
     if (technology == kTSLogChannelTechnology_Morvek_GSM)
-        return {"/Cell Sets/Active Set/0/RSCP", "/Cell Sets/Active Set/0/Energy Per Chip",
-                "/Radio Resources/GSM RR Info/Serving Rx Level", "/Serving Cell/GSM Serving Cell/RSSI",
-                "/Link Quality/BLER/Transport Channels/0/CRC Received in Error"};
+        return concat({"/Cell Sets/Active Set/0/RSCP", "/Cell Sets/Active Set/0/Energy Per Chip",
+                       "/Radio Resources/GSM RR Info/Serving Rx Level", "/Serving Cell/GSM Serving Cell/RSSI",
+                       std::string("/Link Quality/BLER/Transport Channels/0/") + kBlerPercent},
+                      strongestKeys(cells[0], "ARFCN"));
     if (technology == kTSLogChannelTechnology_Morvek_CDMA)
         return {"/1x/Rx AGC 0", "/1x/Frame Error Rate", "/EV-DO/Rx AGC 0", "/Data Rates/Forward Link",
                 "/Data Rates/Reverse Link"};
     if (technology == kTSLogChannelTechnology_IFX)
         return concat({"/Serving Cell/Measurement/RxLev", "/Serving Cell/Measurement/RxQual"},
-                      neighbourKeys("/Neighbours", "RxLev"));
+                      strongestKeys(cells[0], "ARFCN"));
     return {};
 }
 
@@ -92,6 +116,70 @@ void SignalSampler::addKey(const std::string& key) {
     if (std::find(keys_.begin(), keys_.end(), key) == keys_.end()) keys_.push_back(key);
 }
 
+std::optional<double> SignalSampler::valueAt(const std::string& key, const PathDictionary& nodes) {
+    if (lastComponent(key) == kBlerPercent) {
+        const std::string channel = key.substr(0, key.size() - std::string(kBlerPercent).size());
+        const std::string *errors = DisplayPath::leafText(channel + "CRC Received in Error", nodes),
+                          *received = DisplayPath::leafText(channel + "CRC Received", nodes);
+        const std::optional<double> e = errors ? SignalValue::parse(*errors) : std::nullopt,
+                                    r = received ? SignalValue::parse(*received) : std::nullopt;
+        if (!e || !r || *r <= 0) return std::nullopt;
+        return 100.0 * *e / *r;
+    }
+    const std::string* text = DisplayPath::leafText(key, nodes);
+    return text ? SignalValue::parse(*text) : std::nullopt;
+}
+
+std::optional<std::string> SignalSampler::unitAt(const std::string& key, const PathDictionary& nodes) {
+    if (lastComponent(key) == kBlerPercent) return "%";
+    const std::string* text = DisplayPath::leafText(key, nodes);
+    if (!text || !SignalValue::parse(*text)) return std::nullopt;
+    return SignalValue::unit(*text);
+}
+
+std::optional<std::string> SignalSampler::unit(const std::string& key) const {
+    const auto it = units_.find(key);
+    return it == units_.end() ? std::nullopt : std::optional<std::string>(it->second);
+}
+
+std::vector<std::string> SignalSampler::plotKeys() const {
+    std::vector<std::string> shown;
+    for (const std::string& key : keys_)
+        if (!DisplayPath::isRanked(key)) shown.push_back(key);
+    shown.insert(shown.end(), cellKeys_.begin(), cellKeys_.end());
+    return shown;
+}
+
+void SignalSampler::sampleCells(int64_t timeMs, const PathDictionary& nodes) {
+    std::set<std::string> strongest;
+    for (const CellList& cells : cellListsOf(technology_)) {
+        for (int n = 1; n <= kStrongestCells; ++n) {
+            const NodeRef entry = DisplayPath::resolve(ranked(cells, n), nodes);
+            const std::string identity = DisplayPath::identitySelector(entry);
+            if (identity.empty()) continue;
+            const std::string key = std::string(cells.list) + "/" + identity + "/" + cells.leaf;
+            strongest.insert(key);
+            if (!cellSeen_.count(key)) cellKeys_.push_back(key);
+            cellSeen_[key] = timeMs;
+        }
+    }
+    // Cells out of the strongest show a gap; beyond the budget the longest unseen go.
+    while (cellKeys_.size() > kMaxCellLines) {
+        auto oldest = std::min_element(cellKeys_.begin(), cellKeys_.end(),
+                                       [&](const std::string& a, const std::string& b) { return cellSeen_[a] < cellSeen_[b]; });
+        series_.remove(*oldest);
+        cellSeen_.erase(*oldest);
+        units_.erase(*oldest);
+        cellKeys_.erase(oldest);
+    }
+    for (const std::string& key : cellKeys_) {
+        const std::optional<double> value = strongest.count(key) ? valueAt(key, nodes) : std::nullopt;
+        series_.add(key, timeMs, value);
+        if (value && !units_.count(key))
+            if (const std::optional<std::string> unit = unitAt(key, nodes)) units_[key] = *unit;
+    }
+}
+
 void SignalSampler::sample(int64_t timeMs, const std::string& technology, const PathDictionary& nodes) {
     if (technology != technology_) {
         // The first technology starts the plot; a later one is marked, and the serving
@@ -105,11 +193,15 @@ void SignalSampler::sample(int64_t timeMs, const std::string& technology, const 
             for (const std::string& key : defaultKeys(technology)) addKey(key);
     }
 
+    series_.addTick(timeMs);
     lastRow_.assign(keys_.size(), std::nullopt);
     for (size_t i = 0; i < keys_.size(); ++i) {
-        if (const std::string* text = leafText(nodes, keys_[i])) lastRow_[i] = SignalValue::parse(*text);
+        lastRow_[i] = valueAt(keys_[i], nodes);
         series_.add(keys_[i], timeMs, lastRow_[i]);
+        if (lastRow_[i] && !units_.count(keys_[i]))
+            if (const std::optional<std::string> unit = unitAt(keys_[i], nodes)) units_[keys_[i]] = *unit;
     }
+    sampleCells(timeMs, nodes);
 
     // The serving cell's identity: every identity leaf must be in the tree; one that
     // shows nothing yet ("-", "") is part of it as text (GSM/UMTS shows one RAT's cell
@@ -118,7 +210,7 @@ void SignalSampler::sample(int64_t timeMs, const std::string& technology, const 
     std::vector<std::string> identity;
     bool shown = false;
     for (const std::string& path : identityPaths) {
-        const std::string* text = leafText(nodes, path);
+        const std::string* text = DisplayPath::leafText(path, nodes);
         if (!text) return;
         shown = shown || (!text->empty() && *text != "-");
         identity.push_back(*text);

@@ -5,24 +5,36 @@
 #include "Model/VantorelModelNode.h"
 
 #include <cstdint>
+#include <map>
 #include <optional>
 #include <string>
 #include <vector>
 
 namespace vantorel {
 
-// The keys are display-tree paths. Each tick reads the leaf at each key (SignalValue::parse of
-// its display string; a missing leaf or a text without a number is a gap), and compares the
-// technology and the serving cell's identity with the previous tick: a change of technology
-// adds a TechnologyChange mark, a changed identity (the identity leaves of
-// identityKeys(technology), all read as text, none missing) a Handover mark. A leaf that
-// shows nothing yet ("-") is text like any other; an identity showing nothing is none.
+// The keys are display-tree paths, list selectors included (DisplayPath): the CSV columns and
+// sparklines. Each tick reads the leaf at each key (SignalValue::parse of its display string;
+// a missing leaf or a text without a number is a gap); a key ending in a derived leaf
+// ("BLER %") is computed from its siblings. Besides the keys, the strongest cells of the
+// technology's neighbour lists get a line each, keyed by the cell's identity
+// ("/Neighbours/Measured Neighbor Cells/[Physical Cell ID=251]/Filtered RSRP"), so a plot
+// shows a neighbour appear, rise and take over; a cell out of the strongest is a gap in its
+// line. At most kMaxCellLines such lines are kept, the cells seen longest ago dropped first.
+// Each tick also compares the technology and the serving cell's identity with the previous
+// tick: a change of technology adds a TechnologyChange mark, a changed identity (the
+// identity leaves of identityKeys(technology), all read as text, none missing) a Handover
+// mark. A leaf that shows nothing yet ("-") is text like any other; an identity showing
+// nothing is none.
 class SignalSampler {
 public:
+    static constexpr int kStrongestCells = 3;
+    static constexpr size_t kMaxCellLines = 32;
+
     // The values that matter per technology (identifier as "GetTechnology" answers):
-    // LTE serving RSRP, RSRQ, RSSI and the strongest neighbours' RSRP; UTRAN serving and
-    // neighbour RSCP and SIR; GSM/UMTS RSCP, Ec/No, RxLev and BLER; CDMA Rx AGC, FER and
-    // data rates. Paths exist in that decoder's template.
+    // LTE serving RSRP, RSRQ, RSSI and the strongest neighbours' PCI and RSRP; UTRAN serving
+    // RSCP, the strongest other cells' identity and RSCP, SIR and BLER; GSM/UMTS RSCP, Ec/Io,
+    // RxLev, RSSI and BLER; CDMA Rx AGC, FER and data rates; IFX RxLev, RxQual and the
+    // strongest neighbours. Paths exist in that decoder's template.
     static std::vector<std::string> defaultKeys(const std::string& technology);
     // The leaves naming the serving cell (PCI + EARFCN, PSC + UARFCN, ARFCN + BSIC, Cell ID ...).
     static std::vector<std::string> identityKeys(const std::string& technology);
@@ -33,21 +45,36 @@ public:
     void setKeys(std::vector<std::string> keys);  // replaces the plotted keys (CSV --csv-keys)
     void addKey(const std::string& key);          // "Plot this value"; no-op when present
     const std::vector<std::string>& keys() const { return keys_; }
+    // What a plot draws: the keys but those ranking a list (the cell lines show those cells),
+    // then the cell lines, in the order they first appeared.
+    std::vector<std::string> plotKeys() const;
 
     // One display tick: `nodes` is the tree's path index (VantorelModel::nodeAtPath's).
     void sample(int64_t timeMs, const std::string& technology, const PathDictionary& nodes);
+    // The number a key shows in the tree now (derived leaves computed), or none.
+    static std::optional<double> valueAt(const std::string& key, const PathDictionary& nodes);
+    // The unit of a key's value ("dBm", "%", "" for a bare number); none while the key is not
+    // in the tree, so that a plot can wait to put it on an axis.
+    static std::optional<std::string> unitAt(const std::string& key, const PathDictionary& nodes);
 
     const SignalSeries& series() const { return series_; }
+    // The unit a key's values showed ("dBm", "" for bare numbers), known from its first value on.
+    std::optional<std::string> unit(const std::string& key) const;
     // The values of the last tick, one per key (for CSV rows and sparklines).
     const std::vector<std::optional<double>>& lastRow() const { return lastRow_; }
 
 private:
+    void sampleCells(int64_t timeMs, const PathDictionary& nodes);
+
     std::vector<std::string> keys_;
     bool keysChosen_ = false;  // setKeys/addKey: the defaults no longer apply
     SignalSeries series_;
     std::vector<std::optional<double>> lastRow_;
     std::string technology_;
     std::vector<std::string> identity_;  // empty until a tick showed all identity leaves
+    std::vector<std::string> cellKeys_;  // the cell lines, first seen first
+    std::map<std::string, int64_t> cellSeen_;  // cell line -> the last tick it was among the strongest
+    std::map<std::string, std::string> units_;  // key -> the unit its first value showed
 };
 
 }  // namespace vantorel

@@ -35,4 +35,14 @@ std::optional<double> SignalValue::parse(std::string_view display) {
     return negative ? -value : value;
 }
 
+std::string SignalValue::unit(std::string_view display) {
+    if (!parse(display)) return {};
+    size_t i = display.find_first_not_of(" \t");
+    if (display[i] == '-' || display[i] == '+') ++i;
+    i = display.find_first_not_of("0123456789.", i);
+    const size_t from = i == std::string_view::npos ? i : display.find_first_not_of(" \t", i);
+    if (from == std::string_view::npos || display[from] == '(') return {};
+    return std::string(display.substr(from, display.find(' ', from) - from));
+}
+
 }  // namespace vantorel

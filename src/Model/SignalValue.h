@@ -2,6 +2,7 @@
 #pragma once
 
 #include <optional>
+#include <string>
 #include <string_view>
 
 namespace vantorel {
@@ -15,6 +16,9 @@ public:
     // a hexadecimal "0x.." is not a measurement. Empty for texts without one ("Not Present",
     // "Unknown", "N/A", "", "nan dBm").
     static std::optional<double> parse(std::string_view display);
+    // The word after a display string's number ("-95.50 dBm" -> "dBm", "40 %" -> "%"), ""
+    // without one or without a number ("12 (old)" -> "").
+    static std::string unit(std::string_view display);
 };
 
 }  // namespace vantorel

@@ -181,6 +181,11 @@ SourceStatus VantorelModel::sourceStatus() const {
     return status;
 }
 
+int64_t VantorelModel::tickTimeMs() const {
+    if (status_.isReplay && status_.recordedAt.isValid()) return status_.recordedAt.toMSecsSinceEpoch();
+    return std::chrono::duration_cast<std::chrono::milliseconds>(MonitorClock::current().now().time_since_epoch()).count();
+}
+
 void VantorelModel::tellApplication() {
     if (application_)
         QMetaObject::invokeMethod(

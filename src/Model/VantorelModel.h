@@ -67,6 +67,9 @@ public:
     // service's notifications name it.
     void setSource(std::string description, bool isReplay, bool authoritative);
     SourceStatus sourceStatus() const;
+    // The time a display tick stands for, in ms since 1970: for a replay, the recorded time
+    // of its last message as the service last told it; the wall clock otherwise.
+    int64_t tickTimeMs() const;
 
 signals:
     // A display tick that found new data: the tree is rebuilt on the next read, and

@@ -59,14 +59,16 @@ std::string SignalCsvWriter::row(std::optional<int64_t> timeMs, const std::vecto
 }
 
 std::string SignalCsvWriter::fromSeries(const SignalSeries& series) const {
-    // Keys are sampled on the same ticks; thinning and gaps leave some keys without a
-    // point at a tick, which shows as an empty cell.
+    // A row per display tick the series kept, as the command line writes one per tick (the
+    // older ones thinned as the series thins them); a gap, or a key without a point at that
+    // tick, is an empty cell.
     std::map<int64_t, std::vector<std::optional<double>>> rows;
+    for (int64_t time : series.ticks()) rows[time].resize(keys_.size());
     for (size_t k = 0; k < keys_.size(); ++k)
         for (const SignalSeries::Point& p : series.points(keys_[k])) {
             auto& values = rows[p.timeMs];
             values.resize(keys_.size());
-            values[k] = p.value;
+            if (!SignalSeries::isGap(p)) values[k] = p.value;
         }
     std::string text = header();
     for (const auto& [time, values] : rows) text += row(time, values);

@@ -1,7 +1,6 @@
 // WatchCommand: `vantorel-cli watch` runs the monitor with the terminal view as its application object.
 #include "cli/WatchCommand.h"
 
-#include "Model/MonitorClock.h"
 #include "Model/VantorelModel.h"
 #include "Platform/SystemLog.h"
 #include "Monitor/MonitorLauncher.h"
@@ -10,7 +9,6 @@
 
 #include <QCommandLineParser>
 
-#include <chrono>
 #include <cstdio>
 
 namespace vantorel {
@@ -49,9 +47,7 @@ int WatchCommand::run(const QStringList& args) {
     const int code = TerminalView::run(*source, "vantorel-cli watch", plots, [&csv](VantorelModel& model) {
         if (!csv.enabled()) return;
         QObject::connect(&model, &VantorelModel::displayTicked, &model, [&csv, &model] {
-            const auto now = MonitorClock::current().now().time_since_epoch();
-            csv.tick(std::chrono::duration_cast<std::chrono::milliseconds>(now).count(),
-                     model.sourceStatus().decoderTechnology, model.pathIndex());
+            csv.tick(model.tickTimeMs(), model.sourceStatus().decoderTechnology, model.pathIndex());
         });
     });
     if (!csv.finish("", &error)) {

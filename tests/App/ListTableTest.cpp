@@ -56,8 +56,16 @@ TEST(ListTableModel, RowsAreEntriesAndColumnsTheUnionOfTheirKeysOnlyForListsOfDi
     EXPECT_EQ(model.rowOfIdentity(model.identity(1)), 1);
     for (const NodeRef& notList : {root, child(root, "RSRP"), NodeRef()}) {
         model.setList(notList);
-        EXPECT_EQ(model.rowCount() + model.columnCount(), 0);
+        EXPECT_EQ(model.rowCount(), 0);
     }
+    // Entries that show their keys in another order, or lack some, move no column.
+    auto list = Array::create();
+    list->append(dict({{"Note", "strong"}, {"RSRP", "-80 dBm"}, {"E-ARFCN", "6300"}}));
+    model.setList(child(panetest::makeTree(dict({{"Neighbours", Value(list)}})), "Neighbours"));
+    std::vector<std::string> headers;
+    for (int c = 0; c < model.columnCount(); ++c) headers.push_back(model.key(c));
+    EXPECT_EQ(headers, (std::vector<std::string>{"Physical Cell ID", "RSRP", "Note", "E-ARFCN"}));
+    EXPECT_EQ(column(model, 1), (std::vector<std::string>{"-80 dBm"}));
 }
 
 TEST(ListTableView, TheSelectedCellStaysSelectedWhenARefreshReordersTheEntriesAndNumbersSortByValue) {

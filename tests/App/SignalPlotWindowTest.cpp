@@ -15,14 +15,15 @@ using panetest::dict;
 
 TEST(SignalPlotWindow, ShowsTheNewestTenMinutesOfEachKeyWithItsMarksScrollsBackAndExportsTheSession) {
     SignalSampler sampler;
-    sampler.setKeys({"/Cell/RSRP", "/Cell/Load"});
-    SignalPlotWindow plot(sampler, [](const std::string& key) { return std::string(key == "/Cell/RSRP" ? "dBm" : "%"); });
+    sampler.setKeys({"/Cell/RSRP", "/Cell/Load", "/Cell/Late"});
+    SignalPlotWindow plot(sampler);
     const int64_t t0 = 1'700'000'000'000;
     for (int i = 0; i <= 600; ++i) {  // 20 minutes, a tick every 2 s; the technology changes at 15 minutes
         PathDictionary paths;
         const std::string rsrp = "-" + std::to_string(80 + i % 30) + ".50 dBm";
         VantorelModelNode::makeTreeFromObject(
-            dict({{"Cell", dict({{"RSRP", rsrp.c_str()}, {"Load", i % 100 == 50 ? "Unknown" : "40 %"}})}}), paths);
+            dict({{"Cell", dict({{"RSRP", rsrp.c_str()}, {"Load", i % 100 == 50 ? "Unknown" : "40 %"}, {"Late", "-"}})}}),
+            paths);
         sampler.sample(t0 + i * 2000, i < 450 ? "A" : "B", paths);
     }
     plot.refresh();
@@ -31,12 +32,14 @@ TEST(SignalPlotWindow, ShowsTheNewestTenMinutesOfEachKeyWithItsMarksScrollsBackA
     EXPECT_EQ(plot.seriesOf("/Cell/RSRP")->count(), 302);  // the span and one point before it
     EXPECT_EQ(plot.seriesOf("/Cell/RSRP")->at(301), QPointF(double(t0 + 1'200'000), -80.5));
     EXPECT_NE(plot.seriesOf("/Cell/RSRP")->attachedAxes(), plot.seriesOf("/Cell/Load")->attachedAxes());
-    EXPECT_EQ(plot.shownMarks().size(), 1u);
+    EXPECT_EQ(plot.shownMarks(), std::vector<QString>{"A \u2192 B"});
+    EXPECT_EQ(plot.seriesOf("/Cell/Late"), nullptr) << "a key that never had a value";
 
     plot.scrollBar()->setValue(0);
     EXPECT_EQ(plot.spanStart(), t0);
     EXPECT_TRUE(plot.shownMarks().empty());
     EXPECT_EQ(plot.seriesOf("/Cell/Load")->count(), 50);  // up to its first gap
+    EXPECT_EQ(plot.piecesOf("/Cell/Load").size(), 4u);   // broken at ticks 50, 150 and 250
     plot.refresh();
     EXPECT_EQ(plot.spanStart(), t0);  // a refresh leaves a scrolled-back view where it is
 
@@ -46,7 +49,16 @@ TEST(SignalPlotWindow, ShowsTheNewestTenMinutesOfEachKeyWithItsMarksScrollsBackA
     QFile csv(dir.filePath("signal.csv"));
     ASSERT_TRUE(csv.open(QIODevice::ReadOnly));
     const QList<QByteArray> lines = csv.readAll().split('\n');
-    EXPECT_EQ(lines.front().trimmed(), "time,/Cell/RSRP,/Cell/Load");
+    EXPECT_EQ(lines.front().trimmed(), "time,/Cell/RSRP,/Cell/Load,/Cell/Late");
     EXPECT_EQ(lines.size(), 603);  // header, 601 rows, the empty text after the last line end
     EXPECT_FALSE(plot.exportCsv(dir.filePath("no/such/dir/signal.csv"), &error));
+}
+
+TEST(SignalPlotWindow, AMarkIsLabelledWithWhatItChangedTo) {
+    const std::vector<std::pair<std::string, QString>> rows = {
+        {"Physical Cell ID 301 \u2192 17, Download Frequency 6300 \u2192 6400", "\u2192 17"},
+        {"LTE \u2192 UTRAN (TD-SCDMA)", "\u2192 UTRAN (TD-SCDMA)"},
+        {"no arrow in this one at all", "no arrow in "},
+    };
+    for (const auto& [text, label] : rows) EXPECT_EQ(SignalPlotWindow::shortMarkText(text), label) << text;
 }

@@ -13,6 +13,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <clocale>
 #include <memory>
 
@@ -42,28 +43,43 @@ TEST(SignalValue, TakesTheLeadingNumberWhateverTheLocale) {
     std::setlocale(LC_ALL, previous.c_str());
 }
 
-TEST(SignalSeries, ADayOfTicksStaysBoundedKeepingOrderAndBothEnds) {
+size_t valuesOf(const std::deque<SignalSeries::Point>& points) {
+    return size_t(std::count_if(points.begin(), points.end(), [](const auto& p) { return !SignalSeries::isGap(p); }));
+}
+
+TEST(SignalSeries, ADayOfTicksStaysBoundedKeepingOrderBothEndsAndTheGaps) {
     SignalSeries series;
-    constexpr int64_t kTicks = 24 * 3600 / 2, kKeys = 10;
-    for (int64_t t = 0; t < kTicks; ++t)
-        for (int k = 0; k < kKeys; ++k)
-            series.add("k" + std::to_string(k), t * 2000, k == 9 && t % 2 ? std::nullopt : std::optional<double>(t));
+    constexpr int64_t kTicks = 24 * 3600 / 2;
+    // k0 always has a value; k1 misses 5 ticks in every 1000; k2 every second tick.
+    auto value = [](int key, int64_t t) -> std::optional<double> {
+        if ((key == 1 && t % 1000 >= 995) || (key == 2 && t % 2)) return std::nullopt;
+        return double(t);
+    };
+    for (int64_t t = 0; t < kTicks; ++t) {
+        series.addTick(t * 2000);
+        for (int k = 0; k < 3; ++k) series.add("k" + std::to_string(k), t * 2000, value(k, t));
+    }
     size_t total = 0;
     for (const std::string& key : series.keys()) {
         const auto& points = series.points(key);
         SCOPED_TRACE(key);
         ASSERT_LE(points.size(), SignalSeries::kMaxPoints);
-        EXPECT_GT(points.size(), SignalSeries::kMaxPoints / 2);
-        EXPECT_EQ(points.front().timeMs, 0);
         for (size_t i = 1; i < points.size(); ++i) ASSERT_LT(points[i - 1].timeMs, points[i].timeMs);
         // The latest minutes stay at full resolution.
-        EXPECT_EQ(points[points.size() - 2].timeMs, points.back().timeMs - (key == "k9" ? 4000 : 2000));
+        EXPECT_EQ(points[points.size() - 2].timeMs, points.back().timeMs - 2000);
         total += points.size();
     }
     EXPECT_EQ(series.pointCount(), total);
+    EXPECT_EQ(series.points("k0").front().timeMs, 0);
+    EXPECT_GT(series.points("k0").size(), SignalSeries::kMaxPoints / 2);
     EXPECT_EQ(series.points("k0").back().timeMs, (kTicks - 1) * 2000);
     EXPECT_EQ(series.latest("k0"), double(kTicks - 1));
-    EXPECT_EQ(series.latest("k9"), std::nullopt);  // the last tick was a gap
+    EXPECT_EQ(series.latest("k2"), std::nullopt);  // the last tick was a gap
+    // Every run of missing ticks still breaks k1's line, the oldest ones too.
+    const auto& k1 = series.points("k1");
+    EXPECT_EQ(k1.size() - valuesOf(k1), size_t(kTicks / 1000));
+    EXPECT_LE(series.ticks().size(), SignalSeries::kMaxPoints);
+    EXPECT_EQ(series.ticks().front(), 0);
     for (int m = 0; m < 5000; ++m) series.addMark({m, SignalSeries::Mark::Kind::Handover, ""});
     EXPECT_LE(series.marks().size(), SignalSeries::kMaxMarks);
     EXPECT_EQ(series.marks().front().timeMs, 0);
@@ -103,7 +119,7 @@ TEST(SignalSampler, MarksHandoversAndTechnologyChangesOncePerChange) {
                                                "12000 H Cell Scrambling Code 11 → 24"}));
     // Chosen keys stay chosen across the technology change; the last tick had neither value.
     EXPECT_EQ(sampler.keys().size(), 2u);
-    EXPECT_EQ(sampler.series().points("/Serving Cell/Serving Cell Info/Physical Cell ID").size(), 4u);
+    EXPECT_EQ(valuesOf(sampler.series().points("/Serving Cell/Serving Cell Info/Physical Cell ID")), 4u);
     EXPECT_EQ(sampler.lastRow(), (std::vector<std::optional<double>>{std::nullopt, std::nullopt}));
 }
 
