@@ -66,6 +66,11 @@ constexpr const char* kBlerPercent = "BLER %";
 }  // namespace
 
 std::vector<std::string> SignalSampler::defaultKeys(const std::string& technology) {
+    // The serving cell's identity first, so that a CSV row says which cell its values are of.
+    return concat(identityKeys(technology), valueKeys(technology));
+}
+
+std::vector<std::string> SignalSampler::valueKeys(const std::string& technology) {
     const std::vector<CellList> cells = cellListsOf(technology);
     if (technology == kTSLogChannelTechnology_Morvek_LTE)
         return concat({"/Serving Cell/Serving Cell Measurements/Measured RSRP",
@@ -143,9 +148,13 @@ std::optional<std::string> SignalSampler::unit(const std::string& key) const {
 }
 
 std::vector<std::string> SignalSampler::plotKeys() const {
+    // The serving cell's identity is shown by the handover marks, a ranked entry by its cell's line.
+    const std::vector<std::string> identity = identityKeys(technology_);
     std::vector<std::string> shown;
     for (const std::string& key : keys_)
-        if (!DisplayPath::isRanked(key)) shown.push_back(key);
+        if (!DisplayPath::isRanked(key) &&
+            !(defaults_.count(key) && std::find(identity.begin(), identity.end(), key) != identity.end()))
+            shown.push_back(key);
     shown.insert(shown.end(), cellKeys_.begin(), cellKeys_.end());
     return shown;
 }
@@ -190,7 +199,11 @@ void SignalSampler::sample(int64_t timeMs, const std::string& technology, const 
         technology_ = technology;
         identity_.clear();
         if (!keysChosen_)
-            for (const std::string& key : defaultKeys(technology)) addKey(key);
+            for (const std::string& key : defaultKeys(technology))
+                if (std::find(keys_.begin(), keys_.end(), key) == keys_.end()) {
+                    keys_.push_back(key);
+                    defaults_.insert(key);
+                }
     }
 
     series_.addTick(timeMs);

@@ -6,6 +6,7 @@
 
 #include <cstdint>
 #include <map>
+#include <set>
 #include <optional>
 #include <string>
 #include <vector>
@@ -36,6 +37,8 @@ public:
     // RxLev, RSSI and BLER; CDMA Rx AGC, FER and data rates; IFX RxLev, RxQual and the
     // strongest neighbours. Paths exist in that decoder's template.
     static std::vector<std::string> defaultKeys(const std::string& technology);
+    // The same without the serving cell's identity (identityKeys) in front.
+    static std::vector<std::string> valueKeys(const std::string& technology);
     // The leaves naming the serving cell (PCI + EARFCN, PSC + UARFCN, ARFCN + BSIC, Cell ID ...).
     static std::vector<std::string> identityKeys(const std::string& technology);
 
@@ -45,8 +48,9 @@ public:
     void setKeys(std::vector<std::string> keys);  // replaces the plotted keys (CSV --csv-keys)
     void addKey(const std::string& key);          // "Plot this value"; no-op when present
     const std::vector<std::string>& keys() const { return keys_; }
-    // What a plot draws: the keys but those ranking a list (the cell lines show those cells),
-    // then the cell lines, in the order they first appeared.
+    // What a plot draws: the keys but those ranking a list (the cell lines show those cells)
+    // and the default serving-cell identity (the handover marks show it), then the cell lines,
+    // in the order they first appeared.
     std::vector<std::string> plotKeys() const;
 
     // One display tick: `nodes` is the tree's path index (VantorelModel::nodeAtPath's).
@@ -75,6 +79,7 @@ private:
     std::vector<std::string> cellKeys_;  // the cell lines, first seen first
     std::map<std::string, int64_t> cellSeen_;  // cell line -> the last tick it was among the strongest
     std::map<std::string, std::string> units_;  // key -> the unit its first value showed
+    std::set<std::string> defaults_;            // keys that came with a technology, not chosen
 };
 
 }  // namespace vantorel

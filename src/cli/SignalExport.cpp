@@ -1,6 +1,7 @@
 // SignalExport: samples the display tree at each tick and appends the row to the CSV file, with the gpsd position when asked.
 #include "cli/SignalExport.h"
 
+#include "Model/DisplayPath.h"
 #include "Monitor/GpsPosition.h"
 
 #include <QCommandLineParser>
@@ -20,7 +21,9 @@ void SignalExport::addOptions(QCommandLineParser& parser, bool live) {
                       "FILE"});
     parser.addOption({"csv-keys",
                       "The CSV's columns: display paths separated by commas (\"/Serving Cell/Serving Cell "
-                      "Measurements/Measured RSRP\"); default: the technology's signal values.",
+                      "Measurements/Measured RSRP\"; a list entry by its cell, \"/Neighbours/Measured Neighbor "
+                      "Cells/[Physical Cell ID=251]/Filtered RSRP\", or by rank, \"[#1 Filtered RSRP]\"); default: the "
+                      "serving cell's identity and the signal values of the first technology seen.",
                       "KEYS"});
     if (live)
         parser.addOption({"gps", "Add latitude, longitude and speed (m/s) columns to the CSV from gpsd on "
@@ -28,11 +31,23 @@ void SignalExport::addOptions(QCommandLineParser& parser, bool live) {
 }
 
 std::vector<std::string> SignalExport::splitKeys(const QString& list) {
+    // Commas inside a list selector ("[UARFCN=10055,Cell ID=11]") belong to the key.
     std::vector<std::string> keys;
-    for (const QString& part : list.split(',', Qt::SkipEmptyParts)) {
-        const QString key = part.trimmed();
-        if (!key.isEmpty()) keys.push_back(key.toStdString());
+    QString key;
+    int depth = 0;
+    auto flush = [&] {
+        if (!key.trimmed().isEmpty()) keys.push_back(key.trimmed().toStdString());
+        key.clear();
+    };
+    for (const QChar c : list) {
+        if (c == ',' && depth == 0) {
+            flush();
+            continue;
+        }
+        depth += c == '[' ? 1 : c == ']' && depth > 0 ? -1 : 0;
+        key += c;
     }
+    flush();
     return keys;
 }
 
@@ -79,7 +94,7 @@ void SignalExport::tick(std::optional<int64_t> timeMs, const std::string& techno
     if (!enabled() || !openWriter(technology)) return;
     sampler_.sample(timeMs.value_or(0), technology, nodes);
     for (const std::string& key : chosenKeys_)
-        if (!seen_.count(key) && nodes.count(key)) seen_.insert(key);
+        if (!seen_.count(key) && (DisplayPath::resolve(key, nodes) || SignalSampler::valueAt(key, nodes))) seen_.insert(key);
     const auto position = position_ ? position_->position() : std::nullopt;
     if (!writer_->writeRow(timeMs, sampler_.lastRow(), position)) {
         failed_ = true;

@@ -23,7 +23,8 @@ class SignalExport {
 public:
     // `live`: watch (wall-clock rows, --gps); otherwise decode (recorded time).
     static void addOptions(QCommandLineParser& parser, bool live);
-    // "K1,K2" → the keys; empty parts are dropped, spaces inside a key are kept.
+    // "K1,K2" → the keys; empty parts are dropped, spaces inside a key are kept, and so are
+    // commas inside a key's list selector ("[UARFCN=10055,Cell ID=11]").
     static std::vector<std::string> splitKeys(const QString& list);
 
     SignalExport();

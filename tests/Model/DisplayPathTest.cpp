@@ -130,6 +130,10 @@ TEST(SignalSampler, LinesFollowTheStrongestCellsWhateverTheirPlaceInTheList) {
     const std::vector<std::string> plotted = sampler.plotKeys();
     EXPECT_EQ(std::count_if(plotted.begin(), plotted.end(), [](const std::string& k) { return DisplayPath::isRanked(k); }), 0);
     EXPECT_EQ(std::count(plotted.begin(), plotted.end(), cell("40")), 1);
+    // The serving cell's identity is a CSV column, and a handover mark rather than a line.
+    const std::string pci = "/Serving Cell/Serving Cell Info/Physical Cell ID";
+    EXPECT_EQ(std::count(sampler.keys().begin(), sampler.keys().end(), pci), 1);
+    EXPECT_EQ(std::count(plotted.begin(), plotted.end(), pci), 0);
 
     // The CSV columns rank the cells: the strongest now is 20, then none.
     const std::vector<std::string>& keys = sampler.keys();

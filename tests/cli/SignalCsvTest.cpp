@@ -5,6 +5,7 @@
 
 #include <QDateTime>
 #include <QFile>
+#include <QRegularExpression>
 #include <QTemporaryDir>
 #include <gtest/gtest.h>
 
@@ -31,7 +32,11 @@ TEST(SignalCsv, AReplayGivesOneRowPerRecordedTickWithTheSignalColumns) {
     ASSERT_EQ(run.code, 0) << run.err;
     const QStringList lines = csvLines(out);
     ASSERT_GT(lines.size(), 1000);  // 2 h 48 min of recording with gaps
-    EXPECT_TRUE(lines[0].startsWith("time,/Serving Cell/Serving Cell Measurements/Measured RSRP,")) << lines[0].toStdString();
+    // The serving cell's identity first, then the values.
+    EXPECT_TRUE(lines[0].startsWith("time,/Serving Cell/Serving Cell Info/Physical Cell ID,/Serving Cell/Serving Cell "
+                                    "Info/Download Frequency,/Serving Cell/Serving Cell Measurements/Measured RSRP,"))
+        << lines[0].toStdString();
+    EXPECT_TRUE(lines.filter(QRegularExpression("^[^,]*,337,37900,")).size() > 100) << "the cell each row is of";
     const qsizetype columns = lines[0].count(',');
     qint64 previous = 0;
     for (const QString& line : lines.mid(1)) {
@@ -48,12 +53,13 @@ TEST(SignalCsv, AReplayGivesOneRowPerRecordedTickWithTheSignalColumns) {
     // A capture with measurements fills the RSRP column; chosen keys replace the defaults.
     const QString measured = dir.filePath("measured.csv");
     run = decode({"--technology", "lte", "--csv", measured, "--csv-keys",
-                  "/Serving Cell/Serving Cell Measurements/Measured RSRP, /No Such/Key",
+                  "/Serving Cell/Serving Cell Measurements/Measured RSRP, /No Such/[A=1,B=2]/Key",
                   kCaptures + "/offline_log_example.mi2log"});
     ASSERT_EQ(run.code, 0) << run.err;
-    EXPECT_EQ(csvLines(measured), (QStringList{"time,/Serving Cell/Serving Cell Measurements/Measured RSRP,/No Such/Key",
-                                               "2016-03-23T21:55:50.881Z,-96.56,"}));
-    EXPECT_NE(run.err.find("--csv-keys (their columns are empty):\n  /No Such/Key\n"), std::string::npos) << run.err;
+    EXPECT_EQ(csvLines(measured),
+              (QStringList{"time,/Serving Cell/Serving Cell Measurements/Measured RSRP,\"/No Such/[A=1,B=2]/Key\"",
+                           "2016-03-23T21:55:50.881Z,-96.56,"}));
+    EXPECT_NE(run.err.find("--csv-keys (their columns are empty):\n  /No Such/[A=1,B=2]/Key\n"), std::string::npos) << run.err;
 }
 
 TEST(SignalCsv, MisuseIsRefusedBeforeDecoding) {
