@@ -114,7 +114,7 @@ void VantorelModel::invalidationCallback(LocalMessagePort* port) {
 
 void VantorelModel::serviceNotificationCallback(const std::string&, const Value& info) {
     readBackendState(info);
-    refresh();
+    refresh(false);
 }
 
 // The backend's state notification: any key may be missing or of the wrong type
@@ -293,7 +293,7 @@ void VantorelModel::configureGenerator() {
     SystemLog::log(SystemLog::kError, "Got log generated: %p", static_cast<void*>(_logGenerator.get()));
 }
 
-void VantorelModel::refresh() {
+void VantorelModel::refresh(bool displayTick) {
     // Channel probe: a dead send port invalidates the receive port, whose callback
     // logs and restarts the monitor.
     if (_recvPort && _sendPort && !_sendPort->isValid()) _recvPort->invalidate();
@@ -302,16 +302,21 @@ void VantorelModel::refresh() {
     if (noRecord != status_.noRecordForDecoder) statusChanged_ = true;
     status_.noRecordForDecoder = noRecord;
 
-    if (!_updated && !statusChanged_) return;
     if (_updated) {
         _nodes.reset();
         _nodesByPath.clear();
+        newSinceTick_ = true;
     }
-    const bool ticked = _updated;
+    const bool changed = _updated || statusChanged_;
     _updated = false;
     statusChanged_ = false;
-    if (ticked) emit displayTicked();
-    tellApplication();
+    // Samples are taken on the timer's ticks only, so they come at its pace whatever the
+    // service's notifications show in between.
+    if (displayTick && newSinceTick_) {
+        newSinceTick_ = false;
+        emit displayTicked();
+    }
+    if (changed) tellApplication();
 }
 
 void VantorelModel::updateWithData(ByteView data) {

@@ -45,7 +45,9 @@ public:
     void startMonitor();
     void restartMonitor();
     void configureGenerator();
-    void refresh();
+    // displayTick: the display timer's tick, at which observers sample the display; a
+    // service notification refreshes the view without being one.
+    void refresh(bool displayTick = true);
     void updateWithData(ByteView data);
 
     // The display tree, rebuilt at most once per refresh that saw new data.
@@ -112,6 +114,7 @@ private:
     SourceStatus status_;
     bool sourceFixed_ = false;
     bool statusChanged_ = false;
+    bool newSinceTick_ = false;  // data shown since the last display tick's displayTicked
     std::chrono::system_clock::time_point streamingSince_;
 };
 

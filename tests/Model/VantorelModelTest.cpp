@@ -111,9 +111,16 @@ TEST_F(VantorelModelTest, AServiceNotificationRefreshesWithoutWaitingForTheTick)
     clock.tick = std::chrono::seconds(60);
     auto model = runningModel();
     clock.tick = FastMonitorClock::kTick;
+    int ticks = 0;
+    QObject::connect(model.get(), &VantorelModel::displayTicked, [&] { ++ticks; });
     model->updateWithData(rrcRecord(1));
     service.notify("BackendStateChanged");
     EXPECT_TRUE(waitUntil([&] { return app.updates == 1; }, 2000));
+    // Samples keep the timer's pace: the data the notification showed is sampled at the next tick, once.
+    EXPECT_EQ(ticks, 0);
+    model->refresh();  // the display timer's tick
+    model->refresh();
+    EXPECT_EQ(ticks, 1);
 }
 
 TEST_F(VantorelModelTest, ClosingThePortsOnPurposeNeverRestartsButLosingThemAlwaysDoes) {
