@@ -223,6 +223,13 @@ void SignalPlotWindow::draw() {
         }
         line.series->replace(pieces.front());
         while (line.pieces.size() + 1 < pieces.size()) line.pieces.push_back(newSeries(line.axis, false));
+        // Pieces the span no longer needs leave the chart: each is a series laid out and redrawn
+        // at every tick, and kept they would add up to the most gaps any span of the session had.
+        while (line.pieces.size() + 1 > pieces.size()) {
+            chart_->removeSeries(line.pieces.back());
+            delete line.pieces.back();
+            line.pieces.pop_back();
+        }
         for (std::size_t i = 0; i < line.pieces.size(); ++i) {
             if (line.pieces[i]->pen() != line.series->pen()) line.pieces[i]->setPen(line.series->pen());
             line.pieces[i]->replace(i + 1 < pieces.size() ? pieces[i + 1] : QList<QPointF>());

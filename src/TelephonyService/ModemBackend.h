@@ -45,6 +45,9 @@ public:
     virtual void start() = 0;
     // Stops streaming; the state becomes Idle.
     virtual void stop() = 0;
+    // Waits, running this thread's event loop at most timeoutMs, until what a stop() set off
+    // has ended (a live modem's clearing sequence answered), so that the backend can go.
+    virtual void finishStopping(int timeoutMs) { (void)timeoutMs; }
 
     // The ordinary log codes the streaming channels want (all: at least one wants every
     // code); a backend that talks to a real modem sets the modem's log mask from it.

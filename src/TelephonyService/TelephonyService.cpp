@@ -193,8 +193,13 @@ void TelephonyService::stop() {
     for (const auto& entry : channels_) numbers.push_back(entry.first);
     for (uint64_t number : numbers) closeChannel(number, "the service stopped");
     if (backend_) {
-        disconnect(backend_.get(), nullptr, this, nullptr);
+        // Its last status lines (a modem's logging switched off) still come through.
+        disconnect(backend_.get(), &ModemBackend::messageReady, this, nullptr);
+        disconnect(backend_.get(), &ModemBackend::stateChanged, this, nullptr);
+        disconnect(backend_.get(), &ModemBackend::technologyChanged, this, nullptr);
         backend_->stop();
+        backend_->finishStopping(kBackendStopMs);
+        disconnect(backend_.get(), nullptr, this, nullptr);
     }
     if (port_) {
         port_->setInvalidationCallback(nullptr);

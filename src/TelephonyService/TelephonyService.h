@@ -98,6 +98,8 @@ public:
     static constexpr int kChannelPortPeers = 4;
     static constexpr int kUnclaimedChannelMs = 3000;
     static constexpr int kClientLookupTimeoutMs = 500;
+    // How long stop() waits for the backend to let go of its modem.
+    static constexpr int kBackendStopMs = 2000;
 
     struct Counters {
         uint64_t messagesSent = 0;       // Message frames posted to clients (one per channel)

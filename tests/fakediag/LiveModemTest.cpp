@@ -95,7 +95,9 @@ TEST(FakeDiagModem, AnswersAsAModemAndKeepsTheMaskItWasGiven) {
         const Bytes reply = modem.answer(row.request);
         ASSERT_GE(reply.size(), row.replyStart.size()) << row.what;
         EXPECT_EQ(Bytes(reply.begin(), reply.begin() + long(row.replyStart.size())), row.replyStart) << row.what;
-        if (row.after) EXPECT_TRUE(row.after(modem)) << row.what;
+        if (row.after) {
+            EXPECT_TRUE(row.after(modem)) << row.what;
+        }
     }
     // What a host reads from the version and build-ID replies.
     EXPECT_GE(modem.answer(DiagCommand::version()).size(), 47u);
@@ -127,7 +129,9 @@ TEST(LiveModem, TheHandshakeEnablesTheWantedCodesOnlyAndStoppingLeavesTheModemQu
     EXPECT_LE(modem.requests().size() - before, 2u) << "only equipments 0xB and 7 change";
 
     host.backend.stop();
+    host.backend.finishStopping(3000);
     EXPECT_FALSE(modem.responder().logging());
+    EXPECT_EQ(host.backend.session(), nullptr) << "the port is closed once the modem answered";
     ASSERT_GE(modem.requests().size(), 3u);
     EXPECT_EQ(std::vector<Bytes>(modem.requests().end() - 3, modem.requests().end()), kClearing);
     EXPECT_EQ(std::vector<Bytes>(modem.requests().begin(), modem.requests().begin() + 3), kClearing)
@@ -351,7 +355,8 @@ TEST(LiveModemPrograms, ACaptureThroughTheFakeModemShowsWhatDecodeShowsAndTheMod
 
     watch.terminate();
     service.terminate();  // SIGTERM, as Ctrl-C
-    EXPECT_EQ(lastRequests(requests, 3), kClearingLines);
+    // The modem may still be reading the last request when the host has gone.
+    EXPECT_TRUE(waitUntil([&] { return lastRequests(requests, 3) == kClearingLines; }, 3000)) << lastRequests(requests, 3);
     EXPECT_EQ(decode({qmdl}), expected) << "the raw stream the service recorded decodes as the capture did";
     fake.terminate();
     EXPECT_TRUE(fake.says("logging off at exit", 1000)) << fake.said;
@@ -368,7 +373,8 @@ TEST(LiveModemPrograms, AMonitorWithItsOwnServiceLeavesTheModemQuietWhenItEnds) 
     ASSERT_TRUE(fake.says("logging on", 10000)) << fake.said;
     watch.terminate();
     EXPECT_TRUE(fake.says("logging off", 3000)) << fake.said;
-    EXPECT_EQ(lastRequests(requests, 3), kClearingLines);
+    // The modem may still be reading the last request when the host has gone.
+    EXPECT_TRUE(waitUntil([&] { return lastRequests(requests, 3) == kClearingLines; }, 3000)) << lastRequests(requests, 3);
 }
 
 }  // namespace

@@ -8,6 +8,8 @@
 #include "TelephonyService/Device/DiagPort.h"
 #include "TelephonyService/Device/DiagSession.h"
 
+#include <QEventLoop>
+
 #include <map>
 
 namespace vantorel {
@@ -50,7 +52,14 @@ DeviceBackend::DeviceBackend(std::string spec, std::string technology, QObject* 
     connect(&watchdog_, &QTimer::timeout, this, &DeviceBackend::checkRecords);
 }
 
-DeviceBackend::~DeviceBackend() { stop(); }
+DeviceBackend::~DeviceBackend() {
+    stop();
+    finishStopping(kClearTimeoutMs + 500);
+    if (session_) disconnect(session_.get(), nullptr, this, nullptr);
+    if (port_) disconnect(port_.get(), nullptr, this, nullptr);
+    session_.reset();  // it reads the port
+    port_.reset();
+}
 
 const std::set<uint16_t>& DeviceBackend::servingCellCodes() {
     static const std::set<uint16_t> codes = [] {
@@ -107,6 +116,7 @@ void DeviceBackend::report(const std::string& line) {
 void DeviceBackend::start() {
     if (running_) return;
     running_ = true;
+    if (clearing_) return;  // the open follows the clearing sequence
     std::string error;
     if (!openPort(&error)) {
         problem_ = error;
@@ -183,21 +193,45 @@ void DeviceBackend::stop() {
     if (!running_) return;
     running_ = false;
     reopenTimer_.stop();
-    if (session_) {
+    watchdog_.stop();
+    if (session_ && !clearing_) {
         const DiagSession::Counters c = session_->counters();
+        clearing_ = true;
         // The modem is left as it was found: no logging, no events, no debug messages.
-        const bool cleared = session_->clear(kClearTimeoutMs);
-        report(StringFormat::format(
-            "%s; %llu log packets forwarded, dropped: %llu bad CRC, %llu malformed or over-long, %llu not log packets, "
-            "%llu of codes not enabled",
-            cleared ? "logging switched off" : "the modem did not confirm that logging is off",
-            static_cast<unsigned long long>(c.logPackets), static_cast<unsigned long long>(c.badCrc),
-            static_cast<unsigned long long>(c.malformed), static_cast<unsigned long long>(c.notLog),
-            static_cast<unsigned long long>(c.unsubscribed)));
+        session_->clear(kClearTimeoutMs, [this, c](bool answered) {
+            report(StringFormat::format(
+                "%s; %llu log packets forwarded, dropped: %llu bad CRC, %llu malformed or over-long, %llu not log "
+                "packets, %llu of codes not enabled",
+                answered ? "logging switched off" : "the modem did not confirm that logging is off",
+                static_cast<unsigned long long>(c.logPackets), static_cast<unsigned long long>(c.badCrc),
+                static_cast<unsigned long long>(c.malformed), static_cast<unsigned long long>(c.notLog),
+                static_cast<unsigned long long>(c.unsubscribed)));
+            clearing_ = false;
+            closePort();
+            if (qmdl_) qmdl_->flush();
+            emit cleared();
+            // A client came back meanwhile: the modem is opened anew.
+            if (running_) {
+                running_ = false;
+                start();
+            }
+        });
+    } else if (!clearing_) {
+        closePort();
+        if (qmdl_) qmdl_->flush();
     }
-    closePort();
-    if (qmdl_) qmdl_->flush();
     setState(State::Idle);
+}
+
+void DeviceBackend::finishStopping(int timeoutMs) {
+    if (!clearing_) return;
+    QEventLoop loop;
+    QTimer deadline;
+    deadline.setSingleShot(true);
+    connect(&deadline, &QTimer::timeout, &loop, &QEventLoop::quit);
+    connect(this, &DeviceBackend::cleared, &loop, &QEventLoop::quit);
+    deadline.start(timeoutMs);
+    loop.exec();
 }
 
 void DeviceBackend::setLogCodes(const std::optional<std::set<uint16_t>>& codes) {

@@ -56,7 +56,11 @@ public:
     // "device /dev/ttyUSB0"
     std::string source() const override;
     void start() override;
+    // Sends the clearing sequence and closes the port once the modem has answered it (or
+    // kClearTimeoutMs has passed); the state is Idle at once. A start() meanwhile opens the
+    // port again after that.
     void stop() override;
+    void finishStopping(int timeoutMs) override;
     void setLogCodes(const std::optional<std::set<uint16_t>>& codes) override;
     bool startsWithService() const override { return true; }
     std::string problem() const override { return problem_; }
@@ -64,6 +68,10 @@ public:
     // The codes asked of the modem now: the clients' and the serving-cell codes (all: every code).
     std::optional<std::set<uint16_t>> wantedCodes() const;
     const DiagSession* session() const { return session_.get(); }
+
+signals:
+    // The clearing sequence of a stop() has ended.
+    void cleared();
 
 private:
     bool openPort(std::string* error);
@@ -86,6 +94,7 @@ private:
     uint64_t recordsThisOpen_ = 0;
     bool warnedNoRecord_ = false;
     bool running_ = false;  // between start() and stop()
+    bool clearing_ = false;  // the clearing sequence of a stop() is under way
     std::string problem_;
     std::set<uint32_t> subscriptions_;  // dual-SIM subscription ids seen
     std::unique_ptr<QFile> qmdl_;

@@ -6,7 +6,6 @@
 #include "TelephonyService/Device/DiagPort.h"
 #include "TelephonyService/Replay/DiagPacket.h"
 
-#include <QEventLoop>
 
 namespace vantorel {
 
@@ -29,6 +28,9 @@ DiagSession::DiagSession(DiagPort* port, QObject* parent)
     replyTimer_.setSingleShot(true);
     connect(&replyTimer_, &QTimer::timeout, this, &DiagSession::timedOut);
     connect(port_, &DiagPort::received, this, &DiagSession::onBytes);
+    clearDeadline_.setSingleShot(true);
+    connect(&clearDeadline_, &QTimer::timeout, this, [this] { endClear(false); });
+    connect(port_, &DiagPort::closed, this, [this] { endClear(false); });
 }
 
 DiagSession::~DiagSession() = default;
@@ -245,7 +247,7 @@ void DiagSession::applyCodes() {
     if (!all) all_ = false;
 }
 
-bool DiagSession::clear(int timeoutMs) {
+void DiagSession::clear(int timeoutMs, std::function<void(bool answered)> done) {
     opening_ = false;
     ready_ = false;
     queue_.clear();
@@ -254,25 +256,28 @@ bool DiagSession::clear(int timeoutMs) {
     all_ = false;
     equipmentsOn_.clear();
     applied_.clear();
-    int answered = 0;
-    QEventLoop loop;
-    QTimer deadline;
-    deadline.setSingleShot(true);
-    connect(&deadline, &QTimer::timeout, &loop, &QEventLoop::quit);
+    if (clearing_) endClear(false);  // an older clear gives way
+    clearing_ = std::move(done);
+    clearAnswers_ = 0;
     const std::vector<Bytes> sequence = DiagCommand::clearingSequence();
     for (size_t i = 0; i < sequence.size(); ++i) {
         const bool last = i + 1 == sequence.size();
-        send(sequence[i], [&answered, &loop, last](const Reply& reply) {
-            if (reply) ++answered;
-            if (last) loop.quit();
+        send(sequence[i], [this, last, total = int(sequence.size())](const Reply& reply) {
+            if (reply) ++clearAnswers_;
+            if (last) endClear(clearAnswers_ == total);
         });
     }
-    deadline.start(timeoutMs);
-    connect(port_, &DiagPort::closed, &loop, &QEventLoop::quit);
-    loop.exec();
+    clearDeadline_.start(timeoutMs);
+}
+
+void DiagSession::endClear(bool answered) {
+    if (!clearing_) return;
+    clearDeadline_.stop();
     queue_.clear();
     replyTimer_.stop();
-    return answered == static_cast<int>(sequence.size());
+    // From the event loop: the callback may delete this session.
+    QMetaObject::invokeMethod(this, [done = std::move(clearing_), answered] { done(answered); }, Qt::QueuedConnection);
+    clearing_ = nullptr;
 }
 
 }  // namespace vantorel

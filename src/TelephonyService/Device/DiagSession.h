@@ -62,10 +62,11 @@ public:
     void open(std::optional<std::set<uint16_t>> codes);
     // Changes the enabled codes; sent at once when ready, else used by the open sequence.
     void setCodes(std::optional<std::set<uint16_t>> codes);
-    // Cancels what is in flight and sends the clearing sequence (60 00, 73 op 0, 7D 05),
-    // waiting for its replies at most timeoutMs on a local event loop. False when the
-    // modem did not answer all three.
-    bool clear(int timeoutMs);
+    // Cancels what is in flight and sends the clearing sequence (60 00, 73 op 0, 7D 05);
+    // `done` runs once, from the event loop, when the last request has its reply, or after
+    // timeoutMs, or when the port closes: true when the modem answered all three.
+    void clear(int timeoutMs, std::function<void(bool answered)> done);
+    bool isClearing() const { return clearing_ != nullptr; }
 
     bool isReady() const { return ready_; }
     const std::set<uint16_t>& enabledCodes() const { return enabled_; }
@@ -96,6 +97,7 @@ private:
     void onBytes(const Bytes& bytes);
     void onFrame(ByteView body);
     void fail(const std::string& why);
+    void endClear(bool answered);
     // Sends the set-mask requests that take the modem from the enabled codes to the wanted ones.
     void applyCodes();
     std::string portName() const;
@@ -116,6 +118,9 @@ private:
     std::vector<Refusal> refusals_;
     std::string buildId_;
     Counters counters_;
+    std::function<void(bool)> clearing_;  // the clear's `done`, while it runs
+    int clearAnswers_ = 0;
+    QTimer clearDeadline_;
 };
 
 }  // namespace vantorel
