@@ -189,9 +189,9 @@ void SignalPlotWindow::refresh() {
 }
 
 void SignalPlotWindow::draw() {
-    // Following, the span ends at the newest time (a young session starts in its middle).
+    // Following, the span ends at the newest time once the session is longer than the span;
+    // a younger session fills it from the left.
     start_ = following_ ? std::max(first_, last_ - kSpanMs) : first_ + int64_t(scroll_->value()) * 1000;
-    if (following_ && last_ - first_ < kSpanMs) start_ = last_ - kSpanMs;
     const int64_t end = start_ + kSpanMs;
     timeAxis_->setRange(QDateTime::fromMSecsSinceEpoch(start_), QDateTime::fromMSecsSinceEpoch(end));
 
