@@ -63,7 +63,7 @@ TEST(ListTableModel, RowsAreEntriesAndColumnsTheUnionOfTheirKeysOnlyForListsOfDi
     list->append(dict({{"Note", "strong"}, {"RSRP", "-80 dBm"}, {"E-ARFCN", "6300"}}));
     model.setList(child(panetest::makeTree(dict({{"Neighbours", Value(list)}})), "Neighbours"));
     std::vector<std::string> headers;
-    for (int c = 0; c < model.columnCount(); ++c) headers.push_back(model.key(c));
+    for (int c = 0; c < model.columnCount(); ++c) headers.push_back(model.headerData(c, Qt::Horizontal).toString().toStdString());
     EXPECT_EQ(headers, (std::vector<std::string>{"Physical Cell ID", "RSRP", "Note", "E-ARFCN"}));
     EXPECT_EQ(column(model, 1), (std::vector<std::string>{"-80 dBm"}));
 }

@@ -32,6 +32,7 @@ TEST(SignalPlotWindow, ShowsTheNewestTenMinutesOfEachKeyWithItsMarksScrollsBackA
     EXPECT_EQ(plot.seriesOf("/Cell/RSRP")->count(), 302);  // the span and one point before it
     EXPECT_EQ(plot.seriesOf("/Cell/RSRP")->at(301), QPointF(double(t0 + 1'200'000), -80.5));
     EXPECT_NE(plot.seriesOf("/Cell/RSRP")->attachedAxes(), plot.seriesOf("/Cell/Load")->attachedAxes());
+    EXPECT_EQ(plot.seriesOf("/Cell/RSRP")->name(), "RSRP  -80.5 dBm");  // the legend's latest reading
     EXPECT_EQ(plot.shownMarks(), std::vector<QString>{"A \u2192 B"});
     EXPECT_EQ(plot.seriesOf("/Cell/Late"), nullptr) << "a key that never had a value";
 

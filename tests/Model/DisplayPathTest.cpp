@@ -66,6 +66,7 @@ TEST(DisplayPath, ASelectorPicksTheEntryByWhatItShowsOrByRank) {
         {"/Neighbours/Cells/[#0 RSRP]/RSRP", nullptr},
         {"/Neighbours/Cells/[#x RSRP]/RSRP", nullptr},
         {"/Neighbours/Cells/[#1]/RSRP", nullptr},
+        {"/Neighbours/Cells/[#1 ]/RSRP", nullptr},
         {"/Neighbours/Cells/[RSRP]/RSRP", nullptr},
         {"/Neighbours/Cells/[=95]/RSRP", nullptr},
         {"/Neighbours/Cells/[]/RSRP", nullptr},
@@ -91,6 +92,8 @@ TEST(DisplayPath, ASelectorPicksTheEntryByWhatItShowsOrByRank) {
     const std::vector<std::pair<std::string, std::string>> labels = {
         {"/Neighbours/Cells/[Physical Cell ID=95,E-ARFCN=6300]/RSRP", "RSRP (PCI 95, EARFCN 6300)"},
         {"/Neighbours/Cells/[#2 RSRP]/RSRP", "RSRP (2nd strongest)"},
+        {"/Neighbours/Cells/[#11 RSRP]/RSRP", "RSRP (11th strongest)"},
+        {"/Neighbours/Cells/[#23 RSRP]/RSRP", "RSRP (23rd strongest)"},
         {"/Neighbours/UTRAN/[#1 RSCP,Status!=ASET]/RSCP", "RSCP (strongest)"},
         {"/Neighbours/UTRAN/[Status=ASET]/RSCP", "RSCP (Status ASET)"},
         {"/Serving Cell/RSRP", "RSRP"},
