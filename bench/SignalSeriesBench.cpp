@@ -53,6 +53,7 @@ void BM_SignalSeriesSession(benchmark::State& state) {
         for (const std::string& key : sampler.series().keys()) perKey = std::max(perKey, sampler.series().points(key).size());
         state.counters["ticks"] = static_cast<double>(seconds * 1000 / tickMs);
         state.counters["keys"] = static_cast<double>(sampler.keys().size());
+        state.counters["series"] = static_cast<double>(sampler.series().keys().size());  // keys and cell lines
         state.counters["points"] = static_cast<double>(sampler.series().pointCount());
         state.counters["pointsPerKeyMax"] = static_cast<double>(perKey);
         state.counters["pointBytes"] = static_cast<double>(sampler.series().pointCount() * sizeof(SignalSeries::Point));
