@@ -194,6 +194,21 @@ QMenu* VantorelPaneController::contextMenu(const QModelIndex& index) {
 }
 
 void VantorelPaneController::createToolbarItems() {
+    // The status changes every second on a live display. Items whose set has not
+    // changed are refreshed in place: replacing the buttons would drop a click whose
+    // press landed on the old button and whose release lands on the new one.
+    const int shape = (application_ ? 1 : 0) | (ListTableModel::isList(_nodes) ? 2 : 0) |
+                      (application_ && application_->allowSaveButton() ? 4 : 0);
+    if (shape == toolbarShape_) {
+        if (_isLoading) activityIndicator_->startAnimating();
+        else activityIndicator_->stopAnimating();
+        activityIndicatorItem_->setVisible(_isLoading);
+        fitStatus();
+        if (tableItem_) tableItem_->setChecked(showsTable_);
+        return;
+    }
+    toolbarShape_ = shape;
+
     // The old items go from the event loop: a save button may be inside its own
     // trigger when a status change rebuilds the toolbar.
     for (QAction* action : toolbar_->actions()) {

@@ -61,7 +61,7 @@ public:
     void reloadWithNode(NodeRef node);
     // Rebuilds the toolbar: activity indicator, status label, flexible space, the signal
     // plot button, the table toggle on a list pane, and the save button only when the
-    // application allows it.
+    // application allows it. When that set of items is unchanged, they are updated in place.
     void createToolbarItems();
 
     // A list of dictionaries (ListTableModel::isList) can be shown as a table instead of
@@ -137,6 +137,7 @@ private:
     QAction* saveItem_ = nullptr;
     QAction* signalItem_ = nullptr;
     QAction* tableItem_ = nullptr;
+    int toolbarShape_ = -1;  // which optional items the toolbar holds; -1 before the first build
     ListTableView* listView_;
 };
 

@@ -11,7 +11,9 @@
 #include <QMenu>
 #include <QSortFilterProxyModel>
 #include <QTableWidget>
+#include <QLabel>
 #include <QTemporaryDir>
+#include <QToolBar>
 #include <gtest/gtest.h>
 
 using namespace vantorel;
@@ -124,5 +126,22 @@ TEST(ListTablePane, TheTableChoiceIsRememberedEnterDrillsIntoTheEntryAndOnlyNumb
     nav.topPane()->listTableView()->selectEntry(1);
     panetest::pressKey(&nav, Qt::Key_Return);
     EXPECT_EQ(nav.topPane()->path(), "/Neighbours/1");
+    Preferences::setDirectory("");
+}
+
+// A live status changes every second: a click pressed before a tick and released after it still counts.
+TEST(ListTablePane, AClickOnTheTableToggleSurvivesTheStatusTickBetweenPressAndRelease) {
+    QTemporaryDir settings;
+    Preferences::setDirectory(settings.path().toStdString());
+    panetest::FakeApplication app;
+    VantorelPaneController pane(child(neighbours({{"301", "-97 dBm"}}), "Neighbours"), "/Neighbours", &app);
+    panetest::showAt(pane, 480, 600);
+    auto* toolbar = pane.findChild<QToolBar*>();
+    panetest::click(toolbar, toolbar->widgetForAction(pane.tableItem())->geometry().center(), [&] {
+        pane.setStatus("Updated at 12:00:01", false);
+        pane.reloadWithNode(child(neighbours({{"301", "-98 dBm"}}), "Neighbours"));
+    });
+    EXPECT_TRUE(pane.showsTable());
+    EXPECT_EQ(pane.statusLabel()->text(), "Updated at 12:00:01");
     Preferences::setDirectory("");
 }

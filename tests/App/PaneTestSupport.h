@@ -6,6 +6,7 @@
 #include "Model/VantorelModelNode.h"
 #include "PropertyList/Dictionary.h"
 
+#include <functional>
 #include <QApplication>
 #include <QMouseEvent>
 #include <QWindow>
@@ -56,14 +57,21 @@ inline void settle() {
     QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
 }
 
-// A left click at `pos` of `widget`, delivered to the deepest child there.
-inline void click(QWidget* widget, QPoint pos) {
-    QWidget* target = widget->childAt(pos) ? widget->childAt(pos) : widget;
-    const QPointF local = target->mapFrom(widget, QPointF(pos)), global = widget->mapToGlobal(QPointF(pos));
-    QMouseEvent press(QEvent::MouseButtonPress, local, global, Qt::LeftButton, Qt::LeftButton, Qt::NoModifier);
-    QApplication::sendEvent(target, &press);
-    QMouseEvent release(QEvent::MouseButtonRelease, local, global, Qt::LeftButton, Qt::NoButton, Qt::NoModifier);
-    QApplication::sendEvent(target, &release);
+// A left click at `pos` of `widget`, delivered to the deepest child there; `between`
+// runs after the press, as a refresh may while the user holds the button.
+inline void click(QWidget* widget, QPoint pos, const std::function<void()>& between = {}) {
+    auto send = [&](QEvent::Type type, Qt::MouseButtons buttons) {
+        QWidget* target = widget->childAt(pos) ? widget->childAt(pos) : widget;
+        QMouseEvent event(type, target->mapFrom(widget, QPointF(pos)), widget->mapToGlobal(QPointF(pos)), Qt::LeftButton,
+                          buttons, Qt::NoModifier);
+        QApplication::sendEvent(target, &event);
+    };
+    send(QEvent::MouseButtonPress, Qt::LeftButton);
+    if (between) {
+        between();
+        settle();
+    }
+    send(QEvent::MouseButtonRelease, Qt::NoButton);
     settle();
 }
 
