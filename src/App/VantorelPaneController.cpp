@@ -278,7 +278,6 @@ void VantorelPaneController::fitStatus() {
     const int room = std::max(80, width() - reserved);
     statusLabel_->setText(statusLabel_->fontMetrics().elidedText(full, Qt::ElideRight, room));
     statusLabel_->setToolTip(statusLabel_->text() == full ? QString() : full);
-    statusLabel_->adjustSize();
 }
 
 void VantorelPaneController::resizeEvent(QResizeEvent* event) {
