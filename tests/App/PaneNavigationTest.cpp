@@ -10,6 +10,7 @@
 #include <QLabel>
 #include <QPointer>
 #include <QTableWidget>
+#include <QToolBar>
 #include <QToolButton>
 #include <gtest/gtest.h>
 
@@ -116,6 +117,17 @@ TEST(PaneNavigation, TheToolbarShowsTheIndicatorWhileLoadingAndTheSaveButtonOnly
         ASSERT_EQ(s.top().saveItem() != nullptr, allowSave);
         if (allowSave) s.top().saveItem()->trigger();
         EXPECT_EQ(s.application.showSaveViewCalls, allowSave ? 1 : 0);
+
+        // A status longer than the pane is elided, whole in the tooltip, and every button stays on the bar.
+        const std::string longStatus = "Updated 2016-06-28 at 22:01:10 · recording /home/engineer/captures/" +
+                                       std::string(60, 'x') + ".qmdl";
+        s.top().setStatus(longStatus, false);
+        settle();
+        EXPECT_TRUE(s.top().statusLabel()->text().endsWith(QChar(0x2026)));
+        EXPECT_EQ(s.top().statusLabel()->toolTip().toStdString(), longStatus);
+        auto* toolbar = s.top().findChild<QToolBar*>();
+        for (QAction* item : {s.top().signalItem(), s.top().saveItem()})
+            if (item) EXPECT_TRUE(toolbar->widgetForAction(item)->isVisible()) << item->text().toStdString();
     }
 }
 
