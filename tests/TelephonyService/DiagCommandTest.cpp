@@ -167,10 +167,10 @@ TEST(DiagPort, AWrongDeviceIsRefusedWithWhatToDo) {
         {"tcp:127.0.0.1:70000", "tcp:127.0.0.1:70000: the port must be a number from 1 to 65535"},
         {"tcp:127.0.0.1:1", "tcp:127.0.0.1:1: Connection refused (is the bridge running and the port forwarded?)"},
     };
-    for (const auto& [spec, message] : rows) {
+    for (const auto& [device, message] : rows) {
         std::string error;
-        EXPECT_FALSE(DiagPort::open(spec, &error)) << spec;
-        EXPECT_EQ(error.substr(0, message.size()), message) << spec;
+        EXPECT_FALSE(DiagPort::open(device, &error)) << device;
+        EXPECT_EQ(error.substr(0, message.size()), message) << device;
     }
 }
 

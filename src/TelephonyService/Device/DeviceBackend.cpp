@@ -35,8 +35,8 @@ std::string codeList(const std::set<uint16_t>& codes) {
 
 }  // namespace
 
-DeviceBackend::DeviceBackend(std::string spec, std::string technology, QObject* parent)
-    : ModemBackend(parent), spec_(std::move(spec)), technology_(std::move(technology)),
+DeviceBackend::DeviceBackend(std::string device, std::string technology, QObject* parent)
+    : ModemBackend(parent), device_(std::move(device)), technology_(std::move(technology)),
       fixedTechnology_(!technology_.empty()) {
     reopenTimer_.setSingleShot(true);
     connect(&reopenTimer_, &QTimer::timeout, this, [this] {
@@ -95,11 +95,11 @@ std::string DeviceBackend::technology() const {
 }
 
 std::string DeviceBackend::description() const {
-    return StringFormat::format("DIAG modem on %s, technology %s", spec_.c_str(),
+    return StringFormat::format("DIAG modem on %s, technology %s", device_.c_str(),
                                 fixedTechnology_ ? "as given" : "from its serving-cell records");
 }
 
-std::string DeviceBackend::source() const { return "device " + spec_; }
+std::string DeviceBackend::source() const { return "device " + device_; }
 
 std::optional<std::set<uint16_t>> DeviceBackend::wantedCodes() const {
     if (!clientCodes_) return std::nullopt;
@@ -109,8 +109,8 @@ std::optional<std::set<uint16_t>> DeviceBackend::wantedCodes() const {
 }
 
 void DeviceBackend::report(const std::string& line) {
-    SystemLog::log(SystemLog::kNotice, "Device %s: %s", spec_.c_str(), line.c_str());
-    emit statusLine("device " + spec_ + ": " + line);
+    SystemLog::log(SystemLog::kNotice, "Device %s: %s", device_.c_str(), line.c_str());
+    emit statusLine("device " + device_ + ": " + line);
 }
 
 void DeviceBackend::start() {
@@ -120,14 +120,14 @@ void DeviceBackend::start() {
     std::string error;
     if (!openPort(&error)) {
         problem_ = error;
-        SystemLog::log(SystemLog::kError, "Device %s: cannot open the modem: %s", spec_.c_str(), error.c_str());
+        SystemLog::log(SystemLog::kError, "Device %s: cannot open the modem: %s", device_.c_str(), error.c_str());
         setState(State::Failed);
         scheduleReopen();
     }
 }
 
 bool DeviceBackend::openPort(std::string* error) {
-    port_ = DiagPort::open(spec_, error);
+    port_ = DiagPort::open(device_, error);
     if (!port_) return false;
     session_ = std::make_unique<DiagSession>(port_.get());
     connect(port_.get(), &DiagPort::closed, this, [this](const std::string& why) { lost(why); });

@@ -41,7 +41,7 @@ public:
 
     // technology: an identifier, or empty to learn it from the modem. qmdlPath: when not
     // empty, every byte the modem sends is appended to it as it comes (a QMDL file).
-    DeviceBackend(std::string spec, std::string technology, QObject* parent = nullptr);
+    DeviceBackend(std::string device, std::string technology, QObject* parent = nullptr);
     ~DeviceBackend() override;  // stop()
 
     // Opens the QMDL file (exclusive create unless replace); false with *error.
@@ -82,7 +82,7 @@ private:
     void checkRecords();
     void report(const std::string& line);
 
-    std::string spec_;
+    std::string device_;
     std::string technology_;
     bool fixedTechnology_;
     std::optional<std::set<uint16_t>> clientCodes_ = std::set<uint16_t>{};

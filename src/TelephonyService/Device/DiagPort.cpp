@@ -10,9 +10,9 @@ DiagPort::DiagPort(std::string name) : name_(std::move(name)) {}
 
 DiagPort::~DiagPort() = default;
 
-std::unique_ptr<DiagPort> DiagPort::open(const std::string& spec, std::string* error) {
-    if (spec.rfind(TcpDiagPort::kScheme, 0) == 0) return TcpDiagPort::open(spec, error);
-    return SerialDiagPort::open(spec, error);
+std::unique_ptr<DiagPort> DiagPort::open(const std::string& device, std::string* error) {
+    if (device.rfind(TcpDiagPort::kScheme, 0) == 0) return TcpDiagPort::open(device, error);
+    return SerialDiagPort::open(device, error);
 }
 
 }  // namespace vantorel

@@ -25,7 +25,7 @@ public:
 
     // Null with *error set to a message that says what to do (no such device, the group to
     // join, the program holding the port, a bad tcp: address).
-    static std::unique_ptr<DiagPort> open(const std::string& spec, std::string* error);
+    static std::unique_ptr<DiagPort> open(const std::string& device, std::string* error);
 
     ~DiagPort() override;
     // Queues bytes for the modem; false when the port is closed or too far behind.

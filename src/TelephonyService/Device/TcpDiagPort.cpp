@@ -7,12 +7,12 @@
 
 namespace vantorel {
 
-std::unique_ptr<DiagPort> TcpDiagPort::open(const std::string& spec, std::string* error) {
+std::unique_ptr<DiagPort> TcpDiagPort::open(const std::string& device, std::string* error) {
     auto fail = [&](const std::string& why) -> std::unique_ptr<DiagPort> {
-        if (error) *error = StringFormat::format("%s: %s", spec.c_str(), why.c_str());
+        if (error) *error = StringFormat::format("%s: %s", device.c_str(), why.c_str());
         return nullptr;
     };
-    const std::string address = spec.substr(std::string(kScheme).size());
+    const std::string address = device.substr(std::string(kScheme).size());
     const size_t colon = address.rfind(':');
     if (colon == std::string::npos || colon == 0) return fail("give tcp:HOST:PORT, such as tcp:127.0.0.1:2500");
     std::string host = address.substr(0, colon);
@@ -31,7 +31,7 @@ std::unique_ptr<DiagPort> TcpDiagPort::open(const std::string& spec, std::string
         return fail(why + " (is the bridge running and the port forwarded?)");
     }
     socket->setSocketOption(QAbstractSocket::LowDelayOption, 1);
-    return std::unique_ptr<DiagPort>(new TcpDiagPort(spec, socket));
+    return std::unique_ptr<DiagPort>(new TcpDiagPort(device, socket));
 }
 
 TcpDiagPort::TcpDiagPort(std::string name, QTcpSocket* socket) : DiagPort(std::move(name)), socket_(socket) {

@@ -14,7 +14,7 @@ public:
     static constexpr int kConnectTimeoutMs = 2000;
 
     // "tcp:HOST:PORT" (HOST may be [v6]); connects, waiting at most kConnectTimeoutMs.
-    static std::unique_ptr<DiagPort> open(const std::string& spec, std::string* error);
+    static std::unique_ptr<DiagPort> open(const std::string& device, std::string* error);
     ~TcpDiagPort() override;
 
     bool write(ByteView bytes) override;
