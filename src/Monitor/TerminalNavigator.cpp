@@ -43,7 +43,7 @@ std::string summary(const VantorelModelNode& node) {
     const bool list = children[0]->displayName() == "0";
     std::string line;
     for (const NodeRef& c : children) {
-        if (!c->value()) return "(" + std::to_string(children.size()) + " rows)";
+        if (!c->value()) return "(" + std::to_string(children.size()) + (children.size() == 1 ? " row)" : " rows)");
         if (!line.empty()) line += list ? " " : " | ";
         if (!list) line += TerminalText::visible(c->displayName()) + " ";
         line += TerminalText::visible(*c->value());

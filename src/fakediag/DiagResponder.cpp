@@ -28,8 +28,9 @@ void putText(Bytes& out, const std::string& text, size_t width) {
 }
 
 Bytes error(uint8_t opcode, ByteView request) {
-    Bytes out{opcode};
-    out.insert(out.end(), request.begin(), request.end());
+    Bytes out(request.size() + 1);
+    out[0] = opcode;
+    std::copy(request.begin(), request.end(), out.begin() + 1);
     return out;
 }
 
