@@ -7,6 +7,7 @@
 
 #include <QChart>
 #include <QChartView>
+#include <QCursor>
 #include <QDateTimeAxis>
 #include <QFileDialog>
 #include <QGraphicsRectItem>
@@ -18,6 +19,7 @@
 #include <QMessageBox>
 #include <QPushButton>
 #include <QSaveFile>
+#include <QToolTip>
 #include <QScrollBar>
 #include <QValueAxis>
 #include <QVBoxLayout>
@@ -131,21 +133,38 @@ void SignalPlotWindow::addLine(const std::string& key, const std::string& unit) 
     line.unit = unit;
     line.axis = axisFor(line.unit);
     line.label = labelOf(key);
-    line.series = newSeries(line.axis, true);
+    line.series = newSeries(line, true);
     // A neighbour cell's line is thinner than the serving cell's values.
     line.series->setPen(QPen(lineColour(colours_++), key.find("/[") != std::string::npos ? 1.2 : 2.2));
     line.series->setName(line.label);
     lines_[key] = line;
 }
 
-QLineSeries* SignalPlotWindow::newSeries(QValueAxis* axis, bool inLegend) {
+QLineSeries* SignalPlotWindow::newSeries(const Line& line, bool inLegend) {
     auto* series = new QLineSeries;
     chart_->addSeries(series);
     series->attachAxis(timeAxis_);
-    series->attachAxis(axis);
+    series->attachAxis(line.axis);
     if (!inLegend)
         for (QLegendMarker* marker : chart_->legend()->markers(series)) marker->setVisible(false);
+    // Many cell lines share a colour and some have no legend entry: the pointer names the line.
+    connect(series, &QLineSeries::hovered, this,
+            [label = line.label, unit = QString::fromStdString(line.unit)](const QPointF& point, bool entered) {
+                if (!entered) return QToolTip::hideText();
+                QToolTip::showText(QCursor::pos(),
+                                   QStringLiteral("%1\n%2 %3 at %4")
+                                       .arg(label)
+                                       .arg(point.y(), 0, 'g', 4)
+                                       .arg(unit, QDateTime::fromMSecsSinceEpoch(qint64(point.x())).toString("HH:mm:ss")));
+            });
     return series;
+}
+
+int SignalPlotWindow::legendRoom() const {
+    const qreal height = chart_->legend()->geometry().height();
+    if (height <= 0) return std::numeric_limits<int>::max();  // not laid out yet
+    // An entry is a line of the legend's font with a few pixels of margin above and below.
+    return std::max(1, int(height / (QFontMetrics(chart_->legend()->font()).height() + 6)));
 }
 
 void SignalPlotWindow::refresh() {
@@ -198,6 +217,11 @@ void SignalPlotWindow::draw() {
     // The lines' points in the span, with one on either side so that they reach the edges.
     std::map<QValueAxis*, std::pair<double, double>> ranges;
     const SignalSeries& series = sampler_.series();
+    struct Entry {
+        QLineSeries* series;
+        bool drawn, current;
+    };
+    std::vector<Entry> legend;
     for (auto& [key, line] : lines_) {
         const auto& points = series.points(key);
         auto from = std::lower_bound(points.begin(), points.end(), start_,
@@ -222,7 +246,7 @@ void SignalPlotWindow::draw() {
             }
         }
         line.series->replace(pieces.front());
-        while (line.pieces.size() + 1 < pieces.size()) line.pieces.push_back(newSeries(line.axis, false));
+        while (line.pieces.size() + 1 < pieces.size()) line.pieces.push_back(newSeries(line, false));
         // Pieces the span no longer needs leave the chart: each is a series laid out and redrawn
         // at every tick, and kept they would add up to the most gaps any span of the session had.
         while (line.pieces.size() + 1 > pieces.size()) {
@@ -234,14 +258,23 @@ void SignalPlotWindow::draw() {
             if (line.pieces[i]->pen() != line.series->pen()) line.pieces[i]->setPen(line.series->pen());
             line.pieces[i]->replace(i + 1 < pieces.size() ? pieces[i + 1] : QList<QPointF>());
         }
-        // The legend lists the lines drawn in the span, each with its latest reading.
         const bool drawn = std::any_of(pieces.begin(), pieces.end(), [](const QList<QPointF>& p) { return !p.isEmpty(); });
-        for (QLegendMarker* marker : chart_->legend()->markers(line.series))
-            if (marker->isVisible() != drawn) marker->setVisible(drawn);
         const std::optional<double> latest = series.latest(key);
+        legend.push_back({line.series, drawn, latest.has_value()});
         const QString unit = QString::fromStdString(line.unit);
         line.series->setName(latest ? QStringLiteral("%1  %2 %3").arg(line.label).arg(*latest, 0, 'g', 4).arg(unit)
                                     : line.label);
+    }
+    // The legend lists the lines drawn in the span, each with its latest reading. When they
+    // are more than its column holds, the lines that have no reading now (cells no longer
+    // among the strongest) leave it first.
+    const bool crowded =
+        std::count_if(legend.begin(), legend.end(), [](const Entry& e) { return e.drawn; }) > legendRoom();
+    for (const Entry& entry : legend) {
+        const bool listed = entry.drawn && (entry.current || !crowded);
+        // Set every time: a marker reads as hidden while the legend regroups after a series
+        // was added, and an entry left at that would come back when the group is shown.
+        for (QLegendMarker* marker : chart_->legend()->markers(entry.series)) marker->setVisible(listed);
     }
     for (auto& [axis, range] : ranges) {
         auto [low, high] = range;

@@ -75,7 +75,8 @@ private:
     };
 
     void addLine(const std::string& key, const std::string& unit);
-    QLineSeries* newSeries(QValueAxis* axis, bool inLegend);
+    QLineSeries* newSeries(const Line& line, bool inLegend);
+    int legendRoom() const;  // how many entries the legend's column holds
     QValueAxis* axisFor(const std::string& unit);
     void draw();
     void placeMarkTexts();

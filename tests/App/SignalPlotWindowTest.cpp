@@ -4,7 +4,10 @@
 #include "Model/SignalSampler.h"
 #include "PaneTestSupport.h"
 
+#include <QChart>
 #include <QFile>
+#include <QLegend>
+#include <QLegendMarker>
 #include <QLineSeries>
 #include <QScrollBar>
 #include <QTemporaryDir>
@@ -62,4 +65,30 @@ TEST(SignalPlotWindow, AMarkIsLabelledWithWhatItChangedTo) {
         {"no arrow in this one at all", "no arrow in "},
     };
     for (const auto& [text, label] : rows) EXPECT_EQ(SignalPlotWindow::shortMarkText(text), label) << text;
+}
+
+TEST(SignalPlotWindow, ACrowdedLegendKeepsTheLinesThatHaveAReadingNow) {
+    SignalSampler sampler;
+    std::vector<std::string> keys;
+    for (int k = 0; k < 40; ++k) keys.push_back("/Cells/C" + std::to_string(k));
+    sampler.setKeys(keys);
+    SignalPlotWindow plot(sampler);
+    panetest::showAt(plot, 900, 420);
+    for (int i = 0; i < 3; ++i) {  // every cell reads at first; at the last tick only the first five
+        auto cells = Dictionary::create();
+        for (size_t k = 0; k < keys.size(); ++k) cells->set("C" + std::to_string(k), Value(i < 2 || k < 5 ? "-90 dBm" : "-"));
+        PathDictionary paths;
+        VantorelModelNode::makeTreeFromObject(dict({{"Cells", Value(cells)}}), paths);
+        sampler.sample(1'700'000'000'000 + i * 2000, "LTE", paths);
+        plot.refresh();
+        panetest::settle();
+    }
+    int listed = 0;
+    for (size_t k = 0; k < keys.size(); ++k) {
+        const bool visible = plot.chart()->legend()->markers(plot.seriesOf(keys[k])).front()->isVisible();
+        listed += visible;
+        if (k < 5) EXPECT_TRUE(visible) << keys[k];
+    }
+    EXPECT_GE(listed, 5);
+    EXPECT_LT(listed, 40);
 }
