@@ -358,7 +358,7 @@ QString SignalPlotWindow::shortMarkText(const std::string& text) {
 
 std::vector<QString> SignalPlotWindow::shownMarks() const {
     std::vector<QString> texts;
-    for (std::size_t i = 0; i < shownMarks_; ++i) texts.push_back(marks_[i].whole);
+    for (std::size_t i = 0; i < shownMarks_; ++i) texts.push_back(marks_[i].text->text());
     return texts;
 }
 

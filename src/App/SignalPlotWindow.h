@@ -45,7 +45,7 @@ public:
     bool exportCsv(const QString& path, std::string* error) const;
 
     // The line of a key (nullptr until it has a point and a unit), its pieces after gaps,
-    // and the marks shown in the span (their whole texts).
+    // and the marks shown in the span (their labels as drawn).
     QLineSeries* seriesOf(const std::string& key) const;
     std::vector<QLineSeries*> piecesOf(const std::string& key) const;
     std::vector<QString> shownMarks() const;

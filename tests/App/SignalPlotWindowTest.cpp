@@ -36,7 +36,7 @@ TEST(SignalPlotWindow, ShowsTheNewestTenMinutesOfEachKeyWithItsMarksScrollsBackA
     EXPECT_EQ(plot.seriesOf("/Cell/RSRP")->at(301), QPointF(double(t0 + 1'200'000), -80.5));
     EXPECT_NE(plot.seriesOf("/Cell/RSRP")->attachedAxes(), plot.seriesOf("/Cell/Load")->attachedAxes());
     EXPECT_EQ(plot.seriesOf("/Cell/RSRP")->name(), "RSRP  -80.5 dBm");  // the legend's latest reading
-    EXPECT_EQ(plot.shownMarks(), std::vector<QString>{"A \u2192 B"});
+    EXPECT_EQ(plot.shownMarks(), std::vector<QString>{"\u2192 B"});
     EXPECT_EQ(plot.seriesOf("/Cell/Late"), nullptr) << "a key that never had a value";
 
     plot.scrollBar()->setValue(0);
@@ -46,6 +46,9 @@ TEST(SignalPlotWindow, ShowsTheNewestTenMinutesOfEachKeyWithItsMarksScrollsBackA
     EXPECT_EQ(plot.piecesOf("/Cell/Load").size(), 4u);   // broken at ticks 50, 150 and 250
     plot.refresh();
     EXPECT_EQ(plot.spanStart(), t0);  // a refresh leaves a scrolled-back view where it is
+    plot.scrollBar()->setValue(60);
+    EXPECT_EQ(plot.spanStart(), t0 + 60'000);
+    EXPECT_EQ(plot.seriesOf("/Cell/RSRP")->at(0).x(), double(t0 + 58'000));
 
     QTemporaryDir dir;
     std::string error;
