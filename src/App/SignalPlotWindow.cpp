@@ -19,8 +19,8 @@
 #include <QMessageBox>
 #include <QPushButton>
 #include <QSaveFile>
-#include <QToolTip>
 #include <QScrollBar>
+#include <QToolTip>
 #include <QValueAxis>
 #include <QVBoxLayout>
 

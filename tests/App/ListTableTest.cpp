@@ -8,10 +8,10 @@
 
 #include <QAbstractItemModelTester>
 #include <QAction>
+#include <QLabel>
 #include <QMenu>
 #include <QSortFilterProxyModel>
 #include <QTableWidget>
-#include <QLabel>
 #include <QTemporaryDir>
 #include <QToolBar>
 #include <gtest/gtest.h>

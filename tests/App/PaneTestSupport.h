@@ -6,10 +6,11 @@
 #include "Model/VantorelModelNode.h"
 #include "PropertyList/Dictionary.h"
 
-#include <functional>
 #include <QApplication>
 #include <QMouseEvent>
 #include <QWindow>
+
+#include <functional>
 
 // Exported by QtGui for its own test library: delivers a key event as the platform
 // would, shortcuts first, then to the window's focus widget.

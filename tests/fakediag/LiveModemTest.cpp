@@ -128,6 +128,14 @@ TEST(LiveModem, TheHandshakeEnablesTheWantedCodesOnlyAndStoppingLeavesTheModemQu
     EXPECT_TRUE(modem.responder().enabled(0xB0C2));
     EXPECT_LE(modem.requests().size() - before, 2u) << "only equipments 0xB and 7 change";
 
+    // A client back while the modem is still answering the clearing sequence: the port opens
+    // anew once the modem has answered, with the whole handshake.
+    host.backend.stop();
+    host.backend.start();
+    ASSERT_TRUE(host.streaming()) << host.backend.problem();
+    EXPECT_TRUE(modem.responder().enabled(0xB0C0));
+    EXPECT_TRUE(modem.responder().logging());
+
     host.backend.stop();
     host.backend.finishStopping(3000);
     EXPECT_FALSE(modem.responder().logging());

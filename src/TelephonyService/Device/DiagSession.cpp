@@ -6,7 +6,6 @@
 #include "TelephonyService/Device/DiagPort.h"
 #include "TelephonyService/Replay/DiagPacket.h"
 
-
 namespace vantorel {
 
 DiagSession::DiagSession(DiagPort* port, QObject* parent)
