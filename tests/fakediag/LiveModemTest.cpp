@@ -224,9 +224,11 @@ TEST(LiveModem, AnUnpluggedModemIsOpenedAgainWhenItComesBack) {
     FakeDiagModem modem(sources({{0xB0C2}}), options);
     std::string error;
     ASSERT_TRUE(modem.open(&error)) << error;
+    std::vector<std::string> lines;  // before the host: its stop at the end still reports
     Host host(options.link, "lte");
     std::vector<ModemBackend::State> states;
     QObject::connect(&host.backend, &ModemBackend::stateChanged, [&](ModemBackend::State s) { states.push_back(s); });
+    QObject::connect(&host.backend, &ModemBackend::statusLine, [&](const std::string& line) { lines.push_back(line); });
     host.backend.setLogCodes(std::set<uint16_t>{0xB0C2});
     host.backend.start();
     ASSERT_TRUE(host.streaming());
@@ -237,6 +239,8 @@ TEST(LiveModem, AnUnpluggedModemIsOpenedAgainWhenItComesBack) {
     EXPECT_TRUE(waitUntil([&] { return host.codes.count(0xB0C2) > seen; }));
     EXPECT_EQ(std::count(modem.requests().begin(), modem.requests().end(), DiagCommand::logConfig(1)), 2)
         << "the whole handshake again";
+    const std::string away = "device " + options.link + ": the device hung up; trying again every 3 s";
+    EXPECT_EQ(std::count(lines.begin(), lines.end(), away), 1) << "the status line says why while the phone is away";
     EXPECT_EQ(states.front(), ModemBackend::State::Streaming);
     host.backend.stop();
 }
