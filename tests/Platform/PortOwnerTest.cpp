@@ -7,6 +7,7 @@
 
 #include <QDir>
 #include <QFile>
+#include <QFileInfo>
 #include <QTemporaryDir>
 #include <gtest/gtest.h>
 
@@ -19,12 +20,13 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <functional>
 #include <memory>
 #include <optional>
-#include <tuple>
 #include <string>
+#include <tuple>
 #include <vector>
 
 namespace vantorel {
@@ -39,8 +41,6 @@ constexpr gid_t kNogroup = 65534;
 #define SKIP_UNLESS_ROOT() \
     if (::geteuid() != 0) GTEST_SKIP() << "needs root, to act as a second user"
 
-Bytes bytesOf(const std::string& s) { return Bytes(s.begin(), s.end()); }
-
 sockaddr_un addressOf(const std::string& path) {
     sockaddr_un address{};
     address.sun_family = AF_UNIX;
@@ -48,52 +48,49 @@ sockaddr_un addressOf(const std::string& path) {
     return address;
 }
 
-// Sets (or, with nullopt, unsets) an environment variable until the end of the scope.
-class ScopedEnv {
-public:
-    ScopedEnv(const char* name, std::optional<std::string> value) : name_(name) {
-        if (const char* old = std::getenv(name)) old_ = old;
+// Sets (with nullopt: unsets) an environment variable until the end of the scope.
+struct ScopedEnv {
+    ScopedEnv(const char* name, std::optional<std::string> value)
+        : name(name), old(std::getenv(name) ? std::optional<std::string>(std::getenv(name)) : std::nullopt) {
         value ? ::setenv(name, value->c_str(), 1) : ::unsetenv(name);
     }
-    ~ScopedEnv() { old_ ? ::setenv(name_, old_->c_str(), 1) : ::unsetenv(name_); }
-
-private:
-    const char* name_;
-    std::optional<std::string> old_;
+    ~ScopedEnv() { old ? ::setenv(name, old->c_str(), 1) : ::unsetenv(name); }
+    const char* name;
+    std::optional<std::string> old;
 };
 
-// A forked process that listens on `path` as uid/gid and accepts without answering: a
-// second user's squatter (no Vantorel program), or with our uid a process to SIGKILL.
-class Listener {
-public:
-    Listener(const std::string& path, uid_t uid, gid_t gid) : path_(path) {
-        const sockaddr_un address = addressOf(path);
-        pid_ = ::fork();
-        if (pid_ == 0) {
-            const int fd = ::socket(AF_UNIX, SOCK_STREAM, 0);
-            if (::setgroups(0, nullptr) != 0 || ::setgid(gid) != 0 || ::setuid(uid) != 0 ||
-                ::bind(fd, reinterpret_cast<const sockaddr*>(&address), sizeof address) != 0 || ::listen(fd, 8) != 0)
-                ::_exit(1);
-            while (true) ::pause();
-        }
-        struct stat st {};
-        waitUntil([&] { return ::lstat(path.c_str(), &st) == 0; });
-    }
-    ~Listener() {
-        kill();
-        ::unlink(path_.c_str());
-    }
-    // SIGKILL: the socket file stays behind, nobody listening on it.
-    void kill() {
-        if (pid_ <= 0) return;
-        ::kill(pid_, SIGKILL);
-        ::waitpid(pid_, nullptr, 0);
-        pid_ = 0;
-    }
+// A forked process running as uid/gid (a second user's, on raw sockets: no Vantorel code)
+// that does `body` with a fresh Unix socket and exits with what it returns.
+template <typename Body>
+pid_t forkAs(uid_t uid, gid_t gid, Body body) {
+    const pid_t pid = ::fork();
+    if (pid == 0) ::_exit(::setgroups(0, nullptr) || ::setgid(gid) || ::setuid(uid) ? 9 : body(::socket(AF_UNIX, SOCK_STREAM, 0)));
+    return pid;
+}
 
-private:
-    std::string path_;
-    pid_t pid_ = 0;
+// Processes listening on a path, never answering; killed (SIGKILL: the socket file stays) at the latest at the end.
+struct Listeners {
+    std::vector<pid_t> pids;
+    std::vector<std::string> paths;
+    pid_t add(const std::string& path, uid_t uid, gid_t gid) {
+        paths.push_back(path);
+        const sockaddr_un address = addressOf(path);
+        pids.push_back(forkAs(uid, gid, [&](int fd) {
+            if (::bind(fd, reinterpret_cast<const sockaddr*>(&address), sizeof address) || ::listen(fd, 8)) return 1;
+            while (true) ::pause();
+        }));
+        waitUntil([&] { return QFileInfo::exists(QString::fromStdString(path)); });
+        return pids.back();
+    }
+    void kill(pid_t pid) {
+        ::kill(pid, SIGKILL);
+        ::waitpid(pid, nullptr, 0);
+        pids.erase(std::find(pids.begin(), pids.end(), pid));
+    }
+    ~Listeners() {
+        while (!pids.empty()) kill(pids.back());
+        for (const std::string& path : paths) ::unlink(path.c_str());
+    }
 };
 
 // A socket file nobody listens on, as a killed process leaves it.
@@ -105,22 +102,18 @@ void leaveStaleSocket(const std::string& path, uid_t owner) {
     ASSERT_EQ(::chown(path.c_str(), owner, static_cast<gid_t>(-1)), 0);
 }
 
-// A forked client running as uid/gid sends a request to the socket at `path`; its exit
-// status says what came back: 0 a reply, 1 the connection closed, 2 no connection.
+// A request from a process running as uid/gid: 0 when it got a reply, 1 when its connection was closed.
 int requestAs(const std::string& path, uid_t uid, gid_t gid) {
     const sockaddr_un address = addressOf(path);
-    const Bytes frame = MessagePortFrame{MessagePortFrame::Kind::Request, 5, bytesOf("who")}.encode();
-    const pid_t pid = ::fork();
-    if (pid == 0) {
-        const int fd = ::socket(AF_UNIX, SOCK_STREAM, 0);
-        if (::setgroups(0, nullptr) != 0 || ::setgid(gid) != 0 || ::setuid(uid) != 0 ||
-            ::connect(fd, reinterpret_cast<const sockaddr*>(&address), sizeof address) != 0)
-            ::_exit(2);
-        if (::write(fd, frame.data(), frame.size()) < 0) ::_exit(1);
+    const Bytes frame = MessagePortFrame{MessagePortFrame::Kind::Request, 5, Bytes{'?'}}.encode();
+    const pid_t pid = forkAs(uid, gid, [&](int fd) {
+        if (::connect(fd, reinterpret_cast<const sockaddr*>(&address), sizeof address) ||
+            ::write(fd, frame.data(), frame.size()) < 0)
+            return 2;
         pollfd readable{fd, POLLIN, 0};
         char byte = 0;
-        ::_exit(::poll(&readable, 1, 3000) == 1 && ::read(fd, &byte, 1) == 1 ? 0 : 1);
-    }
+        return ::poll(&readable, 1, 3000) == 1 && ::read(fd, &byte, 1) == 1 ? 0 : 1;
+    });
     int status = -1;
     waitUntil([&] { return ::waitpid(pid, &status, WNOHANG) == pid; }, 5000);  // the port is served meanwhile
     return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
@@ -129,75 +122,64 @@ int requestAs(const std::string& path, uid_t uid, gid_t gid) {
 TEST(PortOwner, ASecondUsersSquatterIsRefusedWhereverItSitsAndNeverAnswersInOurPlace) {
     SKIP_UNLESS_ROOT();
     struct Scene {
+        Scene() { ::chmod(dir.path().toLocal8Bit().constData(), 0777); }  // the squatters may reach into it
         QTemporaryDir dir;
         std::vector<std::unique_ptr<ScopedEnv>> env;
-        std::vector<std::unique_ptr<Listener>> squatters;
-        std::string at(const char* name) const { return dir.filePath(name).toStdString(); }
-        std::string mkdirOwnedBy(const std::string& path, uid_t owner) const {
-            ::mkdir(path.c_str(), 0777);
-            ::chown(path.c_str(), owner, static_cast<gid_t>(-1));
-            return path;
+        Listeners squatters;
+        std::string at(const std::string& name) const { return dir.filePath(QString::fromStdString(name)).toStdString(); }
+        std::string theirs(const std::string& name) const {  // a directory another user made
+            ::mkdir(at(name).c_str(), 0777);
+            ::chown(at(name).c_str(), kNobody, kNogroup);
+            return at(name);
         }
     };
-    struct Row {
-        const char* what;
-        std::function<std::string(Scene&)> setUp;  // returns the port's name
-        std::string refusal;  // empty: our port is made and our lookup reaches it
-    };
     const std::string uid = std::to_string(::geteuid());
-    const std::vector<Row> rows = {
-        {"a squatter listening under the name in the shared temporary directory",
-         [](Scene& s) {
+    const std::vector<std::tuple<const char*, std::function<std::string(Scene&)>, std::string>> rows = {
+        // what, set-up returning the port's name, the start of the refusal ("" for none)
+        {"a squatter under the name in the shared temporary directory", [](Scene& s) {
              const std::string name = uniquePortName("squatted");
-             s.squatters.push_back(std::make_unique<Listener>(QDir::tempPath().toStdString() + "/" + name, kNobody, kNogroup));
+             s.squatters.add(QDir::tempPath().toStdString() + "/" + name, kNobody, kNogroup);
              return name;
          }, ""},
-        {"the runtime directory under TMPDIR made first by another user",
-         [&](Scene& s) {
+        {"the runtime directory under TMPDIR made first by another user", [&](Scene& s) {
              s.env.push_back(std::make_unique<ScopedEnv>("XDG_RUNTIME_DIR", std::nullopt));
              s.env.push_back(std::make_unique<ScopedEnv>("TMPDIR", s.dir.path().toStdString()));
-             s.mkdirOwnedBy(s.at("vantorel-") + uid, kNobody);
+             s.theirs("vantorel-" + uid);
              return uniquePortName("dir");
          }, "the directory @/vantorel-" + uid + " belongs to uid 65534"},
-        {"XDG_RUNTIME_DIR of another user",
-         [](Scene& s) {
-             s.env.push_back(std::make_unique<ScopedEnv>("XDG_RUNTIME_DIR", s.mkdirOwnedBy(s.at("xdg"), kNobody)));
+        {"XDG_RUNTIME_DIR of another user", [](Scene& s) {
+             s.env.push_back(std::make_unique<ScopedEnv>("XDG_RUNTIME_DIR", s.theirs("xdg")));
              return uniquePortName("xdg");
          }, "XDG_RUNTIME_DIR @/xdg belongs to uid 65534"},
-        {"another user's live socket under an absolute name",
-         [](Scene& s) {
-             ::chmod(s.dir.path().toLocal8Bit().constData(), 0777);
-             s.squatters.push_back(std::make_unique<Listener>(s.at("live"), kNobody, kNogroup));
+        {"another user's live socket under an absolute name", [](Scene& s) {
+             s.squatters.add(s.theirs("open") + "/live", kNobody, kNogroup);
+             return s.at("open/live");
+         }, "the directory @/open belongs to uid 65534"},
+        {"another user's live socket in a directory of ours", [](Scene& s) {
+             s.squatters.add(s.at("live"), kNobody, kNogroup);
              return s.at("live");
          }, "the socket @/live belongs to uid 65534"},
-        {"another user's stale socket under an absolute name",
-         [](Scene& s) {
+        {"another user's stale socket", [](Scene& s) {
              leaveStaleSocket(s.at("stale"), kNobody);
              return s.at("stale");
          }, "the socket @/stale belongs to uid 65534"},
-        {"an absolute name in another user's directory",
-         [](Scene& s) { return s.mkdirOwnedBy(s.at("theirs"), kNobody) + "/port"; },
-         "the directory @/theirs belongs to uid 65534"},
     };
-    for (const Row& row : rows) {
-        SCOPED_TRACE(row.what);
+    for (const auto& [what, setUp, refusal] : rows) {
+        SCOPED_TRACE(what);
         Scene scene;
-        const std::string name = row.setUp(scene);
+        const std::string name = setUp(scene);
         LocalMessagePort::CreateFailure failure;
         const auto port = LocalMessagePort::create(name, {}, &failure);
-        auto remote = RemoteMessagePort::lookup(name, 300);
-        if (row.refusal.empty()) {
-            ASSERT_TRUE(port) << failure.reason;
-            ASSERT_TRUE(remote);
+        const auto remote = RemoteMessagePort::lookup(name, 300);
+        if (refusal.empty()) {
+            ASSERT_TRUE(port && remote) << failure.reason;
             EXPECT_EQ(remote->socketPath(), port->socketPath());
             EXPECT_TRUE(waitUntil([&] { return port->hadConnection(); }));  // ours took the connection
             continue;
         }
-        std::string expected = row.refusal;
+        std::string expected = refusal;
         expected.replace(expected.find('@'), 1, scene.dir.path().toStdString());
-        EXPECT_FALSE(port);
-        EXPECT_TRUE(failure.foreign);
-        EXPECT_FALSE(failure.nameInUse);
+        EXPECT_TRUE(!port && failure.foreign && !failure.nameInUse);
         EXPECT_EQ(failure.reason.rfind(expected, 0), 0u) << failure.reason;
         EXPECT_FALSE(remote);  // no port of ours, and none of theirs either
     }
@@ -209,37 +191,27 @@ TEST(PortOwner, APortServesItsUserAndRootAndAnotherUserOnlyThroughTheGroupItIsSh
     ::chmod(dir.path().toLocal8Bit().constData(), 0777);
     const group* daemonGroup = ::getgrnam("daemon");  // a group nobody is not in
     ASSERT_TRUE(daemonGroup);
-    struct Row {
-        const char* what;
-        uid_t uid;
-        gid_t gid;
-        std::optional<gid_t> sharedWith;
-        int outcome;  // requestAs(): 0 answered, 1 closed
+    const std::vector<std::tuple<const char*, uid_t, std::optional<gid_t>, int>> rows = {
+        // peer, its uid (gid the same), the group the port is shared with, requestAs(): 0 answered, 1 closed
+        {"another user", kNobody, std::nullopt, 1},
+        {"another user, the port shared with its group", kNobody, kNogroup, 0},
+        {"another user, the port shared with a group it is not in", kNobody, daemonGroup->gr_gid, 1},
+        {"root", 0, std::nullopt, 0},
     };
-    const std::vector<Row> rows = {
-        {"another user", kNobody, kNogroup, std::nullopt, 1},
-        {"another user, the port shared with its group", kNobody, kNogroup, kNogroup, 0},
-        {"another user, the port shared with a group it is not in", kNobody, kNogroup, daemonGroup->gr_gid, 1},
-        {"root", 0, 0, std::nullopt, 0},
-    };
-    for (const Row& row : rows) {
-        SCOPED_TRACE(row.what);
+    for (const auto& [what, uid, sharedWith, outcome] : rows) {
+        SCOPED_TRACE(what);
         int requests = 0;
         auto port = LocalMessagePort::create(dir.filePath(uniquePortName("peer").c_str()).toStdString(),
-                                             [&](int32_t, const Bytes&) -> std::optional<Bytes> {
+                                             [&](int32_t, const Bytes&) {
                                                  ++requests;
-                                                 return bytesOf("answer");
+                                                 return std::optional<Bytes>(Bytes(1, 'x'));
                                              });
-        ASSERT_TRUE(port);
         std::string error;
-        if (row.sharedWith) {
-            ASSERT_TRUE(port->shareWithGroup(*row.sharedWith, &error)) << error;
-        }
-        // Whoever may open the file, the peer's credentials decide.
-        ::chmod(port->socketPath().c_str(), 0666);
-        EXPECT_EQ(requestAs(port->socketPath(), row.uid, row.gid), row.outcome);
-        EXPECT_EQ(requests, row.outcome == 0 ? 1 : 0);
-        EXPECT_EQ(port->foreignPeers(), row.outcome == 0 ? 0u : 1u);
+        ASSERT_TRUE(port && (!sharedWith || port->shareWithGroup(*sharedWith, &error))) << error;
+        ::chmod(port->socketPath().c_str(), 0666);  // whoever may open the file, the peer's credentials decide
+        EXPECT_EQ(requestAs(port->socketPath(), uid, uid), outcome);
+        EXPECT_EQ(requests, 1 - outcome);
+        EXPECT_EQ(port->foreignPeers(), static_cast<uint64_t>(outcome));
     }
 }
 
@@ -251,31 +223,27 @@ TEST(PortOwner, SocketsAKilledProcessLeftInTheRuntimeDirectoryAreClearedAtTheNex
     ASSERT_EQ(::mkdir(directory.c_str(), 0700), 0);
     enum Kind { Killed, Live, OtherUsersStale, PlainFile };
     const std::vector<std::tuple<std::string, Kind, bool>> files = {  // name, what is there, survives
-        {"vantorel.telephony", Killed, false},
         {"vantorel.telephony.channel.4242.7", Killed, false},
         {"VantorelApp.0b6f1c2e-killed", Killed, false},
+        {"vantorel.telephony", Killed, true},  // taken over by the service below
         {"VantorelApp.5d1e7a90-running", Live, true},
         {"VantorelApp.left-by-nobody", OtherUsersStale, true},
         {"notes.txt", PlainFile, true},
     };
-    std::vector<std::unique_ptr<Listener>> processes;
+    Listeners processes;
     for (const auto& [name, kind, survives] : files) {
         const std::string path = directory + "/" + name;
-        if (kind == Killed || kind == Live) processes.push_back(std::make_unique<Listener>(path, ::geteuid(), ::getegid()));
-        if (kind == Killed) processes.back()->kill();
+        if (kind == Killed) processes.kill(processes.add(path, ::geteuid(), ::getegid()));
+        if (kind == Live) processes.add(path, ::geteuid(), ::getegid());
         if (kind == OtherUsersStale) leaveStaleSocket(path, kNobody);
         if (kind == PlainFile) QFile(QString::fromStdString(path)).open(QIODevice::WriteOnly);
     }
-    // The service starting again under its well-known name.
     LocalMessagePort::CreateFailure failure;
-    const auto service = LocalMessagePort::create("vantorel.telephony", {}, &failure);
+    const auto service = LocalMessagePort::create("vantorel.telephony", {}, &failure);  // the service starting again
     ASSERT_TRUE(service) << failure.reason;
-    EXPECT_EQ(service->socketPath(), directory + "/vantorel.telephony");
-    for (const auto& [name, kind, survives] : files) {
-        if (name == "vantorel.telephony") continue;
-        struct stat st {};
-        EXPECT_EQ(::lstat((directory + "/" + name).c_str(), &st) == 0, survives) << name;
-    }
+    for (const auto& [name, kind, survives] : files)
+        EXPECT_EQ(QFileInfo::exists(QString::fromStdString(directory + "/" + name)), survives) << name;
+    EXPECT_TRUE(RemoteMessagePort::lookup("vantorel.telephony", 300));
     EXPECT_TRUE(RemoteMessagePort::lookup("VantorelApp.5d1e7a90-running", 300));
 }
 
