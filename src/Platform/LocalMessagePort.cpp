@@ -1,11 +1,12 @@
-// LocalMessagePort: a named local message port on a QLocalServer: frames in, replies and notifications out, invalidation (docs/protocol.md).
+// LocalMessagePort: a named local message port on a QLocalServer in the user's runtime directory: frames in from this user's peers, replies and notifications out, invalidation (docs/protocol.md).
 #include "Platform/LocalMessagePort.h"
 
 #include "Platform/MessagePortFrame.h"
+#include "Platform/PeerCredentials.h"
+#include "Platform/PortDirectory.h"
 #include "Platform/StringFormat.h"
 #include "Platform/SystemLog.h"
 
-#include <QDir>
 #include <QFileInfo>
 #include <QLocalServer>
 #include <QLocalSocket>
@@ -14,8 +15,11 @@
 #include <sys/socket.h>
 #include <sys/stat.h>
 #include <sys/un.h>
+#include <unistd.h>
 
 #include <algorithm>
+#include <cerrno>
+#include <cstring>
 
 namespace vantorel {
 
@@ -63,31 +67,49 @@ bool LocalMessagePort::listen(CreateFailure* failure) {
         SystemLog::log(SystemLog::kError, "Message port: %s", failure->reason.c_str());
         return false;
     };
+    // Another user's socket or directory: neither taken over nor listened beside.
+    auto foreign = [&](const std::string& why) {
+        failure->nameInUse = false;
+        failure->foreign = true;
+        failure->reason = why;
+        SystemLog::log(SystemLog::kError, "Message port %s: %s", name_.c_str(), why.c_str());
+        return false;
+    };
     if (name_.empty()) return invalid("empty");
     if (name_.find('\0') != std::string::npos) return invalid("it holds a NUL character");
-    // A name is a bare name under the temporary directory or an absolute socket path.
-    if (name_.front() != '/' && name_.find('/') != std::string::npos)
+    // A name is a bare name in the runtime directory or an absolute socket path.
+    const bool absolute = name_.front() == '/';
+    if (!absolute && name_.find('/') != std::string::npos)
         return invalid("a name with a slash must be an absolute path");
+    std::string refused;
+    const std::string path = PortDirectory::socketPathFor(name_, &refused);
+    if (path.empty()) return foreign(refused);
     server_ = new QLocalServer(this);
-    const QString name = QString::fromStdString(name_);
-    // The socket file, by Qt's rule (docs/protocol.md).
-    const std::string path = name_.front() == '/' ? name_ : QDir::tempPath().toStdString() + "/" + name_;
-    const QFileInfo directory(QFileInfo(QString::fromStdString(path)).absolutePath());
+    const QString serverName = QString::fromStdString(path);
+    const QFileInfo directory(QFileInfo(serverName).absolutePath());
     if (!directory.isDir())
         return invalid(StringFormat::format("the directory %s does not exist", directory.filePath().toStdString().c_str()));
+    if (absolute) {
+        refused = PortDirectory::foreignDirectory(directory.filePath().toStdString());
+        if (!refused.empty()) return foreign(refused);
+    }
     if (path.size() >= sizeof(sockaddr_un::sun_path)) return invalid("too long for a socket path");
-    if (!server_->listen(name)) {
+    struct stat st {};
+    const bool exists = ::lstat(path.c_str(), &st) == 0;
+    // Under an absolute path only a socket file may be taken over: anything else there is
+    // someone's file, not a port. (The runtime directory holds nothing but ours.)
+    if (exists && absolute && !S_ISSOCK(st.st_mode)) return invalid("a file that is not a socket is there");
+    if (exists && st.st_uid != ::geteuid())
+        return foreign(StringFormat::format("the socket %s belongs to %s, not to this user", path.c_str(),
+                                            PeerCredentials::describeUser(st.st_uid).c_str()));
+    if (!server_->listen(serverName)) {
         if (server_->serverError() != QAbstractSocket::AddressInUseError)
             return invalid("no socket can be made there: " +
                            server_->errorString().remove(QStringLiteral("QLocalServer::listen: ")).toStdString());
         // The name is taken: by a live port (then this one cannot exist) or by a file
-        // that a dead process left behind (then it is removed). Under an absolute path
-        // only a socket file is: anything else there is someone's file, not a port.
-        struct stat st {};
-        if (name_.front() == '/' && ::lstat(path.c_str(), &st) == 0 && !S_ISSOCK(st.st_mode))
-            return invalid("a file that is not a socket is there");
+        // that a dead process left behind (then it is removed).
         QLocalSocket probe;
-        probe.connectToServer(name);
+        probe.connectToServer(serverName);
         const bool live = probe.waitForConnected(kProbeTimeoutMs);
         probe.abort();
         if (live) {
@@ -96,10 +118,23 @@ bool LocalMessagePort::listen(CreateFailure* failure) {
             SystemLog::log(SystemLog::kError, "Message port %s: the name is in use by a live port", name_.c_str());
             return false;
         }
-        QLocalServer::removeServer(name);
-        if (!server_->listen(name)) return invalid(server_->errorString().toStdString());
+        QLocalServer::removeServer(serverName);
+        if (!server_->listen(serverName)) return invalid(server_->errorString().toStdString());
     }
     connect(server_, &QLocalServer::newConnection, this, &LocalMessagePort::acceptPeers);
+    return true;
+}
+
+bool LocalMessagePort::shareWithGroup(gid_t group, std::string* error) {
+    const std::string path = socketPath();
+    // Read and write for the group: connecting to a Unix socket takes write permission.
+    if (path.empty() || ::chown(path.c_str(), static_cast<uid_t>(-1), group) != 0 || ::chmod(path.c_str(), 0660) != 0) {
+        if (error)
+            *error = StringFormat::format("cannot give the socket %s to group %u: %s", path.c_str(),
+                                          static_cast<unsigned>(group), std::strerror(errno));
+        return false;
+    }
+    allowedGroup_ = group;
     return true;
 }
 
@@ -112,6 +147,17 @@ void LocalMessagePort::acceptPeers() {
         QLocalSocket* socket = server_->nextPendingConnection();
         if (!socket) break;
         socket->setParent(this);
+        // Who connected is known from the socket itself, whatever the file's permissions.
+        const std::optional<PeerCredentials> credentials = PeerCredentials::of(socket->socketDescriptor());
+        if (!credentials || !credentials->accepted(allowedGroup_)) {
+            ++foreign_;
+            SystemLog::log(SystemLog::kWarning, "Message port %s: a connection from %s refused: not this user's",
+                           name_.c_str(),
+                           credentials ? PeerCredentials::describeUser(credentials->uid).c_str() : "an unknown user");
+            socket->abort();
+            delete socket;
+            continue;
+        }
         if (static_cast<int>(peers_.size()) >= maxPeers_) {
             ++refused_;
             SystemLog::log(SystemLog::kWarning, "Message port %s: %d peers connected already; a new connection refused",

@@ -11,6 +11,8 @@
 #include <string>
 #include <vector>
 
+#include <sys/types.h>
+
 class QLocalServer;
 class QLocalSocket;
 
@@ -35,17 +37,23 @@ public:
     using ReceiveCallback = std::function<std::optional<Bytes>(int32_t messageId, const Bytes& data)>;
     using InvalidationCallback = std::function<void(LocalMessagePort* port)>;
 
-    // Why create() failed: a live port has the name, or the name cannot be a port at all
+    // Why create() failed: a live port has the name; or the name cannot be a port at all
     // (empty, a NUL character, a relative name with a slash, a directory that does not
-    // exist or takes no socket, an absolute path to a file that is not a socket, too long).
+    // exist or takes no socket, an absolute path to a file that is not a socket, too long);
+    // or the socket, its directory or the runtime directory belongs to another user.
     struct CreateFailure {
         bool nameInUse = false;
-        std::string reason;  // "the name is in use by a live port", "not a valid port name: <name> (<why>)"
+        bool foreign = false;  // another user's socket or directory is where the port would be
+        // "the name is in use by a live port", "not a valid port name: <name> (<why>)",
+        // "the directory <path> belongs to uid <n> (<user>), not to this user", ...
+        std::string reason;
     };
 
-    // Listens under `name` (a QLocalServer name). Null, with *failure set, when the
-    // name cannot be listened on. A stale socket file left by a dead process is
-    // removed first; under an absolute path, a file that is no socket is left alone.
+    // Listens under `name`: a bare name in the user's runtime directory, or an absolute
+    // socket path (PortDirectory). Null, with *failure set, when the name cannot be
+    // listened on. A stale socket file of this user's, left by a dead process, is removed
+    // first; under an absolute path, a file that is no socket is left alone. Only peers
+    // of this user and root are served (PeerCredentials); others are closed at once.
     static std::unique_ptr<LocalMessagePort> create(const std::string& name, ReceiveCallback callback,
                                                     CreateFailure* failure = nullptr);
     ~LocalMessagePort() override;
@@ -68,6 +76,10 @@ public:
     bool hadConnection() const { return hadConnection_; }
     // The socket file the port listens on (its name resolved as in docs/protocol.md).
     std::string socketPath() const;
+    // Opens the port to a group (a lab service shared by its members): the socket file
+    // becomes readable and writable by `group`, and peers of that group are served too.
+    // False, with *error, when the file cannot be given to the group.
+    bool shareWithGroup(gid_t group, std::string* error);
 
     // Pushes a Notification frame to every connected peer (the service's
     // notifications to its clients). Returns how many peers it was queued for.
@@ -79,6 +91,8 @@ public:
     uint64_t refusedPeers() const { return refused_; }
     // Peers closed for going over a buffer limit.
     uint64_t overLimitPeers() const { return overLimit_; }
+    // Connections closed at once because their process runs as another user.
+    uint64_t foreignPeers() const { return foreign_; }
 
 private:
     struct Peer;
@@ -108,6 +122,8 @@ private:
     uint64_t malformed_ = 0;
     uint64_t refused_ = 0;
     uint64_t overLimit_ = 0;
+    uint64_t foreign_ = 0;
+    std::optional<gid_t> allowedGroup_;
 };
 
 }  // namespace vantorel

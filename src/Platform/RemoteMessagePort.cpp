@@ -2,6 +2,8 @@
 #include "Platform/RemoteMessagePort.h"
 
 #include "Platform/MessagePortFrame.h"
+#include "Platform/PeerCredentials.h"
+#include "Platform/PortDirectory.h"
 #include "Platform/StringFormat.h"
 #include "Platform/SystemLog.h"
 
@@ -44,13 +46,28 @@ RemoteMessagePort::~RemoteMessagePort() {
     if (socket_) disconnect(socket_, nullptr, this, nullptr);
 }
 
-std::unique_ptr<RemoteMessagePort> RemoteMessagePort::lookup(const std::string& name, int timeoutMs) {
+std::unique_ptr<RemoteMessagePort> RemoteMessagePort::lookup(const std::string& name, int timeoutMs,
+                                                             std::optional<gid_t> allowedGroup) {
     if (name.empty()) return nullptr;
+    std::string refused;
+    const std::string path = PortDirectory::socketPathFor(name, &refused);
+    if (path.empty()) {
+        SystemLog::log(SystemLog::kError, "Message port %s: %s", name.c_str(), refused.c_str());
+        return nullptr;
+    }
     std::unique_ptr<RemoteMessagePort> port(new RemoteMessagePort(name));
     RemoteMessagePort* p = port.get();
     p->socket_ = new QLocalSocket(p);
-    p->socket_->connectToServer(QString::fromStdString(name));
+    p->socket_->connectToServer(QString::fromStdString(path));
     if (!p->socket_->waitForConnected(std::max(0, timeoutMs))) return nullptr;
+    // The listening process, as the kernel recorded it: a port another user made under
+    // the name (a shared directory, an absolute path) is not ours to read.
+    const std::optional<PeerCredentials> server = PeerCredentials::of(p->socket_->socketDescriptor());
+    if (!server || !server->accepted(allowedGroup)) {
+        SystemLog::log(SystemLog::kError, "Message port %s is served by %s, not by this user; not connected", name.c_str(),
+                       server ? PeerCredentials::describeUser(server->uid).c_str() : "an unknown user");
+        return nullptr;
+    }
     // Queued, so that callbacks run from the event loop and never inside the
     // socket's own signal emission or inside sendRequest().
     // What a peer's frames may buffer is bounded as on a local port (MessagePortFrameDecoder);

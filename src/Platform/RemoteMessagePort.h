@@ -11,6 +11,8 @@
 #include <string>
 #include <vector>
 
+#include <sys/types.h>
+
 class QLocalSocket;
 
 namespace vantorel {
@@ -36,9 +38,12 @@ public:
     using NotificationCallback = std::function<void(int32_t messageId, const Bytes& data)>;
     using InvalidationCallback = std::function<void(RemoteMessagePort* port)>;
 
-    // Connects to the local port of that name; null when none answers within
-    // timeoutMs.
-    static std::unique_ptr<RemoteMessagePort> lookup(const std::string& name, int timeoutMs = 1000);
+    // Connects to the local port of that name (a bare name in the user's runtime
+    // directory, or an absolute socket path); null when none answers within timeoutMs,
+    // or when the process that answers runs as another user than this one, root, or a
+    // member of allowedGroup (PeerCredentials): its data would be someone else's.
+    static std::unique_ptr<RemoteMessagePort> lookup(const std::string& name, int timeoutMs = 1000,
+                                                     std::optional<gid_t> allowedGroup = std::nullopt);
     ~RemoteMessagePort() override;
 
     const std::string& name() const { return name_; }

@@ -1,6 +1,7 @@
 // TelephonyServiceConnection: client of the telephony service's well-known port: notifications and CreateLogChannel (docs/protocol.md).
 #include "Platform/TelephonyServiceConnection.h"
 
+#include "Platform/PortDirectory.h"
 #include "Platform/RemoteMessagePort.h"
 #include "PropertyList/Dictionary.h"
 #include "PropertyList/PropertyListSerialization.h"
@@ -66,7 +67,11 @@ TelephonyServiceConnection::LogChannelResult TelephonyServiceConnection::createL
     const std::string& localPortName) {
     auto request = Dictionary::create();
     request->set("Request", Value("CreateLogChannel"));
-    request->set("PortName", Value(localPortName));
+    // The socket path, not the bare name: a service of another user (root, serving a
+    // group) resolves bare names in its own runtime directory, not in ours.
+    std::string refused;
+    const std::string socketPath = PortDirectory::socketPathFor(localPortName, &refused);
+    request->set("PortName", Value(socketPath.empty() ? localPortName : socketPath));
     std::optional<Bytes> xml = PropertyListSerialization::write(Value(request), PropertyListSerialization::Format::XML);
     if (!xml) return transportError(kUnparsableReply);  // cannot happen for two strings
 

@@ -30,7 +30,7 @@ public:
         std::string portName;     // the service's own port for this channel; empty on failure
     };
     // Asks the service for a network-monitor log channel that streams to the local
-    // port `localPortName`. Blocks up to 1.0 s + 1.0 s.
+    // port `localPortName` (sent as its socket path). Blocks up to 1.0 s + 1.0 s.
     LogChannelResult createLogChannel(const std::string& localPortName);
 
     bool isValid() const;

@@ -2,6 +2,8 @@
 #include "TelephonyService/TelephonyService.h"
 
 #include "Platform/LocalMessagePort.h"
+#include "Platform/PeerCredentials.h"
+#include "Platform/PortDirectory.h"
 #include "Platform/RemoteMessagePort.h"
 #include "Platform/StringFormat.h"
 #include "Platform/SystemLog.h"
@@ -118,6 +120,19 @@ bool TelephonyService::start(std::string* error) {
     if (port_) return true;
     stopping_ = false;
     portName_ = options_.portName.empty() ? TelephonyServiceConnection::defaultServiceName() : options_.portName;
+    allowedGroup_.reset();
+    if (!options_.allowGroup.empty()) {
+        // A bare name lives in this user's runtime directory, which no group can reach.
+        if (portName_.front() != '/') {
+            if (error) *error = "--allow-group needs --port /PATH in a directory the group can reach";
+            return false;
+        }
+        allowedGroup_ = PeerCredentials::groupNamed(options_.allowGroup);
+        if (!allowedGroup_) {
+            if (error) *error = "--allow-group " + options_.allowGroup + ": no such group";
+            return false;
+        }
+    }
 
     if (!backend_) {
         backend_ = createBackend(options_, error);
@@ -145,6 +160,16 @@ bool TelephonyService::start(std::string* error) {
                                                               failure.reason.c_str());
         return false;
     }
+    std::string unshared;
+    if (allowedGroup_ && !port_->shareWithGroup(*allowedGroup_, &unshared)) {
+        if (error) *error = StringFormat::format("cannot listen on port %s: %s", portName_.c_str(), unshared.c_str());
+        port_.reset();
+        return false;
+    }
+    // The channel sockets a killed service left beside its port (the runtime directory
+    // is cleared as a whole; a port under an absolute path has neighbours not ours).
+    const QFileInfo socket(QString::fromStdString(port_->socketPath()));
+    PortDirectory::removeStaleSockets(socket.absolutePath().toStdString(), socket.fileName().toStdString() + ".channel.");
     // Clients come and go on the well-known port; it serves until stop().
     port_->setStaysValidWithoutPeers(true);
     port_->setInvalidationCallback([this](LocalMessagePort*) {
@@ -220,6 +245,7 @@ TelephonyService::Counters TelephonyService::counters() const {
     c.malformedFrames = ports.malformed;
     c.refusedPeers = ports.refused;
     c.overLimitPeers = ports.overLimit;
+    c.foreignPeers = ports.foreign;
     return c;
 }
 
@@ -227,6 +253,7 @@ void TelephonyService::PortCounts::add(const LocalMessagePort& port) {
     malformed += port.malformedFrames();
     refused += port.refusedPeers();
     overLimit += port.overLimitPeers();
+    foreign += port.foreignPeers();
 }
 
 TelephonyService::PortCounts TelephonyService::portCountsNow() const {
@@ -292,7 +319,8 @@ Bytes TelephonyService::createLogChannel(const std::string& clientPortName) {
                        clientPortName.c_str(), channels_.size());
         return channelReply(kTooManyChannels, "");
     }
-    std::unique_ptr<RemoteMessagePort> client = RemoteMessagePort::lookup(clientPortName, kClientLookupTimeoutMs);
+    std::unique_ptr<RemoteMessagePort> client =
+        RemoteMessagePort::lookup(clientPortName, kClientLookupTimeoutMs, allowedGroup_);
     if (!client) {
         SystemLog::log(SystemLog::kError, "Telephony service: no log channel for %s: that port does not answer",
                        clientPortName.c_str());
@@ -312,9 +340,10 @@ Bytes TelephonyService::createLogChannel(const std::string& clientPortName) {
                                                   static_cast<unsigned long long>(number));
     std::unique_ptr<LocalMessagePort> port = LocalMessagePort::create(
         name, [this, number](int32_t messageId, const Bytes& data) { return receiveOnChannel(number, messageId, data); });
-    if (!port) {
-        SystemLog::log(SystemLog::kError, "Telephony service: no log channel for %s: cannot listen on %s",
-                       clientPortName.c_str(), name.c_str());
+    std::string unshared;
+    if (!port || (allowedGroup_ && !port->shareWithGroup(*allowedGroup_, &unshared))) {
+        SystemLog::log(SystemLog::kError, "Telephony service: no log channel for %s: cannot listen on %s%s%s",
+                       clientPortName.c_str(), name.c_str(), unshared.empty() ? "" : ": ", unshared.c_str());
         return channelReply(kBackendFailed, "");
     }
     port->setMaxPeers(kChannelPortPeers);
@@ -570,12 +599,13 @@ void TelephonyService::backendStateChanged(ModemBackend::State state) {
 void TelephonyService::checkHealth() {
     const PortCounts ports = portCountsNow();
     if (ports.malformed > reported_.malformed || ports.refused > reported_.refused ||
-        ports.overLimit > reported_.overLimit) {
+        ports.overLimit > reported_.overLimit || ports.foreign > reported_.foreign) {
         statusLine(StringFormat::format("from clients so far: %llu malformed frames, %llu connections refused (too many), "
-                                        "%llu closed over a buffer limit; still serving",
+                                        "%llu closed over a buffer limit, %llu refused (another user's); still serving",
                                         static_cast<unsigned long long>(ports.malformed),
                                         static_cast<unsigned long long>(ports.refused),
-                                        static_cast<unsigned long long>(ports.overLimit)));
+                                        static_cast<unsigned long long>(ports.overLimit),
+                                        static_cast<unsigned long long>(ports.foreign)));
         reported_ = ports;
     }
     if (backend_ && backend_->state() == ModemBackend::State::Streaming &&

@@ -19,6 +19,8 @@
 #include <string>
 #include <vector>
 
+#include <sys/types.h>
+
 namespace vantorel {
 
 class CaptureWriter;
@@ -28,6 +30,9 @@ class RemoteMessagePort;
 // What the service runs, as vantorel-telephonyd's options say it.
 struct TelephonyServiceOptions {
     std::string portName;    // the well-known port; empty: TelephonyServiceConnection::defaultServiceName()
+    // --allow-group GROUP: a lab service shared by a group (an absolute portName only): its
+    // sockets are the group's to use and its members are served besides this user and root.
+    std::string allowGroup;
     std::string emulate;     // --emulate TECH (exactly one of emulate / replay)
     std::string replay;      // --replay FILE
     std::string device;      // --device PATH or tcp:HOST:PORT: a modem's DIAG port
@@ -111,6 +116,7 @@ public:
         uint64_t malformedRequests = 0;  // valid frames whose content was not a request we know
         uint64_t refusedPeers = 0;       // connections closed at once, a port having its peers already
         uint64_t overLimitPeers = 0;     // connections closed for going over a buffer limit
+        uint64_t foreignPeers = 0;       // connections closed at once, their process another user's
     };
     using StatusCallback = std::function<void(const std::string& line)>;
 
@@ -155,7 +161,7 @@ private:
     };
     // What the ports counted (malformed frames, refused and over-limit peers).
     struct PortCounts {
-        uint64_t malformed = 0, refused = 0, overLimit = 0;
+        uint64_t malformed = 0, refused = 0, overLimit = 0, foreign = 0;
         void add(const LocalMessagePort& port);
     };
 
@@ -187,6 +193,7 @@ private:
     std::unique_ptr<ModemBackend> backend_;
     std::unique_ptr<CaptureWriter> recorder_;
     std::unique_ptr<LocalMessagePort> port_;
+    std::optional<gid_t> allowedGroup_;  // of --allow-group
     std::map<uint64_t, std::unique_ptr<Channel>> channels_;
     QTimer healthTimer_;
     StatusCallback status_;

@@ -1,10 +1,10 @@
 // Tests the message ports: the 12-byte frame header and stream decoding with bad headers, and a local port served on its own thread answering a remote port (replies, timeouts, garbage peers, a stale socket file).
 #include "Platform/LocalMessagePort.h"
 #include "Platform/MessagePortFrame.h"
+#include "Platform/PortDirectory.h"
 #include "Platform/RemoteMessagePort.h"
 #include "support/EventLoopWait.h"
 
-#include <QDir>
 #include <QFile>
 #include <QLocalSocket>
 #include <QThread>
@@ -106,7 +106,7 @@ private:
 
 TEST(MessagePort, APortTakesOverAStaleSocketFileAnswersRequestsAndClosesAGarbagePeerWhileOthersGoOn) {
     const std::string name = uniquePortName("port");
-    QFile stale(QDir::tempPath() + "/" + QString::fromStdString(name));
+    QFile stale(QString::fromStdString(PortDirectory::socketPathFor(name, nullptr)));
     ASSERT_TRUE(stale.open(QIODevice::WriteOnly));
     stale.write("left behind by a dead process");
     stale.close();
@@ -127,7 +127,7 @@ TEST(MessagePort, APortTakesOverAStaleSocketFileAnswersRequestsAndClosesAGarbage
     EXPECT_EQ(reply, bytesOf("7:q"));
 
     QLocalSocket bad;
-    bad.connectToServer(QString::fromStdString(name));
+    bad.connectToServer(stale.fileName());  // the socket the port took over
     ASSERT_TRUE(bad.waitForConnected(1000));
     const Bytes garbage = header(9, 1, 2);
     bad.write(reinterpret_cast<const char*>(garbage.data()), static_cast<qint64>(garbage.size()));

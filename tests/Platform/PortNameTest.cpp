@@ -1,8 +1,8 @@
 // Tests why a local message port cannot be created: a name that can be no port at all against a name a live port holds, and that a file under the name which is no socket survives.
 #include "Platform/LocalMessagePort.h"
+#include "Platform/PortDirectory.h"
 #include "support/EventLoopWait.h"
 
-#include <QDir>
 #include <QFile>
 #include <QTemporaryDir>
 #include <gtest/gtest.h>
@@ -33,7 +33,7 @@ TEST(PortName, NamesThatCanBeNoPortAreToldApartFromANameInUse) {
         {"/tmp/" + std::string(120, 'x'), false},
         {plainFile, false},
         {live, true},
-        {QDir::tempPath().toStdString() + "/" + live, true},
+        {PortDirectory::socketPathFor(live, nullptr), true},
     };
     for (const auto& [name, inUse] : rows) {
         SCOPED_TRACE(name);

@@ -2,6 +2,7 @@
 #include "TelephonyService/TelephonyService.h"
 
 #include "Platform/MessagePortFrame.h"
+#include "Platform/PortDirectory.h"
 #include "Platform/RecordBuilder.h"
 #include "Platform/TelephonyIdentifiers.h"
 #include "TelephonyService/EmulatorBackend.h"
@@ -12,7 +13,6 @@
 #include "TelephonyService/TelephonyServiceThread.h"
 
 #include <QCoreApplication>
-#include <QDir>
 #include <QElapsedTimer>
 #include <QFile>
 #include <QLocalSocket>
@@ -21,6 +21,7 @@
 #include <gtest/gtest.h>
 
 #include <sys/socket.h>
+#include <sys/stat.h>
 #include <sys/un.h>
 #include <unistd.h>
 
@@ -149,7 +150,7 @@ TEST(TelephonyService, BadChannelRequestsAreAnsweredWithAnErrorAndServingGoesOn)
         {request(std::nullopt), TelephonyService::kMalformedRequest},
         {request(uniquePortName("nobody")), TelephonyService::kClientPortUnreachable},
         {request(service.portName()), TelephonyService::kServicePortNamed},
-        {request(QDir::tempPath().toStdString() + "/./" + service.portName()), TelephonyService::kServicePortNamed},
+        {request(PortDirectory::path(nullptr) + "/./" + service.portName()), TelephonyService::kServicePortNamed},
         {request(client.channel.portName), TelephonyService::kServicePortNamed},
         {withNulCharacter(*PropertyListSerialization::read(request("\u00e9-")).value), TelephonyService::kMalformedRequest},
         {request(unclaimed->name()), TelephonyService::kNoError},
@@ -169,6 +170,38 @@ TEST(TelephonyService, BadChannelRequestsAreAnsweredWithAnErrorAndServingGoesOn)
     EXPECT_TRUE(waitForCounters(service, [](const Counters& c) { return c.openChannels == 1; }, 4500));
 }
 
+TEST(TelephonyService, AServiceSharedWithAGroupGivesItItsSocketsAndClearsTheChannelsAKilledRunLeft) {
+    QTemporaryDir dir;
+    const std::string port = dir.filePath("lab").toStdString();
+    const std::vector<std::pair<std::string, bool>> leftovers = {  // socket file nobody listens on, survives
+        {port + ".channel.4242.1", false},
+        {dir.filePath("lab.other").toStdString(), true},  // a neighbour, not the service's
+    };
+    for (const auto& [path, survives] : leftovers) {
+        sockaddr_un address{};
+        address.sun_family = AF_UNIX;
+        path.copy(address.sun_path, sizeof address.sun_path - 1);
+        const int fd = ::socket(AF_UNIX, SOCK_STREAM, 0);
+        ASSERT_EQ(::bind(fd, reinterpret_cast<sockaddr*>(&address), sizeof address), 0);
+        ::close(fd);  // as a killed process leaves it
+    }
+    TelephonyServiceOptions shared = emulatorOptions();
+    shared.portName = port;
+    shared.allowGroup = std::to_string(::getegid());
+    TelephonyServiceThread service(shared);
+    std::string error;
+    ASSERT_TRUE(service.start(&error)) << error;
+    for (const auto& [path, survives] : leftovers) EXPECT_EQ(QFile::exists(QString::fromStdString(path)), survives) << path;
+    TestClient client;
+    ASSERT_TRUE(client.connect(port));
+    for (const std::string& socket : {port, client.channel.portName}) {
+        struct stat st {};
+        ASSERT_EQ(::stat(socket.c_str(), &st), 0) << socket;
+        EXPECT_EQ(st.st_mode & 0777, 0660u) << socket;
+        EXPECT_EQ(st.st_gid, ::getegid());
+    }
+}
+
 TEST(TelephonyService, PeersOverALimitAreClosedAndOthersAreStillServed) {
     TelephonyServiceThread service(emulatorOptions());
     ASSERT_TRUE(service.start());
@@ -178,7 +211,7 @@ TEST(TelephonyService, PeersOverALimitAreClosedAndOthersAreStillServed) {
     });
     auto peer = [&](const Bytes& bytes) {  // a connection that writes as much of the bytes as the service takes
         auto socket = std::make_unique<QLocalSocket>();
-        socket->connectToServer(QString::fromStdString(service.portName()));
+        socket->connectToServer(QString::fromStdString(PortDirectory::socketPathFor(service.portName(), nullptr)));
         EXPECT_TRUE(socket->waitForConnected(1000));
         socket->write(reinterpret_cast<const char*>(bytes.data()), static_cast<qint64>(bytes.size()));
         while (socket->bytesToWrite() > 0 && socket->waitForBytesWritten(1000)) {}
@@ -262,7 +295,7 @@ TEST(TelephonyService, AClientThatNeverReadsLosesItsOldestMessagesAndHoldsUpNoOt
     ASSERT_TRUE(service.start());
     // The never-reading client's receive port: a listening socket whose connections nobody accepts.
     const std::string silentName = uniquePortName("silent");
-    const std::string path = QDir::tempPath().toStdString() + "/" + silentName;
+    const std::string path = PortDirectory::socketPathFor(silentName, nullptr);
     const int fd = ::socket(AF_UNIX, SOCK_STREAM, 0);
     sockaddr_un address{};
     address.sun_family = AF_UNIX;
@@ -389,6 +422,10 @@ TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
          existing + ": the file being replayed cannot be recorded onto"},
         {with([](auto& o) { o.emulate = "utran"; o.portName = "/proc/vantorel-port"; }),
          "cannot listen on port /proc/vantorel-port: not a valid port name: /proc/vantorel-port ("},
+        {with([](auto& o) { o.emulate = "utran"; o.allowGroup = "nogroup"; }),
+         "--allow-group needs --port /PATH in a directory the group can reach"},
+        {with([&](auto& o) { o.emulate = "utran"; o.allowGroup = "no-such-group-of-vantorel"; o.portName = existing + ".port"; }),
+         "--allow-group no-such-group-of-vantorel: no such group"},
     };
     for (const auto& [failing, why] : failures) {
         TelephonyServiceThread service(failing);

@@ -70,11 +70,17 @@ int main(int argc, char** argv) {
         QStringLiteral("FILE"));
     const QCommandLineOption force(QStringLiteral("force"), QStringLiteral("Let --record replace an existing FILE."));
     const QCommandLineOption port(QStringLiteral("port"),
-                                  QStringLiteral("The service's well-known port (default %1).")
+                                  QStringLiteral("The service's well-known port: a name in this user's runtime directory "
+                                                 "or an absolute socket path (default %1).")
                                       .arg(QString::fromStdString(TelephonyServiceConnection::defaultServiceName())),
                                   QStringLiteral("NAME"));
+    const QCommandLineOption allowGroup(
+        QStringLiteral("allow-group"),
+        QStringLiteral("Serve the members of the group NAME too (a lab service shared by a group; needs --port /PATH "
+                       "in a directory the group can reach). Without it only this user and root are served."),
+        QStringLiteral("NAME"));
     const QCommandLineOption verbose(QStringLiteral("verbose"), QStringLiteral("Mirror the system log to stderr."));
-    parser.addOptions({emulate, replay, device, speed, loop, technology, record, recordQmdl, force, port, verbose});
+    parser.addOptions({emulate, replay, device, speed, loop, technology, record, recordQmdl, force, port, allowGroup, verbose});
     parser.process(app);  // --help and unknown options end here
 
     if (!parser.positionalArguments().isEmpty())
@@ -108,6 +114,7 @@ int main(int argc, char** argv) {
     options.record = parser.value(record).toStdString();
     options.replaceRecording = parser.isSet(force);
     options.portName = parser.value(port).toStdString();
+    options.allowGroup = parser.value(allowGroup).toStdString();
     bool speedOk = false;
     options.speed = parser.value(speed).toDouble(&speedOk);
     if (!speedOk || options.speed < 0)
@@ -127,10 +134,11 @@ int main(int argc, char** argv) {
     const TelephonyService::Counters c = service.counters();
     std::fprintf(stderr,
                  "vantorel-telephonyd: stopped: %llu messages sent, %llu dropped (clients too slow), %llu recorded, %llu "
-                 "channels served, %llu malformed frames, %llu connections refused, %llu closed over a buffer limit\n",
+                 "channels served, %llu malformed frames, %llu connections refused, %llu closed over a buffer limit, "
+                 "%llu refused (another user's)\n",
                  static_cast<unsigned long long>(c.messagesSent), static_cast<unsigned long long>(c.messagesDropped),
                  static_cast<unsigned long long>(c.messagesRecorded), static_cast<unsigned long long>(c.channelsServed),
                  static_cast<unsigned long long>(c.malformedFrames), static_cast<unsigned long long>(c.refusedPeers),
-                 static_cast<unsigned long long>(c.overLimitPeers));
+                 static_cast<unsigned long long>(c.overLimitPeers), static_cast<unsigned long long>(c.foreignPeers));
     return status;
 }
