@@ -1,4 +1,4 @@
-// LTEScenario: the emulator's LTE modem, its cells and measurements evolving tick by tick, sent in the byte layouts the LTE decoders read.
+// LTEScenario: the emulator's LTE modem driving through its network, the radio levels and cell changes computed tick by tick and sent in the byte layouts the LTE decoders read.
 #include "TelephonyService/Emulator/LTEScenario.h"
 
 #include "Platform/LogCodes.h"
@@ -9,33 +9,62 @@
 #include "PropertyList/Dictionary.h"
 
 #include <algorithm>
+#include <bit>
+#include <cmath>
 #include <string_view>
 
-// Portability note: the order in which a function's arguments are evaluated is
+// Portability notes: the order in which a function's arguments are evaluated is
 // unspecified, so every random draw below is its own statement (never two draws
-// in one expression); that keeps the byte stream the same with every compiler.
+// in one expression); and the radio levels are integer arithmetic (hundredths of a
+// dB, a logarithm computed bit by bit, a table for adding powers), never the
+// floating-point library's logarithms, whose last bits differ between libraries.
+// That keeps the byte stream the same with every compiler and machine.
 
 namespace vantorel {
 
 namespace {
 
 // A carrier of the network: downlink EARFCN (uplink = downlink + 18000 on these
-// FDD bands), 3GPP band, bandwidth in resource blocks, 10 log10(resource blocks)
-// (RSSI = RSRP + that - RSRQ), idle-mode layer priority, and whether SIB1 carries P-Max.
+// FDD bands), 3GPP band, bandwidth in resource blocks, idle-mode layer priority,
+// whether SIB1 carries P-Max, and the reference signal's EIRP per resource element
+// in hundredths of a dBm (less path loss on 800 MHz, more on 2600 MHz, folded in).
 struct Carrier {
     uint16_t earfcn;
     int32_t band;
     uint8_t resourceBlocks;
-    int32_t tenLogRB;
     uint8_t priority;
     bool pMax;
+    int32_t eirp;
 };
 constexpr Carrier kCarriers[] = {
-    {1300, 3, 100, 20, 5, true},  // 1800 MHz, 20 MHz wide
-    {6300, 20, 50, 17, 3, false}, // 800 MHz, 10 MHz wide
-    {3050, 7, 100, 20, 6, true},  // 2600 MHz, 20 MHz wide
+    {1300, 3, 100, 5, true, 2700},   // 1800 MHz, 20 MHz wide
+    {6300, 20, 50, 3, false, 3400},  // 800 MHz, 10 MHz wide
+    {3050, 7, 100, 6, true, 2300},   // 2600 MHz, 20 MHz wide
 };
 constexpr size_t kCarrierCount = std::size(kCarriers);
+
+// The map, in metres: the loop road the UE drives (a closed polygon, about 16.4 km)
+// and the sites, most of them 150..600 m beside the road, one on a hill inside the loop.
+struct Point {
+    int32_t x, y;
+};
+constexpr Point kRoute[] = {{0, 0},       {2500, -300}, {4200, 400},  {4800, 2000}, {4300, 3600},
+                            {2600, 4300}, {800, 4000},  {-600, 3000}, {-900, 1400}};
+constexpr Point kSites[] = {{350, 250},   {1800, -550}, {3300, 250}, {4650, 1150}, {4350, 2700}, {3600, 4200},
+                            {2000, 3850}, {450, 4300},  {-950, 2400}, {-350, 800},  {2200, 2100}};
+constexpr int64_t kAntennaHeight = 30;  // m above the road, in the distance
+
+constexpr int32_t kSpeedMin = 800;      // cm/s: 29 km/h
+constexpr int32_t kSpeedMax = 1700;     // 61 km/h
+constexpr int32_t kSpeedTypical = 1250; // 45 km/h
+
+constexpr int32_t kShadowSigma = 400;          // 4 dB
+constexpr int64_t kShadowDistanceCm = 80 * 100;  // decorrelation distance, 80 m
+constexpr int32_t kFastVariation = 60;         // +-0.6 dB per measurement
+constexpr int32_t kRSRQFloor = -1950;          // -19.5 dB
+constexpr int32_t kNoisePerRE = -12520;        // -174 dBm/Hz + 15 kHz + 7 dB noise figure
+constexpr int32_t kMeasuredThreshold = -12400; // measured neighbours from -124 dBm
+constexpr int32_t kDetectedThreshold = -13400; // detected cells from -134 dBm
 
 constexpr int64_t kMCC = 262;
 constexpr int64_t kMNC = 1;
@@ -48,26 +77,116 @@ constexpr uint32_t kSIntraSearch = 20;   // 40 dB in 2 dB steps
 constexpr uint32_t kSNonIntraSearch = 5; // 10 dB in 2 dB steps
 constexpr uint32_t kUEMaxPower = 53;     // 23 dBm (power class 3), raw x - 30
 
-// Signal levels are kept in quarter dB (RSRP, RSRQ).
-constexpr int32_t kRSRPMin = -128 * 4;
-constexpr int32_t kRSRPMax = -65 * 4;
-constexpr int32_t kRSRQMin = -19 * 4;
-constexpr int32_t kRSRQMax = -4 * 4;
-
 uint32_t clampRaw(int32_t raw, uint32_t bits) {
     return static_cast<uint32_t>(std::clamp(raw, 0, static_cast<int32_t>((1u << bits) - 1)));
 }
 
-// RSSI in half dB from RSRP and RSRQ in quarter dB: RSRQ = N x RSRP / RSSI.
-int32_t rssiHalfDB(int32_t rsrp, int32_t rsrq, const Carrier& carrier) {
-    return (rsrp - rsrq) / 2 + 2 * carrier.tenLogRB;
+// a / b rounded to the nearest integer (halves upwards), for negative a too (b > 0).
+int32_t roundedDiv(int64_t a, int64_t b) {
+    int64_t n = a + b / 2;
+    return static_cast<int32_t>(n >= 0 ? n / b : -((-n + b - 1) / b));
 }
 
-// Srxlev = measured RSRP - Qrxlevmin (no power compensation at 23 dBm), in dB.
-int32_t srxlev(int32_t rsrp) {
-    return rsrp / 4 - kQrxlevmin;
+// log2(x) in units of 1/65536 for x >= 1: the integer part from the top bit, the
+// fraction bit by bit (squaring the mantissa, kept in [1, 2) as Q30, doubles it).
+int64_t log2Q16(uint64_t x) {
+    const int n = 63 - std::countl_zero(x | 1);
+    int64_t result = static_cast<int64_t>(n) << 16;
+    uint64_t m = n <= 30 ? x << (30 - n) : x >> (n - 30);
+    for (int bit = 15; bit >= 0; --bit) {
+        m = (m * m) >> 30;
+        if (m >= (uint64_t{2} << 30)) {
+            m >>= 1;
+            result += int64_t{1} << bit;
+        }
+    }
+    return result;
 }
 
+// 10 log10(x) in hundredths of a dB (x >= 1): 301.03 x log2(x).
+int32_t hundredthsDB(uint64_t x) {
+    return roundedDiv(log2Q16(x) * 30103, int64_t{100} << 16);
+}
+
+// The power sum of two levels in hundredths of a dB: the larger plus
+// 10 log10(1 + 10^(-difference / 10)), from this table at 1 dB steps, interpolated.
+constexpr int32_t kPowerSumTable[] = {301, 254, 212, 176, 146, 119, 97, 79, 64, 51, 41, 33, 27,
+                                      21,  17,  14,  11,  9,   7,   5,  4,  3,  3,  2,  2,  0};
+int32_t powerSum(int32_t a, int32_t b) {
+    const int32_t high = std::max(a, b);
+    const int32_t difference = high - std::min(a, b);
+    const size_t i = static_cast<size_t>(difference / 100);
+    if (i + 1 >= std::size(kPowerSumTable)) return high;
+    const int32_t fraction = difference % 100;
+    return high + kPowerSumTable[i] + (kPowerSumTable[i + 1] - kPowerSumTable[i]) * fraction / 100;
+}
+
+// The loop's length and the UE's point at a position along it, in centimetres.
+int64_t segmentLengthCm(size_t i) {
+    const Point& a = kRoute[i];
+    const Point& b = kRoute[(i + 1) % std::size(kRoute)];
+    const int64_t dx = int64_t{b.x - a.x} * 100;
+    const int64_t dy = int64_t{b.y - a.y} * 100;
+    // sqrt is exactly rounded (IEEE 754), so this is the same everywhere.
+    return static_cast<int64_t>(std::sqrt(static_cast<double>(dx * dx + dy * dy)));
+}
+int64_t routeLengthCm() {
+    int64_t total = 0;
+    for (size_t i = 0; i < std::size(kRoute); ++i) total += segmentLengthCm(i);
+    return total;
+}
+struct PointCm {
+    int64_t x, y;
+};
+PointCm pointAt(int64_t positionCm) {
+    for (size_t i = 0; i < std::size(kRoute); ++i) {
+        const int64_t length = segmentLengthCm(i);
+        if (positionCm < length || i + 1 == std::size(kRoute)) {
+            const Point& a = kRoute[i];
+            const Point& b = kRoute[(i + 1) % std::size(kRoute)];
+            return {int64_t{a.x} * 100 + int64_t{b.x - a.x} * 100 * positionCm / length,
+                    int64_t{a.y} * 100 + int64_t{b.y - a.y} * 100 * positionCm / length};
+        }
+        positionCm -= length;
+    }
+    return {0, 0};
+}
+
+// The path gain from a site to a point, hundredths of a dB: EIRP - (15.3 + 37.6 log10(d / m)),
+// with 37.6 log10(d) = 1.88 x 10 log10(d^2).
+int32_t pathGain(const Carrier& carrier, const Point& site, PointCm at) {
+    const int64_t dx = (at.x - int64_t{site.x} * 100) / 100;
+    const int64_t dy = (at.y - int64_t{site.y} * 100) / 100;
+    const uint64_t d2 = static_cast<uint64_t>(dx * dx + dy * dy + kAntennaHeight * kAntennaHeight);
+    return carrier.eirp - (1530 + roundedDiv(int64_t{hundredthsDB(d2)} * 188, 100));
+}
+
+// A standard normal draw in thousandths, from three uniform draws (their sum has
+// unit variance and stays within three deviations).
+template <class Uniform>
+int32_t normalThousandths(Uniform&& uniform) {
+    int32_t sum = uniform(-1000, 1000);
+    sum += uniform(-1000, 1000);
+    sum += uniform(-1000, 1000);
+    return sum;
+}
+
+// The share of a cell's resource elements that carry power at a load (percent), in
+// hundredths of a dB: reference signals always (1/6 of the elements in their symbols),
+// data elements by the load.
+int32_t activityDB(int32_t loadPercent) {
+    const int32_t perMille = 167 + 833 * std::clamp(loadPercent, 0, 100) / 100;
+    return hundredthsDB(static_cast<uint64_t>(perMille)) - 3000;
+}
+
+// Srxlev = measured RSRP - Qrxlevmin (no power compensation at 23 dBm), in dB, from quarter dB.
+int32_t srxlev(int32_t rsrpQuarter) {
+    return rsrpQuarter / 4 - kQrxlevmin;
+}
+
+int32_t quarterDB(int32_t hundredths) {
+    return roundedDiv(hundredths, 25);
+}
 
 }  // namespace
 
@@ -80,30 +199,14 @@ std::string LTEScenario::technology() const {
 }
 
 std::string LTEScenario::description() const {
-    return "LTE cell of 262-01 on bands 3/7/20: drifting RSRP/RSRQ, neighbours, idle reselection candidates, handovers";
+    return "LTE UE of 262-01 driving a loop: path loss and shadowing, neighbours, A3 handovers, idle reselection candidates";
 }
-
 
 // ---- state -------------------------------------------------------------------
-
-LTEScenario::LTECell LTEScenario::newCell(size_t carrier) {
-    LTECell c;
-    c.carrier = carrier;
-    c.pci = static_cast<uint16_t>(uniform(0, 503));
-    int32_t enodeb = enodeBase_ + uniform(0, 400);
-    int32_t sector = uniform(1, 3);
-    c.cellIdentity = (enodeb << 8) | (sector + 10 * static_cast<int32_t>(carrier));
-    c.rsrp = uniform(-112 * 4, -96 * 4);
-    c.rsrq = uniform(-16 * 4, -9 * 4);
-    c.timing = uniform(0, 307199);
-    return c;
-}
 
 void LTEScenario::restart() {
     reseed();
     nextTick_ = 0;
-    cellChanges_ = 0;
-    ticksInCell_ = 0;
     drxBelowZero_ = 0;
 
     // SIM identity: ICCID 89 49 01 (telecom, Germany, issuer) + 12 digits + Luhn.
@@ -115,21 +218,60 @@ void LTEScenario::restart() {
     sim_.acc = "0008";  // access class 3
     sim_.fplmn = "62F22062F230FFFFFFFFFFFF";  // 262-02, 262-03 forbidden
     sim_.oplmnAcT = "62F2104000";  // 262-01 with E-UTRAN
-    enodeBase_ = uniform(0x10000, 0xF0000);
+    const int32_t enodeBase = uniform(0x10000, 0xF0000);
+    carrier_ = static_cast<size_t>(uniform(0, static_cast<int32_t>(kCarrierCount) - 1));
 
-    // The serving cell on a random carrier and a pool of neighbours on the same one.
-    serving_ = newCell(static_cast<size_t>(uniform(0, static_cast<int32_t>(kCarrierCount) - 1)));
-    serving_.rsrp = uniform(-92 * 4, -80 * 4);
-    serving_.present = true;
-    avgRsrp_ = serving_.rsrp;
-    avgRsrq_ = serving_.rsrq;
-    lastRules_ = measurementRules();
-    txAntennas_ = 2;
-    for (size_t k = 0; k < kNeighbourPool; ++k) {
-        neighbours_[k] = newCell(serving_.carrier);
-        neighbours_[k].detectedOnly = k >= 6;  // the last two are only found by the searcher
-        neighbours_[k].present = k < 3 || k == 6;
+    commonShadow_ = shadowDraw();
+
+    // The cells: PCIs planned as 3 x group + sector with a group of its own per site.
+    std::array<bool, 168> groupUsed{};
+    for (size_t k = 0; k < kSiteCount; ++k) {
+        LTECell& c = cells_[k];
+        c = LTECell{};
+        int32_t group = uniform(0, 167);
+        while (groupUsed[static_cast<size_t>(group)]) group = (group + 1) % 168;
+        groupUsed[static_cast<size_t>(group)] = true;
+        const int32_t sector = uniform(0, 2);
+        c.pci = static_cast<uint16_t>(3 * group + sector);
+        c.cellIdentity = ((enodeBase + static_cast<int32_t>(k)) << 8) | (sector + 1 + 10 * static_cast<int32_t>(carrier_));
+        const int32_t fourAntennas = uniform(0, 2);
+        c.txAntennas = fourAntennas == 0 ? 4 : 2;
+        c.timing = uniform(0, 307199);
+        c.frequencyOffset = static_cast<uint16_t>(uniform(0, 300));
+        c.shadow = shadowDraw();
+        c.loadTarget = uniform(15, 70);
+        c.load = c.loadTarget;
     }
+
+    // The start: a random place on the loop, moved to a few hundred metres before the
+    // next point where another cell's path gain overtakes the best one's.
+    const int64_t length = routeLengthCm();
+    int64_t start = static_cast<int64_t>(random() % static_cast<uint32_t>(length));
+    const auto bestAt = [this](int64_t position) {
+        const PointCm at = pointAt(position);
+        size_t best = 0;
+        for (size_t k = 1; k < kSiteCount; ++k)
+            if (pathGain(kCarriers[carrier_], kSites[k], at) > pathGain(kCarriers[carrier_], kSites[best], at)) best = k;
+        return best;
+    };
+    const size_t first = bestAt(start);
+    int64_t border = start;
+    for (int64_t walked = 0; walked < length && bestAt(border) == first; walked += 1000) border = (border + 1000) % length;
+    const int32_t lead = uniform(250, 400);
+    position_ = (border + length - int64_t{lead} * 100) % length;
+    speed_ = kSpeedTypical;
+
+    serving_ = 0;
+    connected_ = false;
+    measure(0);
+    for (LTECell& c : cells_) {
+        c.filteredRsrp = c.rsrp;
+        c.filteredRsrq = c.rsrq;
+    }
+    for (size_t k = 1; k < kSiteCount; ++k)
+        if (cells_[k].filteredRsrp > cells_[serving_].filteredRsrp) serving_ = k;
+    rankNeighbours();
+    lastRules_ = measurementRules();
 
     // Reselection candidates: the two other LTE carriers, two UMTS band I carriers,
     // a GSM 900 and a DCS 1800 cell.
@@ -173,16 +315,112 @@ void LTEScenario::retuneLTECandidates() {
     // The LTE candidates are the carriers other than the serving one.
     size_t k = 0;
     for (size_t carrier = 0; carrier < kCarrierCount && k < 2; ++carrier) {
-        if (carrier == serving_.carrier) continue;
+        if (carrier == carrier_) continue;
         candidates_[k].channel = kCarriers[carrier].earfcn;
         candidates_[k].priority = kCarriers[carrier].priority;
         ++k;
     }
 }
 
-size_t LTEScenario::presentNeighbours() const {
-    return static_cast<size_t>(std::count_if(neighbours_.begin(), neighbours_.end(),
-                                             [](const LTECell& c) { return c.present; }));
+void LTEScenario::drive() {
+    // The speed wanders between town and through-road speeds.
+    const int32_t change = uniform(-40, 40);
+    speed_ = std::clamp(pulled(speed_, change, kSpeedTypical), kSpeedMin, kSpeedMax);
+    const int64_t travelled = int64_t{speed_} * tickInterval().count() / 1000;
+    position_ = (position_ + travelled) % routeLengthCm();
+    measure(travelled);
+    rankNeighbours();
+}
+
+void LTEScenario::measure(int64_t travelledCm) {
+    const Carrier& carrier = kCarriers[carrier_];
+    const PointCm at = pointAt(position_);
+    // Shadowing as a first-order process over distance: s' = a s + sqrt(1 - a^2) sigma w,
+    // a = 1 - travelled / decorrelation distance (thousandths).
+    const int64_t a = std::max<int64_t>(0, 1000 - travelledCm * 1000 / kShadowDistanceCm);
+    const int64_t innovation = static_cast<int64_t>(std::sqrt(static_cast<double>(1000000 - a * a)));
+    const auto fade = [&](int32_t& shadow) {
+        const int32_t w = normalThousandths([this](int32_t lo, int32_t hi) { return uniform(lo, hi); });
+        shadow = static_cast<int32_t>((a * shadow + innovation * kShadowSigma * w / 1000) / 1000);
+    };
+    if (travelledCm > 0) fade(commonShadow_);
+    int32_t total = kNoisePerRE;
+    for (size_t k = 0; k < kSiteCount; ++k) {
+        LTECell& c = cells_[k];
+        if (travelledCm > 0) fade(c.shadow);
+        // The load wanders around the cell's own level; the UE's traffic adds to its serving cell.
+        const int32_t change = uniform(-3, 3);
+        c.load = std::clamp(pulled(c.load, change, c.loadTarget), 5, 95);
+        // Half of the shadowing is the surroundings of the UE, common to every site (correlation 0.5).
+        c.local = pathGain(carrier, kSites[k], at) + roundedDiv(int64_t{707} * (commonShadow_ + c.shadow), 1000);
+        const int32_t fast = uniform(-kFastVariation, kFastVariation);
+        c.rsrp = c.local + fast;
+        const int32_t load = c.load + (connected_ && k == serving_ ? 25 : 0);
+        total = powerSum(total, c.local + activityDB(load));
+        const int32_t drift = uniform(-16, 16);
+        c.timing = std::clamp(c.timing + drift, 0, 307199);
+    }
+    // RSRQ = N x RSRP / RSSI with RSSI = 12 N x the power per resource element: RSRP - total - 10 log10 12.
+    rssi_ = total + hundredthsDB(12u * carrier.resourceBlocks);
+    const int32_t twelve = hundredthsDB(12);
+    for (LTECell& c : cells_) {
+        // Below -19.5 dB the UE reports the bottom of the RSRQ range (TS 36.133).
+        c.rsrq = std::max(c.rsrp - total - twelve, kRSRQFloor);
+        // Layer 3 filtering, coefficient 1/2 per tick.
+        c.filteredRsrp += roundedDiv(c.rsrp - c.filteredRsrp, 2);
+        c.filteredRsrq += roundedDiv(c.rsrq - c.filteredRsrq, 2);
+    }
+}
+
+int32_t LTEScenario::shadowDraw() {
+    const int32_t w = normalThousandths([this](int32_t lo, int32_t hi) { return uniform(lo, hi); });
+    return roundedDiv(int64_t{w} * kShadowSigma, 1000);
+}
+
+int32_t LTEScenario::shownFilteredRsrp(const LTECell& c) const {
+    return 2 * roundedDiv(c.filteredRsrp, 50);
+}
+
+void LTEScenario::rankNeighbours() {
+    std::vector<size_t> others;
+    for (size_t k = 0; k < kSiteCount; ++k)
+        if (k != serving_) others.push_back(k);
+    std::stable_sort(others.begin(), others.end(),
+                     [this](size_t a, size_t b) { return cells_[a].filteredRsrp > cells_[b].filteredRsrp; });
+    measured_.clear();
+    detected_.clear();
+    for (size_t k : others) {
+        const int32_t level = cells_[k].filteredRsrp;
+        if (measured_.size() < kMeasuredCells && level >= kMeasuredThreshold) {
+            measured_.push_back(k);
+        } else if (detected_.size() < kDetectedCells && level >= kDetectedThreshold) {
+            detected_.push_back(k);
+        }
+    }
+}
+
+void LTEScenario::countBetterTicks() {
+    const int32_t serving = shownFilteredRsrp(cells_[serving_]);
+    for (size_t k = 0; k < kSiteCount; ++k) {
+        LTECell& c = cells_[k];
+        const bool listed = std::find(measured_.begin(), measured_.end(), k) != measured_.end();
+        const bool better = listed && shownFilteredRsrp(c) >= serving + kHysteresisQuarterDB;
+        c.betterTicks = better ? c.betterTicks + 1 : 0;
+    }
+}
+
+bool LTEScenario::changeCellIfTriggered() {
+    // The best of the cells that met the rule for the time-to-trigger takes over.
+    size_t target = kSiteCount;
+    for (size_t k = 0; k < kSiteCount; ++k) {
+        const LTECell& c = cells_[k];
+        if (c.betterTicks < kTimeToTriggerTicks) continue;
+        if (target == kSiteCount || c.filteredRsrp > cells_[target].filteredRsrp) target = k;
+    }
+    if (target == kSiteCount) return false;
+    serving_ = target;
+    for (LTECell& c : cells_) c.betterTicks = 0;
+    return true;
 }
 
 // The measurement rules in force (4 bits): bit 0 intra-frequency cells
@@ -190,46 +428,12 @@ size_t LTEScenario::presentNeighbours() const {
 // lower priority (Srxlev <= SNonIntraSearch), bit 2 higher-priority layers (measured
 // whenever the serving layer is not the highest).
 uint8_t LTEScenario::measurementRules() const {
-    const int32_t s = srxlev(serving_.rsrp);
+    const int32_t s = srxlev(shownFilteredRsrp(cells_[serving_]));
     uint8_t rules = 0;
     if (s <= static_cast<int32_t>(2 * kSIntraSearch)) rules |= 1;
     if (s <= static_cast<int32_t>(2 * kSNonIntraSearch)) rules |= 2;
-    if (kCarriers[serving_.carrier].priority < 6) rules |= 4;
+    if (kCarriers[carrier_].priority < 6) rules |= 4;
     return rules;
-}
-
-void LTEScenario::evolveRadio() {
-    // The UE moves away from the serving cell: its RSRP follows (a few dB behind) a
-    // level that falls from -76 dBm after a cell change to -122 dBm at the next one.
-    ++ticksInCell_;
-    const int32_t target = -76 * 4 - static_cast<int32_t>((46 * 4 * ticksInCell_) / kCellChangePeriod);
-    int32_t step = uniform(-6, 6);
-    serving_.rsrp = std::clamp(serving_.rsrp + step + (target - serving_.rsrp) / 5, kRSRPMin, kRSRPMax);
-    step = uniform(-3, 3);
-    serving_.rsrq = std::clamp(pulled(serving_.rsrq, step, -10 * 4), kRSRQMin, kRSRQMax);
-    // Layer 3 filtering of the averages (coefficient 1/4).
-    avgRsrp_ += (serving_.rsrp - avgRsrp_) / 4;
-    avgRsrq_ += (serving_.rsrq - avgRsrq_) / 4;
-    for (LTECell& c : neighbours_) {
-        step = uniform(-8, 8);
-        c.rsrp = std::clamp(pulled(c.rsrp, step, -104 * 4), kRSRPMin, kRSRPMax);
-        step = uniform(-3, 3);
-        c.rsrq = std::clamp(pulled(c.rsrq, step, -13 * 4), kRSRQMin, kRSRQMax);
-        step = uniform(-16, 16);
-        c.timing = std::clamp(c.timing + step, 0, 307199);
-    }
-
-    // Neighbours come and go, keeping 1 to 6 of them; a newcomer starts weak.
-    if (chance(12)) {
-        LTECell& c = neighbours_[static_cast<size_t>(uniform(0, static_cast<int32_t>(kNeighbourPool) - 1))];
-        size_t n = presentNeighbours();
-        if (c.present && n > 1) {
-            c.present = false;
-        } else if (!c.present && n < 6) {
-            c.present = true;
-            c.rsrp = uniform(-118 * 4, -108 * 4);
-        }
-    }
 }
 
 void LTEScenario::evolveMode() {
@@ -272,62 +476,20 @@ bool LTEScenario::evolveBearers() {
     return false;
 }
 
-void LTEScenario::changeCell() {
-    // Handover (connected) or reselection (idle): intra-frequency to the strongest
-    // listed neighbour and inter-frequency to the next carrier, in turn.
-    ++cellChanges_;
-    ticksInCell_ = 0;
-    if (cellChanges_ % 2 == 1) {
-        const size_t carrier = (serving_.carrier + 1) % kCarrierCount;
-        const int32_t rsrp = serving_.rsrp;
-        serving_ = newCell(carrier);
-        int32_t gain = uniform(3 * 4, 8 * 4);
-        serving_.rsrp = std::clamp(rsrp + gain, kRSRPMin, kRSRPMax);
-        serving_.present = true;
-        for (size_t k = 0; k < kNeighbourPool; ++k) {
-            const bool detectedOnly = neighbours_[k].detectedOnly;
-            const bool present = neighbours_[k].present;
-            neighbours_[k] = newCell(carrier);
-            neighbours_[k].detectedOnly = detectedOnly;
-            neighbours_[k].present = present;
-        }
-        retuneLTECandidates();
-    } else {
-        size_t best = kNeighbourPool;
-        for (size_t k = 0; k < kNeighbourPool; ++k) {
-            const LTECell& c = neighbours_[k];
-            if (c.present && !c.detectedOnly && (best == kNeighbourPool || c.rsrp > neighbours_[best].rsrp)) best = k;
-        }
-        if (best == kNeighbourPool) best = 0;
-        LTECell& target = neighbours_[best];
-        // The target cell has been the better one for the time-to-trigger (event A3, 3 dB offset).
-        target.rsrp = std::max(target.rsrp, serving_.rsrp + 3 * 4);
-        target.present = true;
-        std::swap(serving_, target);
-        target.rsrp = std::min(target.rsrp, serving_.rsrp - 3 * 4);
-    }
-    avgRsrp_ = serving_.rsrp;
-    avgRsrq_ = serving_.rsrq;
-    int32_t fourAntennas = uniform(0, 2);
-    txAntennas_ = fourAntennas == 0 ? 4 : 2;
-}
-
 std::vector<Bytes> LTEScenario::step() {
     const uint64_t tick = nextTick_++;
     bool cellChanged = tick == 0;
     bool candidatesChanged = tick == 0;
     bool bearersChanged = false;
     if (tick > 0) {
-        evolveRadio();
+        // The cell change the earlier ticks' measurements triggered, then this tick's drive.
+        cellChanged = changeCellIfTriggered();
         evolveMode();
-        candidatesChanged = evolveCandidates();
+        drive();
+        candidatesChanged = evolveCandidates() || cellChanged;
         bearersChanged = evolveBearers();
-        if (tick % kCellChangePeriod == kCellChangePeriod - 1) {
-            changeCell();
-            cellChanged = true;
-            candidatesChanged = true;
-        }
     }
+    countBetterTicks();
 
     std::vector<Bytes> out;
     if (tick == 0) {
@@ -338,11 +500,11 @@ std::vector<Bytes> LTEScenario::step() {
     }
     if (cellChanged || tick % 10 == 0) out.push_back(servingCellRecord(tick));
     if (cellChanged || tick % 20 == 0) out.push_back(antennaRecord(tick));
-    if (connected_) {
-        out.push_back(connectedMeasurementRecord(tick, tick % 7 == 3));
-    } else {
+    // Both modes' measurements on a cell change, so no section still names the old cell.
+    if (connected_ || cellChanged) out.push_back(connectedMeasurementRecord(tick, tick % 7 == 3));
+    if (!connected_ || cellChanged) {
         out.push_back(servingMeasurementRecord(tick));
-        if (tick % 2 == 0 && presentNeighbours() > 0) out.push_back(neighbourMeasurementRecord(tick));
+        if (!measured_.empty()) out.push_back(neighbourMeasurementRecord(tick));
         if (candidatesChanged || tick % 5 == 0) out.push_back(reselectionCandidatesRecord(tick));
     }
     if (tick > 0 && (cellChanged || tick % 10 == 0)) out.push_back(cellMonitorRecord((tick / 10) % 2 == 1));
@@ -355,78 +517,80 @@ std::vector<Bytes> LTEScenario::step() {
 // ---- records -----------------------------------------------------------------
 
 Bytes LTEScenario::servingCellRecord(uint64_t tick) const {
-    const Carrier& carrier = kCarriers[serving_.carrier];
+    const Carrier& carrier = kCarriers[carrier_];
+    const LTECell& serving = cells_[serving_];
     return RecordBuilder::ordinary(LogCode::kLTEServingCellInfo, 38)
         .timestamp(timestampForTick(tick))
         .u8(13, 1)                                                // 13: record version
-        .u16(14, serving_.pci)                                    // 14-15: physical cell identity
+        .u16(14, serving.pci)                                     // 14-15: physical cell identity
         .u16(16, carrier.earfcn)                                  // 16-17: downlink EARFCN
         .u16(18, static_cast<uint16_t>(carrier.earfcn + 18000))   // 18-19: uplink EARFCN
         .u8(20, carrier.resourceBlocks)                           // 20: downlink bandwidth in RBs
         .u8(21, carrier.resourceBlocks)                           // 21: uplink bandwidth in RBs
-        .u32(22, static_cast<uint32_t>(serving_.cellIdentity))    // 22-25: 28-bit cell identity
+        .u32(22, static_cast<uint32_t>(serving.cellIdentity))     // 22-25: 28-bit cell identity
         .u16(26, static_cast<uint16_t>(kTAC))                     // 26-27: tracking area code
         .u32(28, static_cast<uint32_t>(carrier.band))             // 28-31: frequency band indicator
         .build();
 }
 
 Bytes LTEScenario::antennaRecord(uint64_t tick) const {
+    const LTECell& serving = cells_[serving_];
     return RecordBuilder::ordinary(LogCode::kLTEMasterInfoBlock, 22)
         .timestamp(timestampForTick(tick))
-        .u8(13, 1)             // 13: record version
-        .u16(14, serving_.pci)  // 14-15: physical cell identity
-        .u8(20, txAntennas_)   // 20: number of eNodeB transmit antennas (PBCH detection)
+        .u8(13, 1)                    // 13: record version
+        .u16(14, serving.pci)         // 14-15: physical cell identity
+        .u8(20, serving.txAntennas)   // 20: number of eNodeB transmit antennas (PBCH detection)
         .build();
 }
 
 Bytes LTEScenario::connectedMeasurementRecord(uint64_t tick, bool withPrefix) const {
-    std::vector<const LTECell*> measured;
-    std::vector<const LTECell*> detected;
-    for (const LTECell& c : neighbours_) {
-        if (c.present) (c.detectedOnly ? detected : measured).push_back(&c);
-    }
-    const size_t n = measured.size();
-    const size_t d = detected.size();
+    const LTECell& serving = cells_[serving_];
+    const size_t n = measured_.size();
+    const size_t d = detected_.size();
     // 23-24 and neighbour RSRP: (dBm + 140) x 4; 25-26 and neighbour RSRQ: (dB + 20) x 8.
-    auto rawRSRP = [](int32_t q) { return static_cast<uint16_t>(clampRaw(q + 560, 16)); };
-    auto rawRSRQ = [](int32_t q) { return static_cast<uint16_t>(clampRaw(2 * q + 160, 16)); };
-    const uint16_t subframe = static_cast<uint16_t>((tick * 500 + serving_.pci) % 10240);  // SFN x 10 + subframe
+    auto rawRSRP = [](int32_t quarter) { return static_cast<uint16_t>(clampRaw(quarter + 560, 16)); };
+    auto rawRSRQ = [](int32_t hundredths) { return static_cast<uint16_t>(clampRaw(2 * quarterDB(hundredths) + 160, 16)); };
+    const uint16_t subframe = static_cast<uint16_t>((tick * 500 + serving.pci) % 10240);  // SFN x 10 + subframe
     RecordBuilder b = RecordBuilder::ordinary(LogCode::kLTEIntraFreqMeasurement, 29 + 6 * n + 2 * d);
     b.timestamp(timestampForTick(tick))
         .u8(13, 1)                                          // 13: record version (the original layout)
-        .u16(17, kCarriers[serving_.carrier].earfcn)        // 17-18: EARFCN
-        .u16(19, serving_.pci)                              // 19-20: serving PCI
+        .u16(17, kCarriers[carrier_].earfcn)                // 17-18: EARFCN
+        .u16(19, serving.pci)                               // 19-20: serving PCI
         .u16(21, subframe)                                  // 21-22: subframe number
-        .u16(23, rawRSRP(serving_.rsrp))                    // 23-24: serving filtered RSRP
-        .u16(25, rawRSRQ(serving_.rsrq))                    // 25-26: serving filtered RSRQ
+        .u16(23, rawRSRP(shownFilteredRsrp(serving)))       // 23-24: serving filtered RSRP
+        .u16(25, rawRSRQ(serving.filteredRsrq))             // 25-26: serving filtered RSRQ
         .u8(27, static_cast<uint8_t>(n))                    // 27: measured neighbours
         .u8(28, static_cast<uint8_t>(d));                   // 28: detected cells
     for (size_t i = 0; i < n; ++i) {  // 6-byte entries from 29: PCI, filtered RSRP, filtered RSRQ
-        b.u16(29 + 6 * i, measured[i]->pci);
-        b.u16(31 + 6 * i, rawRSRP(measured[i]->rsrp));
-        b.u16(33 + 6 * i, rawRSRQ(measured[i]->rsrq));
+        const LTECell& c = cells_[measured_[i]];
+        b.u16(29 + 6 * i, c.pci);
+        b.u16(31 + 6 * i, rawRSRP(shownFilteredRsrp(c)));
+        b.u16(33 + 6 * i, rawRSRQ(c.filteredRsrq));
     }
-    for (size_t i = 0; i < d; ++i) b.u16(29 + 6 * n + 2 * i, detected[i]->pci);  // then 2-byte PCIs
+    for (size_t i = 0; i < d; ++i) b.u16(29 + 6 * n + 2 * i, cells_[detected_[i]].pci);  // then 2-byte PCIs
     return withPrefix ? b.buildWithPrefix() : b.build();
 }
 
 Bytes LTEScenario::servingMeasurementRecord(uint64_t tick) {
-    const Carrier& carrier = kCarriers[serving_.carrier];
-    const int32_t s = srxlev(serving_.rsrp);
+    const Carrier& carrier = kCarriers[carrier_];
+    const LTECell& serving = cells_[serving_];
+    const int32_t rsrp = quarterDB(serving.rsrp);
+    const int32_t averageRsrp = shownFilteredRsrp(serving);
+    const int32_t s = srxlev(averageRsrp);
     drxBelowZero_ = s < 0 ? std::min(drxBelowZero_ + 1, 63) : 0;
     const uint8_t rules = measurementRules();
     const bool rulesUpdated = rules != lastRules_;
     lastRules_ = rules;
 
     // 19: bits 0-8 PCI, 9-12 serving layer priority.
-    const uint32_t w19 = serving_.pci | (static_cast<uint32_t>(carrier.priority) << 9);
+    const uint32_t w19 = serving.pci | (static_cast<uint32_t>(carrier.priority) << 9);
     // 21: bits 0-8 RSRP, 9-17 average RSRP ((dBm + 140) x 4), 18-24 RSRQ, 25-31 average RSRQ ((dB + 30) x 4).
-    const uint32_t w21 = clampRaw(serving_.rsrp + 560, 9) | (clampRaw(avgRsrp_ + 560, 9) << 9) |
-                         (clampRaw(serving_.rsrq + 120, 7) << 18) | (clampRaw(avgRsrq_ + 120, 7) << 25);
+    const uint32_t w21 = clampRaw(rsrp + 560, 9) | (clampRaw(averageRsrp + 560, 9) << 9) |
+                         (clampRaw(quarterDB(serving.rsrq) + 120, 7) << 18) |
+                         (clampRaw(quarterDB(serving.filteredRsrq) + 120, 7) << 25);
     // 25: bits 0-8 RSSI ((dBm + 140) x 2), 9-14 Qrxlevmin ((dBm + 140) / 2), 15-21 P-Max (dBm + 30,
     // 64 absent), 22-27 UE maximum power (dBm + 30).
-    const uint32_t w25 = clampRaw(rssiHalfDB(serving_.rsrp, serving_.rsrq, carrier) + 280, 9) |
-                         (static_cast<uint32_t>((kQrxlevmin + 140) / 2) << 9) |
+    const uint32_t w25 = clampRaw(roundedDiv(rssi_, 50) + 280, 9) | (static_cast<uint32_t>((kQrxlevmin + 140) / 2) << 9) |
                          ((carrier.pMax ? 53u : 64u) << 15) | (kUEMaxPower << 22);
     // 29: bits 0-6 Srxlev (dB + 30), 7-12 DRX cycles with S < 0, 13-18 SIntraSearch, 19-24
     // SNonIntraSearch (2 dB steps, 32 absent), 25 rules updated, 26-29 measurement rules.
@@ -445,13 +609,10 @@ Bytes LTEScenario::servingMeasurementRecord(uint64_t tick) {
         .build();
 }
 
-Bytes LTEScenario::neighbourMeasurementRecord(uint64_t tick) {
-    std::vector<const LTECell*> cells;
-    for (const LTECell& c : neighbours_) {
-        if (c.present) cells.push_back(&c);
-    }
-    const size_t n = std::min<size_t>(cells.size(), 32);  // 1..32 (step() sends none without neighbours)
-    const Carrier& carrier = kCarriers[serving_.carrier];
+Bytes LTEScenario::neighbourMeasurementRecord(uint64_t tick) const {
+    const size_t n = std::min<size_t>(measured_.size(), 32);  // 1..32 (step() sends none without neighbours)
+    const Carrier& carrier = kCarriers[carrier_];
+    const uint32_t rssi = clampRaw(roundedDiv(rssi_, 50) + 280, 8);  // one wideband RSSI for every cell
     RecordBuilder b = RecordBuilder::ordinary(LogCode::kLTEIdleNeighbourMeasurements, 21 + 20 * n);
     b.timestamp(timestampForTick(tick));
     b.u8(13, 2);                   // 13: record version
@@ -459,20 +620,17 @@ Bytes LTEScenario::neighbourMeasurementRecord(uint64_t tick) {
     // 19-20: bits 0-5 Qrxlevmin ((dBm + 140) / 2), bits 6-10 neighbour count - 1.
     b.u16(19, static_cast<uint16_t>(((kQrxlevmin + 140) / 2) | ((n - 1) << 6)));
     for (size_t i = 0; i < n; ++i) {
-        const LTECell& c = *cells[i];
+        const LTECell& c = cells_[measured_[i]];
         const size_t e = 21 + 20 * i;  // 20-byte entries from 21; levels in half dB
-        const int32_t rsrpHalf = c.rsrp / 2;
-        const int32_t avgHalf = rsrpHalf + uniform(-2, 2);
-        const int32_t rsrqQuarter = c.rsrq;
-        const int32_t avgRsrq = rsrqQuarter + uniform(-2, 2);
+        const int32_t rsrpHalf = roundedDiv(c.rsrp, 50);
+        const int32_t averageHalf = shownFilteredRsrp(c) / 2;
         // +0: bits 0-8 PCI, 9-16 RSSI, 17-25 RSRP ((dBm + 140) x 2).
-        b.u32(e, c.pci | (clampRaw(rssiHalfDB(c.rsrp, c.rsrq, carrier) + 280, 8) << 9) |
-                     (clampRaw(rsrpHalf + 280, 9) << 17));
+        b.u32(e, c.pci | (rssi << 9) | (clampRaw(rsrpHalf + 280, 9) << 17));
         // +4: bits 0-8 average RSRP, 9-15 RSRQ, 16-22 average RSRQ ((dB + 30) x 4), 23-29 Srxlev (dB + 30).
-        b.u32(e + 4, clampRaw(avgHalf + 280, 9) | (clampRaw(rsrqQuarter + 120, 7) << 9) |
-                         (clampRaw(avgRsrq + 120, 7) << 16) | (clampRaw(srxlev(c.rsrp) + 30, 7) << 23));
-        int32_t offsetHz = uniform(0, 300);
-        b.u16(e + 8, static_cast<uint16_t>(offsetHz));  // +8: frequency offset, Hz
+        b.u32(e + 4, clampRaw(averageHalf + 280, 9) | (clampRaw(quarterDB(c.rsrq) + 120, 7) << 9) |
+                         (clampRaw(quarterDB(c.filteredRsrq) + 120, 7) << 16) |
+                         (clampRaw(srxlev(2 * averageHalf) + 30, 7) << 23));
+        b.u16(e + 8, c.frequencyOffset);  // +8: frequency offset, Hz
         // +12 antenna 0, +16 antenna 1: bits 0-10 frame offset (subframe of the cell's frame
         // start), 11-29 sample offset within it at 30.72 MHz.
         const uint32_t t0 = static_cast<uint32_t>(c.timing);
@@ -498,8 +656,8 @@ Bytes LTEScenario::reselectionCandidatesRecord(uint64_t tick) const {
     RecordBuilder b = RecordBuilder::ordinary(LogCode::kLTEReselectionCandidates, 21 + 4 * n + 4);
     b.timestamp(timestampForTick(tick));
     b.u8(13, 1);                                          // 13: record version
-    b.u16(15, kCarriers[serving_.carrier].earfcn);        // 15-16: serving EARFCN
-    b.u16(17, serving_.pci);                              // 17-18: serving cell (PCI)
+    b.u16(15, kCarriers[carrier_].earfcn);                // 15-16: serving EARFCN
+    b.u16(17, cells_[serving_].pci);                      // 17-18: serving cell (PCI)
     b.u16(19, static_cast<uint16_t>(n));                  // 19-20: candidate count
     for (size_t i = 0; i < n; ++i) {
         b.u16(21 + 4 * i, list[i]->priority);
@@ -521,50 +679,45 @@ Bytes LTEScenario::reselectionCandidatesRecord(uint64_t tick) const {
 }
 
 Bytes LTEScenario::cellMonitorRecord(bool binary) const {
+    const LTECell& s = cells_[serving_];
     auto cells = Array::create();
     auto serving = monitorCell(kTSCellMonitorRadioAccessTechnologyLTE, kTSCellMonitorCellTypeServing);
     serving->set(kTSCellMonitorMCC, Value::integer(kMCC));
     serving->set(kTSCellMonitorMNC, Value::integer(kMNC));
     serving->set(kTSCellMonitorTAC, Value::integer(kTAC));
-    serving->set(kTSCellMonitorCellId, Value::integer(serving_.cellIdentity));
-    serving->set(kTSCellMonitorPID, Value::integer(serving_.pci));
-    serving->set(kTSCellMonitorBandInfo, Value::integer(kCarriers[serving_.carrier].band));
-    serving->set(kTSCellMonitorUARFCN, Value::integer(kCarriers[serving_.carrier].earfcn));
+    serving->set(kTSCellMonitorCellId, Value::integer(s.cellIdentity));
+    serving->set(kTSCellMonitorPID, Value::integer(s.pci));
+    serving->set(kTSCellMonitorBandInfo, Value::integer(kCarriers[carrier_].band));
+    serving->set(kTSCellMonitorUARFCN, Value::integer(kCarriers[carrier_].earfcn));
     cells->append(Value(serving));
 
     // The three strongest measured neighbours.
-    std::vector<const LTECell*> strongest;
-    for (const LTECell& c : neighbours_) {
-        if (c.present && !c.detectedOnly) strongest.push_back(&c);
-    }
-    std::stable_sort(strongest.begin(), strongest.end(),
-                     [](const LTECell* a, const LTECell* b) { return a->rsrp > b->rsrp; });
-    if (strongest.size() > 3) strongest.resize(3);
-    for (const LTECell* c : strongest) {
+    for (size_t i = 0; i < measured_.size() && i < 3; ++i) {
         auto n = monitorCell(kTSCellMonitorRadioAccessTechnologyLTE, kTSCellMonitorCellTypeNeighbor);
-        n->set(kTSCellMonitorPID, Value::integer(c->pci));
-        n->set(kTSCellMonitorUARFCN, Value::integer(kCarriers[c->carrier].earfcn));
+        n->set(kTSCellMonitorPID, Value::integer(cells_[measured_[i]].pci));
+        n->set(kTSCellMonitorUARFCN, Value::integer(kCarriers[carrier_].earfcn));
         cells->append(Value(n));
     }
     return RecordBuilder::extraPropertyList(LogCode::kCellMonitor, Value(cells), binary);
 }
 
-
 Bytes LTEScenario::malformedRecord(uint64_t tick) const {
+    const uint16_t pci = cells_[serving_].pci;
+    const uint16_t earfcn = kCarriers[carrier_].earfcn;
     switch ((tick / kMalformedPeriod) % 3) {
     case 0:
         // A connected-mode measurement cut after the serving RSRP: 24 bytes, below its 29-byte minimum.
         return RecordBuilder::ordinary(LogCode::kLTEIntraFreqMeasurement, 24)
             .timestamp(timestampForTick(tick))
-            .u16(17, kCarriers[serving_.carrier].earfcn)
-            .u16(19, serving_.pci)
+            .u16(17, earfcn)
+            .u16(19, pci)
             .build();
     case 1:
         // A serving-cell record with record type 2, neither ordinary (1) nor extra (255).
         return RecordBuilder(2, LogCode::kLTEServingCellInfo, 38)
             .timestamp(timestampForTick(tick))
-            .u16(14, serving_.pci)
-            .u16(16, kCarriers[serving_.carrier].earfcn)
+            .u16(14, pci)
+            .u16(16, earfcn)
             .build();
     default: {
         // A cell-monitor extra whose XML property list was cut off in transfer.
