@@ -1,5 +1,6 @@
-// Tests the live-modem path against the fake DIAG modem on a pseudo-terminal: the handshake and log mask, faults a modem or a wrong port shows, unplugging, a move to another technology, and the programs end to end.
+// Tests the live-modem path against the fake DIAG modem on a pseudo-terminal: the handshake and log mask, faults a modem or a wrong port shows, unplugging, a move to another technology, session after session with measurements, and the programs end to end.
 #include "Model/ApplicationObject.h"
+#include "Model/DisplayPath.h"
 #include "Model/VantorelModel.h"
 #include "Monitor/MonitorLauncher.h"
 #include "Platform/TelephonyIdentifiers.h"
@@ -18,6 +19,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <functional>
 #include <set>
 
@@ -387,6 +389,55 @@ TEST(LiveModemPrograms, AMonitorWithItsOwnServiceLeavesTheModemQuietWhenItEnds) 
     EXPECT_TRUE(fake.says("logging off", 3000)) << fake.said;
     // The modem may still be reading the last request when the host has gone.
     EXPECT_TRUE(waitUntil([&] { return lastRequests(requests, 3) == kClearingLines; }, 3000)) << lastRequests(requests, 3);
+}
+
+// The fake modem program's terminal, from the first line it prints.
+QString terminalOf(Program& fake) {
+    if (!fake.process.waitForReadyRead(5000)) return {};
+    return QString::fromUtf8(fake.process.readLine()).trimmed();
+}
+
+// Session after session on the LTE modem, each a monitor started afresh as a user does: each
+// must show measurements, not only the serving cell. The monitor's start command reaches the
+// service at any moment of the service's own handshake with the modem, and must always end
+// up in the modem's mask.
+TEST(LiveModemPrograms, EverySessionOnTheLteModemShowsMeasurements) {
+    constexpr int kSessions = 12;
+    testing::FastMonitorClock::installed();
+    Program fake(VANTOREL_FAKEDIAG_PROGRAM, {"--emulate", "lte"});
+    const QString terminal = terminalOf(fake);
+    ASSERT_TRUE(terminal.startsWith("/dev/pts/")) << terminal.toStdString();
+    // The serving cell's RSRP, idle or connected (the emulated radio goes on between sessions).
+    const std::vector<std::string> rsrp = {"/Serving Cell/Serving Cell Measurements/Measured RSRP",
+                                           "/Serving Cell/Connected mode LTE Intra-frequency Measurement/Serving Filtered RSRP"};
+    int measured = 0;
+    std::string failures;
+    for (int session = 0; session < kSessions; ++session) {
+        CountingApplication app;
+        std::string error;
+        {
+            MonitorLauncher launcher;
+            MonitorLauncher::Source source;
+            source.device = terminal.toStdString();
+            ASSERT_TRUE(launcher.start(source, &app, &error)) << error;
+            VantorelModel& model = *launcher.model();
+            if (waitUntil(
+                    [&] {
+                        return std::any_of(rsrp.begin(), rsrp.end(), [&](const std::string& path) {
+                            const std::string* text = DisplayPath::leafText(path, model.pathIndex());
+                            return text && *text != "-";
+                        });
+                    },
+                    8000))
+                ++measured;
+            else
+                failures += " " + std::to_string(session);
+        }
+        // The next session starts on a quiet modem, as after Ctrl-C.
+        ASSERT_TRUE(fake.says("logging off", 5000)) << fake.said;
+        fake.said.clear();
+    }
+    EXPECT_EQ(measured, kSessions) << "sessions without a measured RSRP:" << failures;
 }
 
 }  // namespace
