@@ -47,6 +47,7 @@ bool VantorelModel::createPorts() {
                     }).release());
     if (_recvPort) _recvPort->setInvalidationCallback([this](LocalMessagePort* port) { invalidationCallback(port); });
 
+    if (serviceResolver_) serviceName_ = serviceResolver_();
     serverConnection_ = TelephonyServiceConnection::open(
         [this](const std::string& n, const Value& info) { serviceNotificationCallback(n, info); }, serviceName_);
     if (!serverConnection_) {

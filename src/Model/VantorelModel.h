@@ -9,6 +9,7 @@
 #include <QObject>
 
 #include <chrono>
+#include <functional>
 #include <memory>
 #include <string>
 
@@ -35,6 +36,9 @@ public:
     explicit VantorelModel(ApplicationObject* application, std::string serviceName = defaultServiceName());
     ~VantorelModel() override;
     static std::string defaultServiceName();
+    // Asked for the service's port name before each connection attempt (a monitor that joined
+    // another's service takes the device over when that one ends); unset: the name given.
+    void setServiceResolver(std::function<std::string()> resolver) { serviceResolver_ = std::move(resolver); }
 
     // The channel: a receive port of our own, a send port the service gives us.
     bool isConnected() const { return _recvPort && _sendPort; }
@@ -108,6 +112,7 @@ private:
     std::unique_ptr<TelephonyServiceConnection> serverConnection_;
     ApplicationObject* application_;
     std::string serviceName_;
+    std::function<std::string()> serviceResolver_;
     std::string receivePortName_;
     uint64_t messagesDecoded_ = 0;
 

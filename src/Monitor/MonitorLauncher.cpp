@@ -2,17 +2,39 @@
 #include "Monitor/MonitorLauncher.h"
 
 #include "Model/VantorelModel.h"
+#include "Platform/RemoteMessagePort.h"
+#include "Platform/StringFormat.h"
+#include "Platform/SystemLog.h"
 #include "Platform/TechnologyNames.h"
+#include "TelephonyService/Device/DeviceLock.h"
 #include "TelephonyService/EmulatorBackend.h"
 #include "TelephonyService/Replay/CaptureReader.h"
 
 #include <QCommandLineParser>
+#include <QElapsedTimer>
 #include <QFileInfo>
 #include <QMetaObject>
+#include <QThread>
 
 #include <unistd.h>
 
 namespace vantorel {
+
+namespace {
+
+// Whether a service listens on `port`, waiting up to timeoutMs for one that is still starting.
+bool serviceAnswers(const std::string& port, int timeoutMs) {
+    if (port.empty()) return false;
+    QElapsedTimer waited;
+    waited.start();
+    for (;;) {
+        if (RemoteMessagePort::lookup(port, 250)) return true;
+        if (waited.hasExpired(timeoutMs)) return false;
+        QThread::msleep(50);
+    }
+}
+
+}  // namespace
 
 void MonitorLauncher::addOptions(QCommandLineParser& parser) {
     const QString techs = QString::fromStdString(TechnologyNames::listing());
@@ -87,25 +109,56 @@ MonitorLauncher::~MonitorLauncher() {
     if (service_) service_->stop();
 }
 
+bool MonitorLauncher::startService(const Source& source, std::string* error) {
+    TelephonyServiceOptions options;
+    options.portName = "vantorel.embedded." + std::to_string(getpid());
+    options.emulate = source.emulate;
+    options.replay = source.replay;
+    options.device = source.device;
+    options.technology = source.technology;
+    options.speed = source.speed;
+    options.loop = source.loop;
+    service_ = std::make_unique<TelephonyServiceThread>(options);
+    if (service_->start(error)) return true;
+    service_.reset();
+    return false;
+}
+
+std::optional<std::string> MonitorLauncher::deviceService(const Source& source, std::string* error) {
+    // The device's service may be another monitor's: join it rather than take the port from
+    // under it. Tried again when another monitor took the device meanwhile.
+    for (int attempt = 0;; ++attempt) {
+        if (const std::optional<DeviceLock::Holder> holder = DeviceLock::holder(source.device)) {
+            if (!serviceAnswers(holder->servicePort, kJoinWaitMs)) {
+                *error = StringFormat::format("%s is in use by %s (pid %d), whose service does not answer",
+                                              source.device.c_str(), holder->program.c_str(), int(holder->pid));
+                return std::nullopt;
+            }
+            description_ = StringFormat::format("device %s, with the service of %s (pid %d)", source.device.c_str(),
+                                                holder->program.c_str(), int(holder->pid));
+            return holder->servicePort;
+        }
+        if (startService(source, error)) {
+            description_ = "device " + source.device;
+            return service_->portName();
+        }
+        if (attempt >= 2 || !DeviceLock::holder(source.device)) return std::nullopt;
+    }
+}
+
 bool MonitorLauncher::start(const Source& source, ApplicationObject* application, std::string* error) {
     std::string serviceName = source.service;
-    if (source.service.empty()) {
-        TelephonyServiceOptions options;
-        options.portName = "vantorel.embedded." + std::to_string(getpid());
-        options.emulate = source.emulate;
-        options.replay = source.replay;
-        options.device = source.device;
-        options.technology = source.technology;
-        options.speed = source.speed;
-        options.loop = source.loop;
-        service_ = std::make_unique<TelephonyServiceThread>(options);
-        if (!service_->start(error)) return false;
+    if (!source.device.empty()) {
+        const std::optional<std::string> name = deviceService(source, error);
+        if (!name) return false;
+        serviceName = *name;
+    } else if (source.service.empty()) {
+        if (!startService(source, error)) return false;
         serviceName = service_->portName();
         const auto emulated = TechnologyNames::identifierFor(source.emulate);
-        description_ = !source.replay.empty()   ? "replay of " + source.replay
-                       : !source.device.empty() ? "device " + source.device
-                                                : "emulator (" + (emulated ? TechnologyNames::displayName(*emulated)
-                                                                         : source.emulate) + ")";
+        description_ = !source.replay.empty() ? "replay of " + source.replay
+                                              : "emulator (" + (emulated ? TechnologyNames::displayName(*emulated)
+                                                                       : source.emulate) + ")";
     } else {
         description_ = "service " + source.service;
     }
@@ -123,6 +176,22 @@ bool MonitorLauncher::start(const Source& source, ApplicationObject* application
                          false, true);
     else
         model->setSource("service " + source.service, false, false);
+    if (!source.device.empty() && !service_) {
+        // Joined: when the holder ends, its service goes; the next connection attempt takes
+        // the device over (or joins whoever took it first).
+        model->setServiceResolver([this, source, joined = serviceName] {
+            if (service_) return service_->portName();
+            std::string why;
+            const std::optional<std::string> name = deviceService(source, &why);
+            if (!name) {
+                SystemLog::log(SystemLog::kError, "Device %s: %s", source.device.c_str(), why.c_str());
+                return joined;
+            }
+            if (service_) SystemLog::log(SystemLog::kNotice, "Device %s: the service that held it ended; this monitor "
+                                         "runs the device's service now", source.device.c_str());
+            return *name;
+        });
+    }
     QMetaObject::invokeMethod(model, [model] { model->restartMonitor(); }, Qt::QueuedConnection);
     return true;
 }

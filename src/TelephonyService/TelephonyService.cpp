@@ -13,12 +13,14 @@
 #include "PropertyList/Dictionary.h"
 #include "PropertyList/PropertyListSerialization.h"
 #include "TelephonyService/Device/DeviceBackend.h"
+#include "TelephonyService/Device/DeviceLock.h"
 #include "TelephonyService/EmulatorBackend.h"
 #include "TelephonyService/ReplayBackend.h"
 #include "TelephonyService/Replay/CaptureWriter.h"
 
 #include <QCoreApplication>
 #include <QFileInfo>
+#include <QScopeGuard>
 
 #include <sys/stat.h>
 
@@ -134,6 +136,19 @@ bool TelephonyService::start(std::string* error) {
         }
     }
 
+    // One service per modem: a second one would take this one's replies and clear its mask.
+    if (!options_.device.empty() && !options_.backendFactory && !deviceLock_) {
+        std::optional<DeviceLock::Holder> holder;
+        std::string why;
+        deviceLock_ = DeviceLock::acquire(options_.device, portName_, &holder, &why);
+        if (!deviceLock_) {
+            if (holder) why = DeviceLock::describe(options_.device, *holder);
+            if (error) *error = why;
+            return false;
+        }
+    }
+    // Whatever fails from here lets the device go again.
+    auto releaseDevice = qScopeGuard([this] { deviceLock_.reset(); });
     if (!backend_) {
         backend_ = createBackend(options_, error);
         if (!backend_) return false;
@@ -208,6 +223,7 @@ bool TelephonyService::start(std::string* error) {
             return false;
         }
     }
+    releaseDevice.dismiss();
     return true;
 }
 
@@ -236,6 +252,8 @@ void TelephonyService::stop() {
         recorder_->flush();
         recorder_.reset();
     }
+    // Only once the modem has been left quiet: a monitor that starts next may open it at once.
+    deviceLock_.reset();
 }
 
 TelephonyService::Counters TelephonyService::counters() const {

@@ -24,6 +24,7 @@
 namespace vantorel {
 
 class CaptureWriter;
+class DeviceLock;
 class LocalMessagePort;
 class RemoteMessagePort;
 
@@ -128,7 +129,9 @@ public:
     static std::unique_ptr<ModemBackend> createBackend(const TelephonyServiceOptions& options, std::string* error);
 
     // Builds the backend and the recorder and listens on the well-known port; false with
-    // *error set when any of it fails (then nothing is left open).
+    // *error set when any of it fails (then nothing is left open). A --device service first
+    // takes the device's DeviceLock, naming its port there, and holds it until stop(): with
+    // another service on that device, start() fails naming it.
     bool start(std::string* error);
     // Closes every channel and the port, stops the backend, flushes the recording.
     void stop();
@@ -190,6 +193,7 @@ private:
 
     TelephonyServiceOptions options_;
     std::string portName_;
+    std::unique_ptr<DeviceLock> deviceLock_;  // declared before the backend: released after it
     std::unique_ptr<ModemBackend> backend_;
     std::unique_ptr<CaptureWriter> recorder_;
     std::unique_ptr<LocalMessagePort> port_;

@@ -1,5 +1,6 @@
-// Tests the live-modem path against the fake DIAG modem on a pseudo-terminal: the handshake and log mask, faults a modem or a wrong port shows, unplugging, a move to another technology, and the programs end to end.
+// Tests the live-modem path against the fake DIAG modem on a pseudo-terminal: the handshake and log mask, faults a modem or a wrong port shows, unplugging, a move to another technology, session after session with measurements, one service per modem, and the programs end to end.
 #include "Model/ApplicationObject.h"
+#include "Model/DisplayPath.h"
 #include "Model/VantorelModel.h"
 #include "Monitor/MonitorLauncher.h"
 #include "Platform/TelephonyIdentifiers.h"
@@ -18,6 +19,7 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <functional>
 #include <set>
 
@@ -387,6 +389,124 @@ TEST(LiveModemPrograms, AMonitorWithItsOwnServiceLeavesTheModemQuietWhenItEnds) 
     EXPECT_TRUE(fake.says("logging off", 3000)) << fake.said;
     // The modem may still be reading the last request when the host has gone.
     EXPECT_TRUE(waitUntil([&] { return lastRequests(requests, 3) == kClearingLines; }, 3000)) << lastRequests(requests, 3);
+}
+
+// The fake modem program's terminal, from the first line it prints.
+QString terminalOf(Program& fake) {
+    if (!fake.process.waitForReadyRead(5000)) return {};
+    return QString::fromUtf8(fake.process.readLine()).trimmed();
+}
+
+// Session after session on the LTE modem, each a monitor started afresh as a user does: each
+// must show measurements, not only the serving cell. The monitor's start command reaches the
+// service at any moment of the service's own handshake with the modem, and must always end
+// up in the modem's mask.
+TEST(LiveModemPrograms, EverySessionOnTheLteModemShowsMeasurements) {
+    constexpr int kSessions = 12;
+    testing::FastMonitorClock::installed();
+    Program fake(VANTOREL_FAKEDIAG_PROGRAM, {"--emulate", "lte"});
+    const QString terminal = terminalOf(fake);
+    ASSERT_TRUE(terminal.startsWith("/dev/pts/")) << terminal.toStdString();
+    // The serving cell's RSRP, idle or connected (the emulated radio goes on between sessions).
+    const std::vector<std::string> rsrp = {"/Serving Cell/Serving Cell Measurements/Measured RSRP",
+                                           "/Serving Cell/Connected mode LTE Intra-frequency Measurement/Serving Filtered RSRP"};
+    int measured = 0;
+    std::string failures;
+    for (int session = 0; session < kSessions; ++session) {
+        CountingApplication app;
+        std::string error;
+        {
+            MonitorLauncher launcher;
+            MonitorLauncher::Source source;
+            source.device = terminal.toStdString();
+            ASSERT_TRUE(launcher.start(source, &app, &error)) << error;
+            VantorelModel& model = *launcher.model();
+            if (waitUntil(
+                    [&] {
+                        return std::any_of(rsrp.begin(), rsrp.end(), [&](const std::string& path) {
+                            const std::string* text = DisplayPath::leafText(path, model.pathIndex());
+                            return text && *text != "-";
+                        });
+                    },
+                    8000))
+                ++measured;
+            else
+                failures += " " + std::to_string(session);
+        }
+        // The next session starts on a quiet modem, as after Ctrl-C.
+        ASSERT_TRUE(fake.says("logging off", 5000)) << fake.said;
+        fake.said.clear();
+    }
+    EXPECT_EQ(measured, kSessions) << "sessions without a measured RSRP:" << failures;
+}
+
+// A modem has one service: a second monitor on the same device joins the first one's service
+// as a client, and the first never notices it come or go; the service alone is refused with
+// the holder named.
+TEST(LiveModemPrograms, ASecondProgramOnAHeldDeviceJoinsItsServiceOrIsRefusedNamingTheHolder) {
+    QTemporaryDir dir;
+    const QString requests = dir.filePath("requests");
+    Program fake(VANTOREL_FAKEDIAG_PROGRAM, {"--emulate", "lte", "--requests", requests});
+    const QString terminal = terminalOf(fake);
+    ASSERT_TRUE(terminal.startsWith("/dev/pts/")) << terminal.toStdString();
+    Program first(VANTOREL_CLI_PROGRAM, {"watch", "--device", terminal});
+    ASSERT_TRUE(fake.says("logging on", 10000)) << fake.said;
+    const std::string holder = "vantorel-cli (pid " + std::to_string(first.process.processId()) + ")";
+    // Another name of the same terminal is the same device.
+    const QString link = dir.filePath("modem");
+    ASSERT_TRUE(QFile::link(terminal, link));
+
+    struct Row {
+        const char* what;
+        const char* program;
+        QStringList args;
+        std::string says;  // on its standard error
+        bool joins;        // else it ends at once, refused
+    };
+    const std::vector<Row> rows = {
+        {"the terminal view, through a link",
+         VANTOREL_CLI_PROGRAM,
+         {"watch", "--device", link},
+         "device " + link.toStdString() + ", with the service of " + holder,
+         true},
+        {"the service alone",
+         VANTOREL_TELEPHONYD_PROGRAM,
+         {"--device", terminal, "--port", QString::fromStdString(testing::uniquePortName("second"))},
+         terminal.toStdString() + " is in use by " + holder + ", whose service listens on port vantorel.embedded.",
+         false},
+    };
+    for (const Row& row : rows) {
+        SCOPED_TRACE(row.what);
+        Program second(row.program, row.args);
+        ASSERT_TRUE(second.says(row.says, 10000)) << second.said;
+        if (row.joins) {
+            std::string shown;
+            EXPECT_TRUE(waitUntil(
+                [&] {
+                    shown += second.process.readAllStandardOutput().toStdString();
+                    return shown.find("Measured RSRP") != std::string::npos;
+                },
+                10000))
+                << "the second monitor shows the modem's records";
+            second.terminate();
+        } else {
+            EXPECT_TRUE(second.process.waitForFinished(5000));
+            EXPECT_NE(second.process.exitCode(), 0);
+        }
+        first.process.readAllStandardOutput();
+        std::string shown;
+        EXPECT_TRUE(waitUntil(
+            [&] {
+                shown += first.process.readAllStandardOutput().toStdString();
+                return shown.find("Measured RSRP") != std::string::npos;
+            },
+            6000))
+            << "the first monitor goes on showing records";
+    }
+    EXPECT_EQ(fake.said.find("logging off"), std::string::npos) << fake.said;
+    QFile sent(requests);
+    ASSERT_TRUE(sent.open(QIODevice::ReadOnly));
+    EXPECT_EQ(QString::fromUtf8(sent.readAll()).split('\n').count("60 00"), 1) << "one handshake, no clearing under the first";
 }
 
 }  // namespace

@@ -112,8 +112,7 @@ void DiagSession::open(std::optional<std::set<uint16_t>> codes) {
     sawGoodFrame_ = false;
     enabled_.clear();
     all_ = false;
-    equipmentsOn_.clear();
-    applied_.clear();
+    requested_.clear();
     refusals_.clear();
     counts_.reset();
     buildId_.clear();
@@ -155,19 +154,28 @@ void DiagSession::open(std::optional<std::set<uint16_t>> codes) {
             return fail(StringFormat::format("%s did not say how many log items it has (%s)", portName().c_str(),
                                              !reply ? "no reply" : !error.empty() ? error.c_str() : "a bad reply"));
         applyCodes();
-        // Ready once the last set-mask has its reply (sent after those applyCodes queued).
-        send(DiagCommand::version(), [this](const Reply&) {
-            if (!opening_) return;
-            opening_ = false;
-            ready_ = true;
-            emit ready();
-        });
+        finishOpen();
+    });
+}
+
+void DiagSession::finishOpen() {
+    // A version request after the set-masks: its reply comes after theirs. Codes changed
+    // meanwhile (a client's start command during the handshake) queued more set-masks behind
+    // it: ready waits for those too, so the handshake ends with the mask the clients want.
+    send(DiagCommand::version(), [this](const Reply&) {
+        if (!opening_) return;
+        if (!queue_.empty()) return finishOpen();
+        opening_ = false;
+        ready_ = true;
+        emit ready();
     });
 }
 
 void DiagSession::setCodes(std::optional<std::set<uint16_t>> codes) {
     wanted_ = std::move(codes);
-    if (ready_) applyCodes();
+    // Before the item counts the open sequence plans from wanted_ itself; once they are known
+    // (opening or ready) the change is queued now, never left for a later event.
+    if ((opening_ || ready_) && !clearing_) applyCodes();
 }
 
 void DiagSession::applyCodes() {
@@ -198,9 +206,10 @@ void DiagSession::applyCodes() {
                            refused.back().why.c_str());
         }
     }
-    // An equipment enabled before and wanted no more gets an empty mask.
-    for (uint32_t equipment : equipmentsOn_)
-        if (!requests.count(equipment)) requests[equipment] = DiagCommand::setMask(equipment, counts[equipment], {});
+    // An equipment enabled before (or asked to be) and wanted no more gets an empty mask.
+    for (const auto& entry : requested_)
+        if (entry.second.on && !requests.count(entry.first))
+            requests[entry.first] = DiagCommand::setMask(entry.first, counts[entry.first], {});
 
     // Refusals of codes still wanted are kept; the new plan's are added.
     std::erase_if(refusals_, [&](const Refusal& r) { return !wanted_ || !wanted_->count(r.code); });
@@ -213,9 +222,12 @@ void DiagSession::applyCodes() {
         // Named variables: clang 14 (the fuzz build) cannot capture structured bindings in a lambda.
         const uint32_t equipment = entry.first;
         const Bytes& request = entry.second;
-        // The modem has this mask already.
-        if (const auto it = applied_.find(equipment); it != applied_.end() && it->second == request) continue;
+        // The modem has this mask already, or will have once what is queued is answered. Compared
+        // with the last mask queued, not the last accepted: a change back while another is in
+        // flight must still be sent.
+        if (const auto it = requested_.find(equipment); it != requested_.end() && it->second.request == request) continue;
         const std::set<uint16_t> codes = codesOf[equipment];
+        requested_[equipment] = {request, all || !codes.empty()};
         send(request, [this, equipment, codes, all, request](const Reply& reply) {
             std::string why;
             if (!reply)
@@ -225,17 +237,14 @@ void DiagSession::applyCodes() {
             else if (const auto status = DiagCommand::logConfigStatus(*reply); status != 0u)
                 why = status ? StringFormat::format("status %u", *status) : std::string("a short reply");
             std::erase_if(enabled_, [&](uint16_t c) { return DiagLogItem::of(c).equipment == equipment; });
-            applied_.erase(equipment);
             if (why.empty()) {
-                applied_[equipment] = request;
-                if (codes.empty() && !all)
-                    equipmentsOn_.erase(equipment);
-                else
-                    equipmentsOn_.insert(equipment);
                 enabled_.insert(codes.begin(), codes.end());
                 if (all) all_ = true;
                 return;
             }
+            // Asked again at the next change, and emptied when no longer wanted.
+            if (const auto it = requested_.find(equipment); it != requested_.end() && it->second.request == request)
+                it->second = {Bytes{}, true};
             SystemLog::log(SystemLog::kWarning, "Device %s: the modem refused the log mask of equipment 0x%X (%s)",
                            portName().c_str(), equipment, why.c_str());
             for (uint16_t code : codes)
@@ -253,8 +262,8 @@ void DiagSession::clear(int timeoutMs, std::function<void(bool answered)> done) 
     replyTimer_.stop();
     enabled_.clear();
     all_ = false;
-    equipmentsOn_.clear();
-    applied_.clear();
+    requested_.clear();
+    counts_.reset();
     if (clearing_) endClear(false);  // an older clear gives way
     clearing_ = std::move(done);
     clearAnswers_ = 0;

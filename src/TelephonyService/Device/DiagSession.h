@@ -32,6 +32,11 @@ class DiagPort;
 // equipment with a wanted code, each reply checked for opcode, op and status 0. A modem that
 // does not answer the first request is not a DIAG port; the session then fails at once.
 //
+// The modem's mask always ends as the last codes given: a setCodes() at any point of the open
+// sequence, or while an earlier change is still in flight, is planned against the last mask
+// queued for each equipment (requests are answered in order), and ready() comes only once the
+// set-masks of every change so far have their replies.
+//
 // Log packets of enabled codes come out as records (type 1 and the DLF record, as the replay
 // of a QMDL file gives them); the rest is counted and dropped.
 class DiagSession : public QObject {
@@ -60,7 +65,8 @@ public:
     // Runs the open sequence, enabling `codes` (all: every item the modem has); ends with
     // ready() or failed().
     void open(std::optional<std::set<uint16_t>> codes);
-    // Changes the enabled codes; sent at once when ready, else used by the open sequence.
+    // Changes the enabled codes: the set-masks are queued at once once the item counts are
+    // known (before that, the open sequence plans from these codes).
     void setCodes(std::optional<std::set<uint16_t>> codes);
     // Cancels what is in flight and sends the clearing sequence (60 00, 73 op 0, 7D 05);
     // `done` runs once, from the event loop, when the last request has its reply, or after
@@ -98,8 +104,10 @@ private:
     void onFrame(ByteView body);
     void fail(const std::string& why);
     void endClear(bool answered);
-    // Sends the set-mask requests that take the modem from the enabled codes to the wanted ones.
+    // Queues the set-mask requests that take the modem from the last mask queued to the wanted one.
     void applyCodes();
+    // The last step of the open sequence: ready once nothing is queued behind it.
+    void finishOpen();
     std::string portName() const;
 
     DiagPort* port_;
@@ -112,8 +120,13 @@ private:
     std::optional<std::set<uint16_t>> wanted_;  // empty: all
     std::set<uint16_t> enabled_;
     bool all_ = false;
-    std::set<uint32_t> equipmentsOn_;  // equipments whose mask has a bit set
-    std::map<uint32_t, Bytes> applied_;  // equipment -> the set-mask request the modem accepted last
+    // Per equipment, the last set-mask queued (or accepted), and whether it sets a bit; a refused
+    // one is forgotten (an empty request, taken as on), so that it is asked again.
+    struct Requested {
+        Bytes request;
+        bool on = false;
+    };
+    std::map<uint32_t, Requested> requested_;
     std::optional<DiagCommand::ItemCounts> counts_;
     std::vector<Refusal> refusals_;
     std::string buildId_;
