@@ -1,11 +1,11 @@
 // DeviceLock: the per-device lock file (flock) with the holder's pid, program and service port.
 #include "TelephonyService/Device/DeviceLock.h"
 
+#include "Platform/PortDirectory.h"
 #include "Platform/StringFormat.h"
 #include "TelephonyService/Device/TcpDiagPort.h"
 
 #include <QByteArray>
-#include <QDir>
 #include <QFileInfo>
 #include <QThread>
 #include <QUrl>
@@ -26,32 +26,6 @@ namespace {
 // How long a holder may take between taking the lock and writing its name.
 constexpr int kHolderWriteWaitMs = 1000;
 constexpr int kRetryStepMs = 20;
-
-// A private directory of ours: made 0700 when missing; refused when it is a link or not ours.
-bool ensureDirectory(const std::string& path, std::string* error) {
-    if (::mkdir(path.c_str(), 0700) != 0 && errno != EEXIST) {
-        *error = StringFormat::format("cannot make %s: %s", path.c_str(), std::strerror(errno));
-        return false;
-    }
-    struct stat st {};
-    if (::lstat(path.c_str(), &st) != 0 || !S_ISDIR(st.st_mode) || st.st_uid != ::geteuid()) {
-        *error = path + ": not a directory of this user (left as it is)";
-        return false;
-    }
-    return true;
-}
-
-std::string lockDirectory(std::string* error) {
-    const char* runtime = std::getenv("XDG_RUNTIME_DIR");
-    struct stat st {};
-    if (runtime && *runtime == '/' && ::stat(runtime, &st) == 0 && S_ISDIR(st.st_mode) && st.st_uid == ::geteuid()) {
-        const std::string dir = std::string(runtime) + "/vantorel";
-        if (ensureDirectory(dir, error)) return dir;
-        return {};
-    }
-    const std::string dir = QDir::tempPath().toStdString() + "/vantorel-" + std::to_string(::geteuid());
-    return ensureDirectory(dir, error) ? dir : std::string();
-}
 
 std::string keyOf(const std::string& device) {
     std::string key = device;
@@ -98,7 +72,7 @@ std::optional<DeviceLock::Holder> heldBy(int fd, const std::string& path) {
 }  // namespace
 
 std::string DeviceLock::lockPathFor(const std::string& device, std::string* error) {
-    const std::string dir = lockDirectory(error);
+    const std::string dir = PortDirectory::path(error);
     return dir.empty() ? std::string() : dir + "/device-" + keyOf(device) + ".lock";
 }
 
