@@ -54,7 +54,13 @@ bool VantorelApp::applicationDidFinishLaunching(std::string* error) {
 
     // Creates the model and queues restartMonitor on the main queue: connecting
     // starts after launch returns.
-    if (!launcher_->start(options_.source, this, error)) return false;
+    if (!launcher_->start(options_.source, this, error)) {
+        // A source that cannot start (a replay the service refuses): the window says why
+        // instead of standing empty.
+        launchError_ = error && !error->empty() ? *error : "the source could not start";
+        updateStatusForViewController(_navController->topPane());
+        return false;
+    }
     connect(model(), &VantorelModel::displayTicked, this, &VantorelApp::sampleSignals);
     return true;
 }
@@ -114,6 +120,11 @@ void VantorelApp::updateViewControllerFromModel() {
 
 void VantorelApp::updateStatusForViewController(VantorelPaneController* pane) {
     if (!pane) return;
+    if (!launchError_.empty()) {
+        pane->setStatus(launchError_, false);
+        pane->setPlaceholder(launchError_);
+        return;
+    }
     VantorelModel* m = model();
     SourceStatus status = m ? m->sourceStatus() : SourceStatus();
     status.firstConnect = false;
@@ -124,7 +135,14 @@ void VantorelApp::updateStatusForViewController(VantorelPaneController* pane) {
     _updateMessage = savedPath_.empty() ? StatusText::line(status) : "Saved " + savedPath_;
     pane->setStatus(_updateMessage, status.phase == SourceStatus::Phase::Connecting ||
                                         status.phase == SourceStatus::Phase::Disconnected);
-    pane->setStale(StatusText::isStale(status));
+    // Every pane of the stack, so that going back shows greyed values too.
+    const bool stale = StatusText::isStale(status);
+    pane->setStale(stale);
+    if (_navController)
+        for (VantorelPaneController* each : _navController->panes()) each->setStale(stale);
+    // A pane with nothing to show says why in its middle: no service, a source that failed.
+    pane->setPlaceholder(!status.connectProblem.empty() || !status.backendProblem.empty() ? StatusText::line(status)
+                                                                                          : std::string());
 }
 
 void VantorelApp::navigationControllerWillShow(NavigationController&, VantorelPaneController& pane) {

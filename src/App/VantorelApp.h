@@ -39,7 +39,7 @@ public:
 
     // Reads the preferences, opens the window on the root pane and starts the
     // monitor (connecting begins once the event loop runs); false (with *error) when the in-process service
-    // cannot start.
+    // cannot start: the window then shows *error in its status line and in the root pane.
     bool applicationDidFinishLaunching(std::string* error);
     void applicationWillTerminate();
 
@@ -80,6 +80,7 @@ private:
     Options options_;
     uint64_t messagesShown_ = 0;   // the model's count when "Updated" was last set
     QDateTime updatedAt_;
+    std::string launchError_;      // why the source could not start; shown instead of any status
     std::string savedPath_;        // shown instead of the status for a few seconds after a save
     int saveNotices_ = 0;          // the newest notice's number, so an older timer leaves it alone
     SignalSampler sampler_;        // sampled for the whole session, whether the plot is open or not

@@ -39,6 +39,7 @@ VantorelPaneController::VantorelPaneController(NodeRef node, std::string atPath,
       application_(application),
       table_(new QTableWidget(this)),
       toolbar_(new QToolBar(this)),
+      placeholder_(new QLabel(this)),
       listView_(new ListTableView(this)) {
     table_->setColumnCount(1);
     table_->horizontalHeader()->hide();
@@ -78,6 +79,14 @@ VantorelPaneController::VantorelPaneController(NodeRef node, std::string atPath,
     layout->setSpacing(0);
     layout->addWidget(table_, 1);
     layout->addWidget(listView_, 1);
+    // A sentence, not a row: wrapped in the middle of the pane, the table hidden meanwhile.
+    placeholder_->setAlignment(Qt::AlignCenter);
+    placeholder_->setWordWrap(true);
+    placeholder_->setTextFormat(Qt::PlainText);
+    placeholder_->setMargin(24);
+    placeholder_->setTextInteractionFlags(Qt::TextSelectableByMouse);
+    placeholder_->hide();
+    layout->addWidget(placeholder_, 1);
     layout->addWidget(toolbar_);
     setFocusProxy(table_);
 
@@ -131,6 +140,7 @@ void VantorelPaneController::reloadWithNode(NodeRef node) {
     updateTitle();
     reloadData();
     updateListView();
+    updatePlaceholder();
     createToolbarItems();
 
     const std::vector<NodeRef>* children = _nodes ? _nodes->childNodes() : nullptr;
@@ -150,6 +160,20 @@ void VantorelPaneController::setStale(bool stale) {
     listView_->setEnabled(!stale_);
 }
 
+void VantorelPaneController::setPlaceholder(const std::string& text) {
+    const QString shown = QString::fromStdString(text);
+    if (shown == placeholder_->text()) return;
+    placeholder_->setText(shown);
+    updatePlaceholder();
+}
+
+void VantorelPaneController::updatePlaceholder() {
+    const bool shown = !placeholder_->text().isEmpty() && numberOfRowsInSection() == 0;
+    placeholder_->setVisible(shown);
+    table_->setVisible(!shown && !showsTable_);
+    listView_->setVisible(!shown && showsTable_);
+}
+
 void VantorelPaneController::setShowsTable(bool shown) {
     Preferences::setOwnBool(kListTablesPreference, shown);
     updateListView();
@@ -163,8 +187,8 @@ void VantorelPaneController::updateListView() {
     showsTable_ = table;
     if (!table) listView_->setList(nullptr);
     const bool focused = hasFocus() || (focusProxy() && focusProxy()->hasFocus());
-    table_->setVisible(!table);
-    listView_->setVisible(table);
+    table_->setVisible(!table && placeholder_->isHidden());
+    listView_->setVisible(table && placeholder_->isHidden());
     setFocusProxy(table ? static_cast<QWidget*>(listView_) : table_);
     if (focused) setFocus();
 }

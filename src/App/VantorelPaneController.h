@@ -48,6 +48,10 @@ public:
     // Stale values (the stream is lost): the rows are greyed until it is back.
     void setStale(bool stale);
     bool isStale() const { return stale_; }
+    // Why the pane has nothing to show (a source that cannot start, a service nobody
+    // runs), in place of its rows while it has none; empty: nothing in their place.
+    void setPlaceholder(const std::string& text);
+    QLabel* placeholderLabel() const { return placeholder_; }
 
     // The platform's appearance calls, sent by the navigation controller.
     void viewWillAppear();
@@ -116,6 +120,7 @@ private:
     void fitStatus();
     // Shows the rows or the table, as the node and the setting say, and refills the table.
     void updateListView();
+    void updatePlaceholder();
 
     NodeRef _nodes;
     std::string _keyPath;
@@ -134,6 +139,7 @@ private:
     ActivityIndicator* activityIndicator_ = nullptr;
     QAction* activityIndicatorItem_ = nullptr;
     QLabel* statusLabel_ = nullptr;
+    QLabel* placeholder_;
     QAction* saveItem_ = nullptr;
     QAction* signalItem_ = nullptr;
     QAction* tableItem_ = nullptr;

@@ -5,10 +5,12 @@
 #include "Monitor/MonitorLauncher.h"
 #include "Monitor/TerminalFallback.h"
 #include "Monitor/TerminalView.h"
+#include "Platform/TerminalText.h"
 
 #include <QApplication>
 #include <QCommandLineParser>
 #include <QCoreApplication>
+#include <QGuiApplication>
 
 #include <cstdio>
 #include <cstdlib>
@@ -42,7 +44,8 @@ int main(int argc, char** argv) {
     using namespace vantorel;
     QCommandLineParser parser;
     // Asked before QApplication exists: Qt aborts the process on a display that does not answer.
-    if (const auto why = TerminalFallback::reason()) {
+    TerminalFallback display;
+    if (const auto why = display.check()) {
         QCoreApplication app(argc, argv);
         auto source = parseOptions(app, parser);
         if (!source) return 2;
@@ -50,20 +53,32 @@ int main(int argc, char** argv) {
         return TerminalView::run(*source, "vantorel");
     }
 
+    // The X server answered the probe, but may still refuse Qt's own connection (it went
+    // away, or reset when another client left): Qt then takes the offscreen platform
+    // rather than abort, and the terminal view is shown. The probe's connection is held
+    // until Qt's is open, so that its close cannot be what resets the server.
+    const bool fallbackPlatform = display.holdsDisplay();
+    if (fallbackPlatform) qputenv("QT_QPA_PLATFORM", TerminalFallback::kPlatforms);
     QApplication app(argc, argv);
+    if (fallbackPlatform) qunsetenv("QT_QPA_PLATFORM");
+    display.release();
     auto source = parseOptions(app, parser);
     if (!source) return 2;
+    if (fallbackPlatform && QGuiApplication::platformName() != QStringLiteral("xcb")) {
+        std::fprintf(stderr, "vantorel: display %s refused the window's connection: showing the terminal view\n",
+                     TerminalText::visible(qgetenv("DISPLAY").toStdString()).c_str());
+        return TerminalView::run(*source, "vantorel");
+    }
     VantorelApp::Options options;
     options.source = *source;
     options.allowSave = parser.isSet("allow-save");
     VantorelApp vantorelApp(options);
     std::string error;
-    if (!vantorelApp.applicationDidFinishLaunching(&error)) {
-        std::fprintf(stderr, "vantorel: %s\n", error.c_str());
-        return 1;
-    }
+    const bool launched = vantorelApp.applicationDidFinishLaunching(&error);
+    if (!launched) std::fprintf(stderr, "vantorel: %s\n", error.c_str());  // and in the window, until it is closed
     QuitOnSignal quit;
-    const int code = QApplication::exec();
+    int code = QApplication::exec();
+    if (!launched) code = 1;
     vantorelApp.applicationWillTerminate();
     return code;
 }

@@ -3,6 +3,7 @@
 
 #include <QDateTime>
 
+#include <chrono>
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -32,6 +33,16 @@ struct SourceStatus {
     // The backend's trouble as the service words it ("device /dev/ttyUSB0: the device went
     // away ..."), while it lasts; empty when all is well.
     std::string backendProblem;
+    QDateTime lastDataAt;  // when the last record reached this monitor; invalid before any
+    // Streaming, yet neither a record nor the service's progress for a while: the modem
+    // or the service froze, and the values shown are old.
+    bool frozen = false;
+    // Records the service dropped for this monitor, which took them too slowly.
+    uint64_t dropped = 0;
+    // Why the service cannot be reached ("nothing serves port lab"), once start-up has
+    // failed a few times in a row; empty while it starts or runs.
+    std::string connectProblem;
+    std::chrono::milliseconds retryDelay{0};  // how often start-up is tried again
 };
 
 }  // namespace vantorel

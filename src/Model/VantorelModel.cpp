@@ -50,8 +50,10 @@ bool VantorelModel::createPorts() {
     if (serviceResolver_) serviceName_ = serviceResolver_();
     serverConnection_ = TelephonyServiceConnection::open(
         [this](const std::string& n, const Value& info) { serviceNotificationCallback(n, info); }, serviceName_);
+    const std::string service = "the service on port " + serviceName_;
     if (!serverConnection_) {
         SystemLog::log(SystemLog::kError, "Could not create TSServerConnection");
+        startFailure_ = "nothing serves port " + serviceName_;
         return false;
     }
 
@@ -59,18 +61,32 @@ bool VantorelModel::createPorts() {
     if (channel.errorCode != 0) {
         SystemLog::log(SystemLog::kError, "_TSServerConnectionNetworkMonitorCreateLogChannel returns error: %ld!",
                        static_cast<long>(channel.errorCode));
+        // The codes of docs/protocol.md: domain 1 the service's, domain 2 our transport's.
+        constexpr int32_t kService = 1, kTransport = 2;
+        if (channel.errorDomain == kService && channel.errorCode == 3)
+            startFailure_ = service + " could not start its source";
+        else if (channel.errorDomain == kService && channel.errorCode == 5)
+            startFailure_ = service + " serves as many monitors as it can";
+        else if (channel.errorDomain == kTransport && channel.errorCode == -2)
+            startFailure_ = service + " does not answer";
+        else
+            startFailure_ = service + " refused a log channel (error " + std::to_string(channel.errorDomain) + "/" +
+                            std::to_string(channel.errorCode) + ")";
         return false;
     }
     if (channel.portName.empty()) {
         SystemLog::log(SystemLog::kError, "Could not create a log channel (TS returned null port)!");
+        startFailure_ = service + " gave no channel port";
         return false;
     }
     _sendPort.reset(RemoteMessagePort::lookup(channel.portName, 1000)
                         .release());
     if (!_sendPort) {
         SystemLog::log(SystemLog::kError, "Could not create the remote port!");
+        startFailure_ = service + " gave a channel port nothing serves";
         return false;
     }
+    _sendPort->setNotificationCallback([this](int32_t, const Bytes& data) { channelNotificationCallback(data); });
     SystemLog::log(SystemLog::kError, " ***** Created ports (send=%p, recv=%p)", static_cast<void*>(_sendPort.get()),
                    static_cast<void*>(_recvPort.get()));
     return true;
@@ -89,11 +105,15 @@ void VantorelModel::destroyPorts() {
         _recvPort.reset();
     }
     if (_sendPort) {
+        _sendPort->setNotificationCallback(nullptr);
         _sendPort->setInvalidationCallback(nullptr);
         _sendPort->invalidate();
         _sendPort.reset();
     }
     serverConnection_.reset();
+    // The next channel's service counts from zero again.
+    droppedBefore_ += droppedNow_;
+    droppedNow_ = 0;
 }
 
 std::optional<Bytes> VantorelModel::receiveCallback(int32_t messageId, const Bytes& data) {
@@ -134,7 +154,9 @@ void VantorelModel::readBackendState(const Value& info) {
         status_.source = *source->asString();
         status_.isReplay = status_.source.rfind("replay ", 0) == 0;
     }
-    status_.sent = integer("Sent");
+    const std::optional<int64_t> sent = integer("Sent");
+    if (sent && *sent != status_.sent.value_or(-1)) lastActivity_ = MonitorClock::current().now();  // not frozen
+    status_.sent = sent;
     status_.total = integer("Total");
     const std::optional<int64_t> recorded = integer("RecordedTime");
     status_.recordedAt = recorded ? QDateTime::fromMSecsSinceEpoch(*recorded / 1000) : QDateTime();
@@ -165,6 +187,25 @@ void VantorelModel::setSource(std::string description, bool isReplay, bool autho
     sourceFixed_ = authoritative;
 }
 
+void VantorelModel::channelNotificationCallback(const Bytes& data) {
+    // {"Name": "ChannelStatus", "Info": {"Dropped": n}} (docs/protocol.md); anything else is not ours.
+    const PropertyListResult parsed = PropertyListSerialization::readDictionary(data);
+    if (!parsed) return;
+    const DictionaryRef notification = parsed.value->asDictionary();
+    const std::string* name = notification->get("Name").asString();
+    const DictionaryRef info = notification->get("Info").asDictionary();
+    if (!name || *name != "ChannelStatus" || !info) return;
+    const std::optional<int64_t> dropped = info->get("Dropped").asInteger();
+    if (!dropped || *dropped < 0 || static_cast<uint64_t>(*dropped) == droppedNow_) return;
+    droppedNow_ = static_cast<uint64_t>(*dropped);
+    statusChanged_ = true;  // shown at the next tick
+}
+
+bool VantorelModel::frozen() const {
+    if (status_.phase != SourceStatus::Phase::Streaming || !_displayUpdateTimer || messagesDecoded_ == 0) return false;
+    return MonitorClock::current().now() - lastActivity_ >= kFrozenWait;
+}
+
 bool VantorelModel::noRecordForDecoder() const {
     if (status_.phase != SourceStatus::Phase::Streaming || !_displayUpdateTimer) return false;
     if (MonitorClock::current().now() - streamingSince_ < kNoRecordWait) return false;
@@ -179,6 +220,12 @@ SourceStatus VantorelModel::sourceStatus() const {
     SourceStatus status = status_;
     status.forDecoder = messagesDecoded_;
     status.noRecordForDecoder = noRecordForDecoder();
+    status.frozen = frozen();
+    if (messagesDecoded_ > 0)
+        status.lastDataAt = QDateTime::fromMSecsSinceEpoch(
+            std::chrono::duration_cast<std::chrono::milliseconds>(lastData_.time_since_epoch()).count());
+    status.dropped = droppedBefore_ + droppedNow_;
+    status.retryDelay = MonitorClock::current().retryDelay();
     return status;
 }
 
@@ -199,22 +246,30 @@ void VantorelModel::scheduleRetry() {
     QTimer::singleShot(MonitorClock::current().retryDelay(), this, [this] { startMonitor(); });
 }
 
+void VantorelModel::startFailed(const std::string& why) {
+    destroyPorts();
+    scheduleRetry();
+    // One failure may be a service still starting; more in a row are said, with the
+    // cause, while the retries go on.
+    if (++failedStarts_ < kFailedStartsBeforeTelling || why == status_.connectProblem) return;
+    status_.connectProblem = why;
+    tellApplication();
+}
+
 void VantorelModel::startMonitor() {
     if (_displayUpdateTimer) return;
 
+    startFailure_.clear();
     if (!createPorts()) {
         SystemLog::log(SystemLog::kError, "Could not create the ports necessary");
-        destroyPorts();
-        scheduleRetry();
-        return;
+        return startFailed(startFailure_);
     }
 
     configureGenerator();
     if (!_logGenerator) {
         SystemLog::log(SystemLog::kError, "No log generator technology works");
-        destroyPorts();
-        scheduleRetry();
-        return;
+        return startFailed(startFailure_.empty() ? "the service on port " + serviceName_ + " did not tell a technology this monitor decodes"
+                                                 : startFailure_);
     }
 
     DictionaryRef command = _logGenerator->getStartCommand();
@@ -222,18 +277,14 @@ void VantorelModel::startMonitor() {
         command ? PropertyListSerialization::write(Value(command), PropertyListSerialization::Format::XML) : std::nullopt;
     if (!xml) {
         SystemLog::log(SystemLog::kError, " Could not generate PLIST");
-        destroyPorts();
-        scheduleRetry();
-        return;
+        return startFailed("the decoder has no start command");
     }
 
     const double timeout = kRequestTimeoutSeconds;
     int32_t status = _sendPort->sendRequest(0, *xml, timeout, 0, nullptr);
     if (status != 0) {
         SystemLog::log(SystemLog::kError, " ***** Could not send the START command (got error=%d)", status);
-        destroyPorts();
-        scheduleRetry();
-        return;
+        return startFailed("the service on port " + serviceName_ + " did not take the start command");
     }
 
     SystemLog::log(SystemLog::kError, "Starting the display update timer");
@@ -242,9 +293,11 @@ void VantorelModel::startMonitor() {
     connect(_displayUpdateTimer, &QTimer::timeout, this, [this] { refresh(); });
     _displayUpdateTimer->start();
     // Back from a lost channel: the stale mark goes at the next tick, data or not.
-    if (status_.phase == SourceStatus::Phase::Disconnected) statusChanged_ = true;
+    if (status_.phase == SourceStatus::Phase::Disconnected || !status_.connectProblem.empty()) statusChanged_ = true;
     status_.phase = SourceStatus::Phase::Streaming;
-    streamingSince_ = MonitorClock::current().now();
+    status_.connectProblem.clear();
+    failedStarts_ = 0;
+    streamingSince_ = lastActivity_ = MonitorClock::current().now();
 }
 
 void VantorelModel::restartMonitor() {
@@ -302,6 +355,9 @@ void VantorelModel::refresh(bool displayTick) {
     const bool noRecord = noRecordForDecoder();
     if (noRecord != status_.noRecordForDecoder) statusChanged_ = true;
     status_.noRecordForDecoder = noRecord;
+    const bool isFrozen = frozen();
+    if (isFrozen != status_.frozen) statusChanged_ = true;
+    status_.frozen = isFrozen;
 
     if (_updated) {
         _nodes.reset();
@@ -324,6 +380,7 @@ void VantorelModel::updateWithData(ByteView data) {
     if (_logGenerator) {
         _logGenerator->updateState(*_state, data);
         ++messagesDecoded_;
+        lastData_ = lastActivity_ = MonitorClock::current().now();
     }
     _updated = true;
 }

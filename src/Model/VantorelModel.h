@@ -30,6 +30,11 @@ public:
     static constexpr double kRequestTimeoutSeconds = 1.0;
     // A stream that has run this long without a record the decoder reads is reported.
     static constexpr std::chrono::seconds kNoRecordWait{10};
+    // A stream that has sent nothing (no record here, no progress at the service) this
+    // long after it last did has frozen: its values are shown as stale.
+    static constexpr std::chrono::seconds kFrozenWait{10};
+    // Start-up failing this many times in a row is shown with its cause (retries go on).
+    static constexpr int kFailedStartsBeforeTelling = 2;
 
     // `init`: an empty state, nothing connected. `application` receives
     // updateViewControllerFromModel; `serviceName` is the telephony service's port.
@@ -87,9 +92,15 @@ private:
     std::optional<Bytes> receiveCallback(int32_t messageId, const Bytes& data);
     void invalidationCallback(LocalMessagePort* port);
     void serviceNotificationCallback(const std::string& name, const Value& info);
+    // A start-up step failed for `why` (for people): closes what was opened, says why once
+    // it has failed kFailedStartsBeforeTelling times in a row, and tries again later.
+    void startFailed(const std::string& why);
     void scheduleRetry();
     void readBackendState(const Value& info);
+    // The channel port's notifications: the records the service dropped for us.
+    void channelNotificationCallback(const Bytes& data);
     bool noRecordForDecoder() const;
+    bool frozen() const;
     void tellApplication();
 
     // Ports are QObjects that may be inside their own callback when closed: they are
@@ -121,6 +132,12 @@ private:
     bool statusChanged_ = false;
     bool newSinceTick_ = false;  // data shown since the last display tick's displayTicked
     std::chrono::system_clock::time_point streamingSince_;
+    std::chrono::system_clock::time_point lastData_;      // the last record; epoch before any
+    std::chrono::system_clock::time_point lastActivity_;  // the last record or progress of the service
+    std::string startFailure_;     // why the current start-up attempt failed, for people
+    int failedStarts_ = 0;         // start-up attempts failed in a row
+    uint64_t droppedBefore_ = 0;   // dropped for the channels closed already
+    uint64_t droppedNow_ = 0;      // dropped for the open channel, as its service said
 };
 
 }  // namespace vantorel

@@ -7,6 +7,7 @@
 #include <QDir>
 #include <QFile>
 
+#include <algorithm>
 #include <cerrno>
 #include <chrono>
 #include <cstdlib>
@@ -101,10 +102,15 @@ QByteArray cookie(const std::string& number) {
     return {};
 }
 
-// The X11 connection setup: any reply (success, failure, authenticate) means a
-// server is there. A forwarding proxy with nothing behind it (an SSH session whose
-// client has no X server) accepts the connection and then closes it.
-bool answersSetup(int fd, const std::string& number, Clock::time_point deadline) {
+// The X11 connection setup and the first bytes of the server's reply: byte 0 is 0
+// (Failed), 1 (Success) or 2 (Authenticate); a Failed reply has its reason's length in
+// byte 1 and the reason from byte 8, an Authenticate reply its reason from byte 8 to
+// the 4-byte units counted by bytes 6-7. Only Success lets a client in. A forwarding
+// proxy with nothing behind it (an SSH session whose client has no X server), and an X
+// server that resets, accept the connection and close it without a reply: Closed.
+enum class Setup { Success, Refused, Closed, Silent };
+
+Setup setup(int fd, const std::string& number, Clock::time_point deadline, std::string* why) {
     const QByteArray auth = cookie(number);
     const QByteArray name = auth.isEmpty() ? QByteArray() : QByteArray("MIT-MAGIC-COOKIE-1");
     auto pad = [](QByteArray b) { return b + QByteArray((4 - b.size() % 4) % 4, '\0'); };
@@ -115,16 +121,41 @@ bool answersSetup(int fd, const std::string& number, Clock::time_point deadline)
         request += static_cast<char>(v & 0xff), request += static_cast<char>(v >> 8);
     request += pad(name) + pad(auth);
     ::fcntl(fd, F_SETFL, ::fcntl(fd, F_GETFL) & ~O_NONBLOCK);
-    if (::send(fd, request.constData(), static_cast<size_t>(request.size()), MSG_NOSIGNAL) != request.size()) return false;
-    pollfd p{fd, POLLIN, 0};
-    char reply = 0;
-    return ::poll(&p, 1, remainingMs(deadline)) == 1 && ::recv(fd, &reply, 1, 0) == 1;
+    if (::send(fd, request.constData(), static_cast<size_t>(request.size()), MSG_NOSIGNAL) != request.size())
+        return Setup::Closed;
+    // The fixed 8 bytes, then up to 255 of the reason: what has come by the deadline.
+    unsigned char reply[8 + 255];
+    size_t got = 0;
+    while (got < 8) {
+        pollfd p{fd, POLLIN, 0};
+        if (::poll(&p, 1, remainingMs(deadline)) != 1) return Setup::Silent;
+        const ssize_t n = ::recv(fd, reply + got, sizeof reply - got, 0);
+        if (n <= 0) return Setup::Closed;
+        got += static_cast<size_t>(n);
+    }
+    if (reply[0] == 1) return Setup::Success;
+    const size_t length = reply[0] == 0 ? reply[1] : (reply[6] | reply[7] << 8) * 4u;
+    while (got < 8 + std::min<size_t>(length, 255)) {
+        pollfd p{fd, POLLIN, 0};
+        if (::poll(&p, 1, std::min(remainingMs(deadline), 200)) != 1) break;
+        const ssize_t n = ::recv(fd, reply + got, sizeof reply - got, 0);
+        if (n <= 0) break;
+        got += static_cast<size_t>(n);
+    }
+    std::string reason(reinterpret_cast<const char*>(reply) + 8, std::min(got - 8, length));
+    while (!reason.empty() && (reason.back() == '\0' || reason.back() == '\n')) reason.pop_back();
+    if (why) *why = reason.empty() ? std::string(reply[0] == 0 ? "refused" : "asks for an authentication Qt cannot give")
+                                   : TerminalText::visible(reason);
+    return Setup::Refused;
 }
 
 }  // namespace
 
-bool TerminalFallback::displayAnswers(const std::string& display, int timeoutMs) {
+bool TerminalFallback::displayAnswers(const std::string& display, int timeoutMs, std::string* why, int* connection) {
     const auto deadline = Clock::now() + std::chrono::milliseconds(timeoutMs);
+    std::string ignored;
+    if (!why) why = &ignored;
+    *why = "does not answer";
     const size_t colon = display.rfind(':');
     if (colon == std::string::npos) return false;
     const std::string host = display.substr(0, colon);
@@ -132,24 +163,39 @@ bool TerminalFallback::displayAnswers(const std::string& display, int timeoutMs)
     number = number.substr(0, number.find('.'));
     if (number.empty() || number.size() > 5 || number.find_first_not_of("0123456789") != std::string::npos) return false;
     const int n = std::stoi(number);
-    int fd = -1;
-    if (!host.empty() && host[0] == '/') {
-        fd = connectUnix(display, false, deadline);  // a socket path (launchd)
-    } else if (host.empty() || host == "unix" || host.ends_with("/unix")) {
-        const std::string path = "/tmp/.X11-unix/X" + number;
-        fd = connectUnix(path, false, deadline);
-        if (fd < 0) fd = connectUnix(path, true, deadline);
-    } else {
-        if (n > 65535 - 6000) return false;
-        fd = connectTcp(host.front() == '[' && host.back() == ']' ? host.substr(1, host.size() - 2) : host, 6000 + n, deadline);
+    if (!host.empty() && host[0] != '/' && host != "unix" && !host.ends_with("/unix") && n > 65535 - 6000) return false;
+    auto connect = [&]() {
+        if (!host.empty() && host[0] == '/') return connectUnix(display, false, deadline);  // a socket path (launchd)
+        if (host.empty() || host == "unix" || host.ends_with("/unix")) {
+            const std::string path = "/tmp/.X11-unix/X" + number;
+            const int fd = connectUnix(path, false, deadline);
+            return fd >= 0 ? fd : connectUnix(path, true, deadline);
+        }
+        return connectTcp(host.front() == '[' && host.back() == ']' ? host.substr(1, host.size() - 2) : host, 6000 + n,
+                          deadline);
+    };
+    // A connection closed at once is tried again, a little later each time, until the deadline.
+    for (int pause = 10;; pause = std::min(pause * 2, 200)) {
+        const int fd = connect();
+        if (fd < 0) return false;
+        const Setup answer = setup(fd, number, deadline, why);
+        if (answer == Setup::Success && connection) {
+            *connection = fd;
+        } else {
+            ::close(fd);
+        }
+        if (answer == Setup::Success) return true;
+        if (answer == Setup::Refused) {
+            *why = "refuses connections: " + *why;
+            return false;
+        }
+        if (answer == Setup::Silent || remainingMs(deadline) <= pause) return false;
+        ::usleep(static_cast<useconds_t>(pause) * 1000);
     }
-    if (fd < 0) return false;
-    const bool answers = answersSetup(fd, number, deadline);
-    ::close(fd);
-    return answers;
 }
 
-std::optional<std::string> TerminalFallback::reason(int timeoutMs) {
+std::optional<std::string> TerminalFallback::check(int timeoutMs) {
+    release();
     auto set = [](const char* variable) {
         const char* value = std::getenv(variable);
         return value && *value ? std::optional<std::string>(value) : std::nullopt;
@@ -157,8 +203,14 @@ std::optional<std::string> TerminalFallback::reason(int timeoutMs) {
     if (set("QT_QPA_PLATFORM") || set("WAYLAND_DISPLAY")) return std::nullopt;
     const auto display = set("DISPLAY");
     if (!display) return "no display (DISPLAY and WAYLAND_DISPLAY are unset)";
-    if (displayAnswers(*display, timeoutMs)) return std::nullopt;
-    return "display " + TerminalText::visible(*display) + " does not answer";
+    std::string why;
+    if (displayAnswers(*display, timeoutMs, &why, &held_)) return std::nullopt;
+    return "display " + TerminalText::visible(*display) + " " + why;
+}
+
+void TerminalFallback::release() {
+    if (held_ >= 0) ::close(held_);
+    held_ = -1;
 }
 
 }  // namespace vantorel

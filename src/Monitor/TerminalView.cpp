@@ -66,18 +66,24 @@ void TerminalView::watchConnection() {
     wasConnected_ = connected;
 }
 
+SourceStatus TerminalView::sourceStatus() const {
+    SourceStatus status = model_ ? model_->sourceStatus() : SourceStatus();
+    status.firstConnect = false;
+    status.updatedAt = updatedAt_;
+    if (model_ && !model_->isConnected() && status.phase != SourceStatus::Phase::Disconnected)
+        status.phase = SourceStatus::Phase::Connecting;
+    return status;
+}
+
 std::string TerminalView::statusLine() const {
     std::string text = "Vantorel";
-    if (model_ && model_->logGenerator()) {
-        // The window's status line: source, state, replay position, a lost or finished stream.
-        SourceStatus status = model_->sourceStatus();
-        status.firstConnect = false;
-        status.updatedAt = updatedAt_;
-        if (!model_->isConnected() && status.phase != SourceStatus::Phase::Disconnected)
-            status.phase = SourceStatus::Phase::Connecting;
-        text += " - " + StatusText::line(status);
-        text += " - " + std::to_string(model_->messagesDecoded()) + " messages decoded";
-    }
+    if (!model_) return text;
+    // The window's status line: source, state, replay position, a lost, stale or finished
+    // stream, and before any channel why there is none yet.
+    const SourceStatus status = sourceStatus();
+    if (!model_->logGenerator() && status.connectProblem.empty()) return text;
+    text += " - " + StatusText::line(status);
+    if (model_->logGenerator()) text += " - " + std::to_string(model_->messagesDecoded()) + " messages decoded";
     return text;
 }
 
@@ -121,9 +127,14 @@ void TerminalView::draw() {
     auto lines = navigator_.render(statusLine(), width_, height_ - plots);
     for (int i = 0; i < plots && !lines.empty(); ++i)
         lines.insert(lines.begin() + 1 + i, sparklines_[static_cast<size_t>(i)].line(width_));
+    // Values that no longer follow the stream are dimmed, as the window greys them.
+    const bool stale = model_ && StatusText::isStale(sourceStatus());
+    const size_t firstRow = TerminalNavigator::kHeaderLines + static_cast<size_t>(plots);
     for (size_t i = 0; i < lines.size(); ++i) {
-        const bool cursor = lines[i].starts_with("> ") && i >= TerminalNavigator::kHeaderLines + static_cast<size_t>(plots);
-        text += cursor ? "\x1b[7m" + lines[i] + "\x1b[0m" : lines[i];
+        const bool cursor = lines[i].starts_with("> ") && i >= firstRow;
+        if (cursor) text += (stale ? "\x1b[2;7m" : "\x1b[7m") + lines[i] + "\x1b[0m";
+        else if (stale && i >= firstRow && i + TerminalNavigator::kFooterLines < lines.size() && !lines[i].empty()) text += "\x1b[2m" + lines[i] + "\x1b[0m";
+        else text += lines[i];
         text += i + 1 < lines.size() ? "\x1b[K\n" : "\x1b[K";
     }
     text += "\x1b[J";

@@ -54,6 +54,8 @@ public:
                    const std::function<void(VantorelModel&)>& started = {});
 
 private:
+    // The model's status as this view shows it (its own "Updated" time).
+    SourceStatus sourceStatus() const;
     void watchConnection();
     void readKeys();
     void draw();

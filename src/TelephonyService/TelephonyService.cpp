@@ -593,6 +593,19 @@ void TelephonyService::notifyBackendState() {
     notified_.start();
 }
 
+void TelephonyService::notifyChannelStatus(Channel& channel) {
+    auto info = Dictionary::create();
+    info->set("Dropped", Value::integer(static_cast<int64_t>(channel.dropped)));
+    info->set("Sent", Value::integer(static_cast<int64_t>(channel.sent)));
+    auto notification = Dictionary::create();
+    notification->set("Name", Value("ChannelStatus"));
+    notification->set("Info", Value(info));
+    // On the channel port, not behind the records queued for the receive port: the client
+    // hears of the loss while it is still behind.
+    channel.port->broadcastNotification(kNotificationMessageId, xml(notification));
+    channel.droppedNotified = channel.dropped;
+}
+
 void TelephonyService::backendStateChanged(ModemBackend::State state) {
     // A new run: what its stream holds is learnt afresh.
     if (state == ModemBackend::State::Streaming) logTechnologies_.clear();
@@ -631,6 +644,7 @@ void TelephonyService::checkHealth() {
         notifyBackendState();
     for (const auto& entry : channels_) {
         if (entry.second->closing) continue;
+        if (entry.second->dropped != entry.second->droppedNotified) notifyChannelStatus(*entry.second);
         // A client that died without its invalidation reaching us.
         if (!entry.second->client->isValid())
             scheduleClose(entry.first, "the client's receive port went away");

@@ -62,6 +62,9 @@ struct TelephonyServiceOptions {
 //     as the channel's log mask (LogMask); another "SetState" stops the channel's stream;
 //   - messages go to the client's receive port as Message frames, one record each, only
 //     while the channel streams and only those its mask forwards;
+//   - a channel that dropped records tells its client so on the channel port, as a
+//     Notification frame (id 0) {"Name": "ChannelStatus", "Info": {"Dropped", "Sent"}}, at
+//     most every half second while the count grows;
 //   - backend state changes are broadcast to the well-known port's connected clients as
 //     Notification frames (id 0) {"Name": "BackendStateChanged", "Info": {"State",
 //     "Technology", "Source", "Sent", "Total", "RecordedTime", "LogTechnologies"}}, and
@@ -158,6 +161,7 @@ private:
         LogMask mask;
         uint64_t sent = 0;
         uint64_t dropped = 0;
+        uint64_t droppedNotified = 0;  // "Dropped" of the channel's last ChannelStatus
         std::deque<std::pair<int32_t, Bytes>> queue;  // not yet handed to the socket, oldest first
         size_t queuedBytes = 0;
         QElapsedTimer age;
@@ -186,6 +190,8 @@ private:
     // Tells the backend the ordinary codes the streaming channels want.
     void updateLogCodes();
     void notifyBackendState();
+    // Tells the channel's client, on the channel port, how many of its records were dropped.
+    void notifyChannelStatus(Channel& channel);
     void updateFlow();
     void checkHealth();
     void statusLine(const std::string& line);

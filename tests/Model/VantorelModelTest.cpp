@@ -13,6 +13,8 @@
 #include <QElapsedTimer>
 #include <gtest/gtest.h>
 
+#include <functional>
+
 using namespace vantorel;
 using namespace vantorel::testing;
 
@@ -201,4 +203,101 @@ TEST_F(VantorelModelTest, TheSourceStateFollowsTheBackendAndALostChannelAtOnce) 
     EXPECT_TRUE(model->sourceStatus().disconnectedAt.isValid());
     spin(300);  // retries fail: still stale
     EXPECT_EQ(model->sourceStatus().phase, Phase::Disconnected);
+}
+
+TEST_F(VantorelModelTest, ValuesShownGoStaleWhenTheStreamFreezesOrTheModemGoesAwayButNotBeforeAnyCame) {
+    using Phase = SourceStatus::Phase;
+    FastMonitorClock& clock = FastMonitorClock::installed();
+    auto failed = Dictionary::create();
+    failed->set("State", "Failed");
+    failed->set("Problem", "device /dev/ttyUSB0: the device went away");
+    const struct {
+        const char* what;
+        bool recordFirst;
+        std::function<void()> happen;
+        bool frozen;
+        const char* problem;
+    } rows[] = {
+        {"a frozen stream", true, [&] { clock.frozen = std::chrono::system_clock::now() + VantorelModel::kFrozenWait + std::chrono::seconds(1); },
+         true, ""},
+        {"an unplugged modem", true, [&] { service.notify("BackendStateChanged", Value(failed)); }, false,
+         "device /dev/ttyUSB0: the device went away"},
+        {"a source that failed before sending", false, [&] { service.notify("BackendStateChanged", Value(failed)); },
+         false, "device /dev/ttyUSB0: the device went away"},
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.what);
+        auto model = runningModel();
+        if (row.recordFirst) {
+            service.send(rrcRecord(3));
+            ASSERT_TRUE(waitUntil([&] { return model->messagesDecoded() == 1; }, 2000));
+        }
+        const int updates = app.updates;
+        spin(100);
+        EXPECT_FALSE(model->sourceStatus().frozen);  // records came a moment ago
+        row.happen();
+        ASSERT_TRUE(waitUntil([&] { return app.updates > updates && model->sourceStatus().backendProblem == row.problem; }, 2000));
+        const SourceStatus status = model->sourceStatus();
+        EXPECT_EQ(status.phase, Phase::Streaming);
+        EXPECT_EQ(status.frozen, row.frozen);
+        EXPECT_EQ(status.lastDataAt.isValid(), row.recordFirst);  // what the stale line says "no data since"
+        clock.frozen.reset();
+        if (!row.recordFirst) continue;
+        service.send(rrcRecord(2));  // data again: no longer frozen
+        ASSERT_TRUE(waitUntil([&] { return !model->sourceStatus().frozen && model->messagesDecoded() == 2; }, 2000));
+    }
+}
+
+TEST_F(VantorelModelTest, TheRecordsTheServiceDroppedAddUpOverItsChannels) {
+    auto model = runningModel();
+    auto dropped = [](int64_t n) {
+        auto info = Dictionary::create();
+        info->set("Dropped", Value::integer(n));
+        return Value(info);
+    };
+    service.notifyChannel("ChannelStatus", dropped(1200));
+    ASSERT_TRUE(waitUntil([&] { return model->sourceStatus().dropped == 1200; }, 2000));
+    service.notifyChannel("SomethingElse", dropped(99999));  // not ours
+    service.notifyChannel("ChannelStatus", dropped(-5));     // nonsense
+    service.notifyChannel("ChannelStatus", dropped(1300));
+    ASSERT_TRUE(waitUntil([&] { return model->sourceStatus().dropped == 1300; }, 2000));
+    service.closeChannelPort();  // a new channel, whose service counts from zero
+    ASSERT_TRUE(waitUntil([&] { return service.channelsCreated() == 2 && model->isRunning(); }, 3000));
+    service.notifyChannel("ChannelStatus", dropped(7));
+    EXPECT_TRUE(waitUntil([&] { return model->sourceStatus().dropped == 1307; }, 2000));
+}
+
+TEST_F(VantorelModelTest, AStartThatKeepsFailingSaysWhyAndGoesOnTrying) {
+    const std::string nobody = uniquePortName("nobody");
+    const struct {
+        std::string port;
+        FakeServiceBehaviour spoilt;
+        std::string problem;
+    } rows[] = {
+        {nobody, {}, "nothing serves port " + nobody},
+        {service.name(), {.channelErrorCode = 3}, "the service on port " + service.name() + " could not start its source"},
+        {service.name(), {.technology = "kTSLogChannelTechnology_Morvek_WiMAX"},
+         "the service on port " + service.name() + " did not tell a technology this monitor decodes"},
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.problem);
+        service.setBehaviour(row.spoilt);
+        capture.clear();
+        app.updates = 0;
+        VantorelModel model(&app, row.port);
+        model.startMonitor();
+        EXPECT_EQ(model.sourceStatus().connectProblem, "");  // one failure may be a service still starting
+        ASSERT_TRUE(waitUntil([&] { return app.updates > 0; }, 2000));  // the view is told at once
+        EXPECT_EQ(model.sourceStatus().connectProblem, row.problem);
+        EXPECT_EQ(model.sourceStatus().retryDelay, FastMonitorClock::kRetry);
+        const int attempts = count("Could not create the ports necessary") + count("No log generator technology works");
+        EXPECT_TRUE(waitUntil([&] {
+            return count("Could not create the ports necessary") + count("No log generator technology works") > attempts + 1;
+        }, 2000));
+        EXPECT_EQ(app.updates, 1);  // the same cause is said once
+        if (row.port != service.name()) continue;
+        service.setBehaviour(FakeServiceBehaviour());
+        ASSERT_TRUE(waitUntil([&] { return model.isRunning(); }, 3000));
+        EXPECT_EQ(model.sourceStatus().connectProblem, "");
+    }
 }

@@ -1,16 +1,26 @@
-// Tests of the terminal view's keys, its screen in a small terminal, moving through a changing tree, and the X display probe.
+// Tests of the terminal view's keys, its screen in a small terminal, moving through a changing tree, its status line, and the X display probe.
+#include "Model/VantorelModel.h"
 #include "Monitor/TerminalFallback.h"
 #include "Monitor/TerminalKeys.h"
 #include "Monitor/TerminalNavigator.h"
+#include "Monitor/TerminalView.h"
+#include "Platform/RecordBuilder.h"
 #include "PropertyList/Array.h"
 #include "PropertyList/Dictionary.h"
+#include "support/EventLoopWait.h"
+#include "support/FakeTelephonyService.h"
+#include "support/FastMonitorClock.h"
 
 #include <gtest/gtest.h>
 
 #include <arpa/inet.h>
 #include <chrono>
+#include <cstdio>
+#include <functional>
+#include <poll.h>
 #include <sys/socket.h>
 #include <thread>
+#include <vector>
 #include <unistd.h>
 
 using namespace vantorel;
@@ -97,27 +107,100 @@ TEST(TerminalView, ARefreshKeepsTheLevelAndTheCursorRowByName) {
     EXPECT_TRUE(nav.path().empty());
 }
 
-TEST(TerminalView, AnXDisplayAnswersOnlyWhenAServerRepliesToTheSetup) {
+TEST(TerminalView, AnXDisplayAnswersOnlyWhenItsServerLetsAClientInAndAResettingServerIsAskedAgain) {
     const int listener = ::socket(AF_INET, SOCK_STREAM, 0);
     sockaddr_in address{AF_INET, 0, {htonl(INADDR_LOOPBACK)}, {}};
     int n = 59;  // a free port 6000 + n on the loopback
     do address.sin_port = htons(static_cast<uint16_t>(6000 + ++n));
     while (::bind(listener, reinterpret_cast<sockaddr*>(&address), sizeof address) != 0);
-    ASSERT_EQ(::listen(listener, 4), 0);
+    ASSERT_EQ(::listen(listener, 8), 0);
     const std::string tcp = "127.0.0.1:" + std::to_string(n) + ".0";
     const auto start = std::chrono::steady_clock::now();
     for (const std::string& nothing : {":" + std::to_string(n + 9000), "127.0.0.1:" + std::to_string(n + 1), std::string("junk")})
         EXPECT_FALSE(TerminalFallback::displayAnswers(nothing, 2000)) << nothing;
     EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(500));  // refused at once
-    EXPECT_FALSE(TerminalFallback::displayAnswers(tcp, 200));  // a proxy that accepts and never replies
-    ::close(::accept(listener, nullptr, nullptr));
-    std::thread server([&] {
-        const int c = ::accept(listener, nullptr, nullptr);
-        char request[12];
-        EXPECT_TRUE(::recv(c, request, sizeof request, MSG_WAITALL) == 12 && ::send(c, "\0", 1, 0) == 1);
-        ::close(c);
-    });
-    EXPECT_TRUE(TerminalFallback::displayAnswers(tcp, 2000));  // "failed" is a reply too
-    server.join();
+
+    // Setup replies: Success; Failed with its reason (length in byte 1, text from byte 8).
+    const std::string success("\x01\0\x0b\0\0\0\0\0", 8);
+    const std::string full = std::string("\0\x21\x0b\0\0\0\x09\0", 8) + "Maximum number of clients reached\0\0\0";
+    const struct {
+        const char* server;
+        std::vector<std::string> replies;  // one per connection; "" closes it without a reply
+        int timeoutMs;
+        bool answers;
+        std::string why;
+    } rows[] = {
+        {"lets the client in", {success}, 2000, true, ""},
+        {"is full", {full}, 2000, false, "refuses connections: Maximum number of clients reached"},
+        {"resets as its last client leaves", {"", "", success}, 2000, true, ""},
+        {"is a proxy with nothing behind it", {"", "", "", "", "", "", "", ""}, 300, false, "does not answer"},
+        {"never replies", {"never"}, 200, false, "does not answer"},
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.server);
+        std::thread server([&] {
+            for (const std::string& reply : row.replies) {
+                pollfd p{listener, POLLIN, 0};
+                if (::poll(&p, 1, 1000) != 1) return;
+                const int c = ::accept(listener, nullptr, nullptr);
+                char request[12];
+                EXPECT_EQ(::recv(c, request, sizeof request, MSG_WAITALL), 12);
+                if (reply == "never") ::poll(&p, 0, row.timeoutMs + 100);
+                else ::send(c, reply.data(), reply.size(), MSG_NOSIGNAL);
+                ::close(c);
+            }
+        });
+        std::string why;
+        int connection = -1;
+        EXPECT_EQ(TerminalFallback::displayAnswers(tcp, row.timeoutMs, &why, &connection), row.answers);
+        if (!row.answers) EXPECT_EQ(why, row.why);
+        EXPECT_EQ(connection >= 0, row.answers);  // the connection that answered is handed over
+        if (connection >= 0) ::close(connection);
+        server.join();
+    }
     ::close(listener);
+}
+
+TEST(TerminalView, TheStatusLineSaysWhatTheWindowSaysOfStaleValuesDropsAndAServiceNobodyRuns) {
+    vantorel::testing::FastMonitorClock::installed();
+    vantorel::testing::FakeTelephonyService service;
+    auto failed = Dictionary::create();
+    failed->set("State", "Failed");
+    failed->set("Problem", "device /dev/ttyUSB0: the device hung up");
+    auto dropped = Dictionary::create();
+    dropped->set("Dropped", Value::integer(1087244));
+    const std::string nobody = vantorel::testing::uniquePortName("nobody");
+    const struct {
+        const char* what;
+        std::string port;
+        std::function<void()> happen;
+        std::string says;
+    } rows[] = {
+        {"the modem hung up", service.name(), [&] { service.notify("BackendStateChanged", Value(failed)); },
+         "Vantorel - no data since "},
+        {"messages dropped", service.name(), [&] { service.notifyChannel("ChannelStatus", Value(dropped)); },
+         " \u00b7 1087244 messages dropped"},
+        {"a service nobody runs", nobody, [] {}, "Vantorel - Connecting... nothing serves port " + nobody + "; trying again"},
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.what);
+        std::FILE* out = std::tmpfile();
+        TerminalView view(out);
+        VantorelModel model(&view, row.port);
+        view.setModel(&model);
+        model.startMonitor();
+        if (model.isRunning()) {
+            service.send(RecordBuilder::ordinary(0xD0E0, 15).u8(13, 1).u8(14, 3).build());
+            ASSERT_TRUE(vantorel::testing::waitUntil([&] { return model.messagesDecoded() == 1; }));
+        }
+        row.happen();
+        ASSERT_TRUE(vantorel::testing::waitUntil([&] { return view.statusLine().find(row.says) != std::string::npos; }, 3000))
+            << view.statusLine();
+        vantorel::testing::spin(50);
+        std::string printed(1 << 16, '\0');  // the plain screens printed so far
+        std::rewind(out);
+        printed.resize(std::fread(printed.data(), 1, printed.size(), out));
+        EXPECT_NE(printed.find(row.says), std::string::npos) << printed;
+        std::fclose(out);
+    }
 }

@@ -85,6 +85,7 @@ class TestClient {
 public:
     std::vector<Bytes> received;
     std::vector<std::pair<std::string, Value>> notifications;
+    std::vector<Value> channelNotifications;  // on the channel port, whole
     TelephonyServiceConnection::LogChannelResult channel;
 
     // keepConnection: keep the server connection (for notifications) instead of releasing it as the model does.
@@ -104,6 +105,11 @@ public:
         channel = connection_->createLogChannel(recvName);
         if (!keepConnection) connection_.reset();
         send_ = RemoteMessagePort::lookup(channel.portName);
+        if (send_)
+            send_->setNotificationCallback([this](int32_t, const Bytes& data) {
+                const PropertyListResult parsed = PropertyListSerialization::readDictionary(data);
+                if (parsed) channelNotifications.push_back(*parsed.value);
+            });
         return channel.errorCode == 0 && send_ != nullptr;
     }
 
@@ -134,6 +140,17 @@ public:
             if (const DictionaryRef d = info.asDictionary(); d && name == "BackendStateChanged")
                 states.push_back(d->get("State").asString() ? *d->get("State").asString() : "?");
         return states;
+    }
+
+    // "Dropped" of the last ChannelStatus heard, if any.
+    std::optional<int64_t> dropped() const {
+        for (auto it = channelNotifications.rbegin(); it != channelNotifications.rend(); ++it) {
+            const DictionaryRef d = it->asDictionary();
+            const std::string* name = d ? d->get("Name").asString() : nullptr;
+            const DictionaryRef info = d ? d->get("Info").asDictionary() : nullptr;
+            if (name && *name == "ChannelStatus" && info) return info->get("Dropped").asInteger();
+        }
+        return std::nullopt;
     }
 
 private:

@@ -310,6 +310,10 @@ TEST(TelephonyService, AClientThatNeverReadsLosesItsOldestMessagesAndHoldsUpNoOt
     // 4 MiB: far more than the socket buffers, the high-water mark and the queue hold together.
     ASSERT_TRUE(waitUntil([&] { return reader.received.size() > 8 * records.size(); }, 8000));
     EXPECT_GT(service.counters().messagesDropped, 0u);
+    // The silent client is told on its channel port how many it lost; the reader, nothing.
+    ASSERT_TRUE(waitUntil([&] { return silent.dropped().value_or(0) > 0; }, 3000));
+    EXPECT_LE(static_cast<uint64_t>(*silent.dropped()), service.counters().messagesDropped);
+    EXPECT_FALSE(reader.dropped());
     for (size_t i = 1; i < reader.received.size(); ++i)  // the reader lost nothing
         ASSERT_EQ(reader.received[i], records[(i + (reader.received[0][13] | reader.received[0][14] << 8)) % records.size()]);
     ::close(fd);

@@ -113,6 +113,13 @@ void FakeTelephonyService::notify(const std::string& name, const Value& info) {
     onServiceThread([&] { if (server_) server_->broadcastNotification(0, xml(notification)); });
 }
 
+void FakeTelephonyService::notifyChannel(const std::string& name, const Value& info) {
+    auto notification = Dictionary::create();
+    notification->set("Name", name);
+    notification->set("Info", info);
+    onServiceThread([&] { if (!channels_.empty()) channels_.back()->broadcastNotification(0, xml(notification)); });
+}
+
 std::vector<Value> FakeTelephonyService::startCommands() const {
     std::lock_guard<std::mutex> lock(mutex_);
     return startCommands_;

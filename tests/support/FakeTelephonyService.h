@@ -51,6 +51,8 @@ public:
     // Pushes a notification to every server connection; its Info is `info` (the
     // backend's "State", "Source", "Sent", "Total", ...) or {"State": "Streaming"}.
     void notify(const std::string& name, const Value& info = Value());
+    // Pushes a notification {"Name": name, "Info": info} on the newest channel's port.
+    void notifyChannel(const std::string& name, const Value& info);
 
     int channelsCreated() const { return channelCount_.load(); }
     // The start commands received, as parsed dictionaries.
