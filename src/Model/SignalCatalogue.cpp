@@ -129,7 +129,7 @@ double SignalQuantity::convert(double shown) const {
 std::string SignalQuantity::unitLabel() const { return unit.empty() ? quantity : unit; }
 
 std::string SignalQuantity::reading(double value) const {
-    const std::string number = StringFormat::format("%.6g", value);
+    const std::string number = StringFormat::format("%.5g", value);
     if (!unit.empty()) return number + " " + unit;
     return quantity.empty() ? number : number + " (" + quantity + ")";
 }
