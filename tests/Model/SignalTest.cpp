@@ -96,7 +96,9 @@ TEST(SignalSampler, TakesUnitsAndScalesFromTheCatalogueNotFromTheDisplayStrings)
         const bool shown = SignalValue::parse(row.shown).has_value();
         EXPECT_EQ(sampler.lastRow().front(), shown ? std::optional<double>(row.value) : std::nullopt);
         ASSERT_EQ(sampler.quantity(row.key).has_value(), shown || !row.title.empty());
-        if (sampler.quantity(row.key)) EXPECT_EQ(sampler.quantity(row.key)->unitLabel(), row.unit);
+        if (sampler.quantity(row.key)) {
+            EXPECT_EQ(sampler.quantity(row.key)->unitLabel(), row.unit);
+        }
         EXPECT_EQ(sampler.columnTitle(row.key), row.title.empty() ? row.key : row.key + " " + row.title);
         // A CSV header given back as a key is the key.
         EXPECT_EQ(SignalCatalogue::keyOfColumn(sampler.columnTitle(row.key)), row.key);
