@@ -2,6 +2,7 @@
 #include "App/ListTableModel.h"
 
 #include "Model/DisplayPath.h"
+#include "Model/SignalCatalogue.h"
 #include "Model/SignalValue.h"
 
 #include <QSortFilterProxyModel>
@@ -48,9 +49,10 @@ QSortFilterProxyModel* ListTableModel::makeSortModel(QObject* parent) { return n
 
 ListTableModel::ListTableModel(QObject* parent) : QAbstractTableModel(parent) {}
 
-void ListTableModel::setList(NodeRef node) {
+void ListTableModel::setList(NodeRef node, const std::string& path) {
     beginResetModel();
     list_ = isList(node) ? std::move(node) : nullptr;
+    path_ = path;
     // Columns only ever grow: a key an entry lacks now keeps its column, so no column moves
     // between refreshes and a sort stays on its key.
     if (const std::vector<NodeRef>* entries = childrenOf(list_)) {
@@ -110,9 +112,19 @@ QVariant ListTableModel::data(const QModelIndex& index, int role) const {
 }
 
 QVariant ListTableModel::headerData(int section, Qt::Orientation orientation, int role) const {
+    if (orientation == Qt::Horizontal && section >= 0 && section < columnCount() &&
+        (role == Qt::DisplayRole || role == Qt::ToolTipRole)) {
+        // The unit from the catalogue: the display strings may carry another word ("Srxlev 22 dBm" is dB).
+        const std::optional<SignalQuantity> quantity =
+            path_.empty() ? std::nullopt : SignalCatalogue::find("", path_ + "/0/" + key(section));
+        if (!quantity) return QString::fromStdString(key(section));
+        if (role == Qt::ToolTipRole)
+            return QString::fromStdString(quantity->name + ": " + quantity->quantity +
+                                          (quantity->unit.empty() ? "" : ", " + quantity->unit));
+        return QString::fromStdString(SignalCatalogue::columnTitle(key(section), quantity));
+    }
     if (role != Qt::DisplayRole) return {};
-    if (orientation == Qt::Horizontal)
-        return section >= 0 && section < columnCount() ? QString::fromStdString(key(section)) : QVariant();
+    if (orientation == Qt::Horizontal) return QVariant();
     const NodeRef e = entry(section);
     return e ? QString::fromStdString(e->displayName()) : QVariant();
 }

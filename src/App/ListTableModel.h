@@ -13,7 +13,9 @@ class QSortFilterProxyModel;
 namespace vantorel {
 
 // One row per entry ("0", "1", ... in the tree), one column per leaf key: the union of the
-// keys of every list shown so far, in the order first seen. Nested dictionaries of an entry
+// keys of every list shown so far, in the order first seen. A column of a signal value
+// SignalCatalogue knows has its unit in the header ("Srxlev (dB)", "RSSI (level)"), the
+// cells keeping the display strings as the decoder wrote them. Nested dictionaries of an entry
 // are not columns: they are reached by drilling into the entry.
 class ListTableModel : public QAbstractTableModel {
     Q_OBJECT
@@ -27,8 +29,9 @@ public:
 
     explicit ListTableModel(QObject* parent = nullptr);
 
-    // Replaces the list (a reset); a node that is not a list gives an empty table.
-    void setList(NodeRef node);
+    // Replaces the list (a reset); a node that is not a list gives an empty table. `path`
+    // is the list's display path, which names the columns' quantities.
+    void setList(NodeRef node, const std::string& path = {});
     const NodeRef& list() const { return list_; }
     NodeRef entry(int row) const;
     const std::string& key(int column) const { return keys_.at(std::size_t(column)); }
@@ -46,6 +49,7 @@ private:
     const std::string* leaf(int row, const std::string& key) const;
 
     NodeRef list_;
+    std::string path_;
     std::vector<std::string> keys_;
 };
 

@@ -33,7 +33,7 @@ ListTableView::ListTableView(QWidget* parent)
     });
 }
 
-void ListTableView::setList(NodeRef node) {
+void ListTableView::setList(NodeRef node, const std::string& path) {
     const int current = currentEntry();
     const bool selected = current >= 0 && selectionModel()->isRowSelected(currentIndex().row(), QModelIndex());
     const std::string identity = current >= 0 ? model_->identity(current) : std::string();
@@ -42,7 +42,7 @@ void ListTableView::setList(NodeRef node) {
     std::vector<std::string> keys;
     for (int c = 0; c < model_->columnCount(); ++c) keys.push_back(model_->key(c));
 
-    model_->setList(std::move(node));
+    model_->setList(std::move(node), path);
 
     bool sameColumns = int(keys.size()) == model_->columnCount();
     for (int c = 0; sameColumns && c < model_->columnCount(); ++c) sameColumns = keys[std::size_t(c)] == model_->key(c);

@@ -20,8 +20,9 @@ public:
     QSortFilterProxyModel* sortModel() const { return sort_; }
 
     // Replaces the list. The current entry stays current (and selected, if it was) when an
-    // entry with the same identity is still there, wherever the refresh put it.
-    void setList(NodeRef node);
+    // entry with the same identity is still there, wherever the refresh put it. `path`: the
+    // list's display path (the columns' units).
+    void setList(NodeRef node, const std::string& path = {});
     // The entry (its row in the list, the tree's index) shown at a view index, or -1.
     int entryAt(const QModelIndex& index) const;
     int currentEntry() const { return entryAt(currentIndex()); }

@@ -1,4 +1,4 @@
-// SignalPlotWindow: Qt Charts lines of the sampler's series, one value axis per unit, a time axis scrolled by a scroll bar, marks as labelled vertical lines.
+// SignalPlotWindow: Qt Charts lines of the sampler's series, one value axis per unit (SignalCatalogue), a time axis scrolled by a scroll bar, marks as labelled vertical lines.
 #include "App/SignalPlotWindow.h"
 
 #include "Model/DisplayPath.h"
@@ -88,21 +88,23 @@ SignalPlotWindow::SignalPlotWindow(const SignalSampler& sampler, QWidget* parent
 
 SignalPlotWindow::~SignalPlotWindow() = default;
 
-QString SignalPlotWindow::labelOf(const std::string& key) const {
-    // A list entry picked by its cell or its rank is named by them: "Filtered RSRP (PCI 251)".
+namespace {
+
+// The key's name as the display shows it: a list entry picked by its cell or rank is named by
+// them ("Filtered RSRP (PCI 251)"); otherwise the last path component, with as many parents
+// as it takes to tell it from the other keys ("Filtered RSRP [2]" for a list's third entry,
+// "Parent › Name").
+QString displayLabel(const std::string& key, const std::vector<std::string>& keys) {
     if (key.find("/[") != std::string::npos) return QString::fromStdString(DisplayPath::label(key));
-    // Otherwise the key's last path component, with as many parents as it takes to tell two apart.
     auto tail = [](const std::string& path, int parts) {
         std::size_t at = path.size();
         for (int i = 0; i < parts && at != std::string::npos && at > 0; ++i) at = path.rfind('/', at - 1);
         return at == std::string::npos ? path : path.substr(at + 1);
     };
-    const std::vector<std::string> keys = sampler_.plotKeys();
     for (int parts = 1; parts < 6; ++parts) {
         const std::string mine = tail(key, parts);
         if (std::any_of(keys.begin(), keys.end(), [&](const std::string& k) { return k != key && tail(k, parts) == mine; }))
             continue;
-        // "Filtered RSRP [2]" for the third entry of a list, "Parent › Name" otherwise.
         QStringList names = QString::fromStdString(mine).split('/');
         const QString last = names.takeLast();
         QStringList shown;
@@ -118,20 +120,58 @@ QString SignalPlotWindow::labelOf(const std::string& key) const {
     return QString::fromStdString(key);
 }
 
-QValueAxis* SignalPlotWindow::axisFor(const std::string& unit) {
-    if (auto it = axes_.find(unit); it != axes_.end()) return it->second;
-    auto* axis = new QValueAxis;
-    axis->setTitleText(unit.empty() ? tr("value") : QString::fromStdString(unit));
-    axis->setLabelFormat("%.4g");
-    chart_->addAxis(axis, axes_.empty() ? Qt::AlignLeft : Qt::AlignRight);
-    axes_[unit] = axis;
-    return axis;
+// The same with the leaf's name replaced by the catalogue's short name ("RSSI" of the GSM
+// serving cell is "RxLev").
+QString namedLabel(const std::string& key, const std::vector<std::string>& keys, const std::optional<SignalQuantity>& quantity) {
+    QString label = displayLabel(key, keys);
+    if (!quantity || !quantity->catalogued()) return label;
+    const QString leaf = QString::fromStdString(SignalCatalogue::components(key).back());
+    const qsizetype at = label.lastIndexOf(leaf);
+    return at < 0 ? label : label.replace(at, leaf.size(), QString::fromStdString(quantity->name));
 }
 
-void SignalPlotWindow::addLine(const std::string& key, const std::string& unit) {
+}  // namespace
+
+QString SignalPlotWindow::labelOf(const std::string& key) const {
+    // The short name, unless another line would read the same (a serving cell's "RSRP" and a
+    // neighbour list's first "Filtered RSRP"): then the display's names.
+    const std::vector<std::string> keys = sampler_.plotKeys();
+    const QString named = namedLabel(key, keys, sampler_.quantity(key));
+    for (const std::string& other : keys)
+        if (other != key && namedLabel(other, keys, sampler_.quantity(other)) == named) return displayLabel(key, keys);
+    return named;
+}
+
+QValueAxis* SignalPlotWindow::axisFor(const SignalQuantity& quantity) {
+    Axis& slot = axes_[quantity.unitLabel()];
+    if (!slot.axis) {
+        slot.axis = new QValueAxis;
+        slot.axis->setLabelFormat("%.4g");
+        slot.unit = quantity.unit;
+        chart_->addAxis(slot.axis, axes_.size() == 1 ? Qt::AlignLeft : Qt::AlignRight);
+    }
+    // "received power, threshold (dBm)"; a key the catalogue does not hold adds its unit alone.
+    if (quantity.catalogued() &&
+        std::find(slot.quantities.begin(), slot.quantities.end(), quantity.quantity) == slot.quantities.end())
+        slot.quantities.push_back(quantity.quantity);
+    QStringList names;
+    for (const std::string& name : slot.quantities) names.append(QString::fromStdString(name));
+    const QString unit = QString::fromStdString(slot.unit);
+    QString title = names.join(QStringLiteral(", "));
+    if (!unit.isEmpty()) title = title.isEmpty() ? unit : title + " (" + unit + ")";
+    slot.axis->setTitleText(title.isEmpty() ? tr("value") : title);
+    return slot.axis;
+}
+
+QValueAxis* SignalPlotWindow::axisOf(const std::string& key) const {
+    auto it = lines_.find(key);
+    return it == lines_.end() ? nullptr : it->second.axis;
+}
+
+void SignalPlotWindow::addLine(const std::string& key, const SignalQuantity& quantity) {
     Line line;
-    line.unit = unit;
-    line.axis = axisFor(line.unit);
+    line.quantity = quantity;
+    line.axis = axisFor(quantity);
     line.label = labelOf(key);
     line.series = newSeries(line, true);
     // A neighbour cell's line is thinner than the serving cell's values.
@@ -149,13 +189,12 @@ QLineSeries* SignalPlotWindow::newSeries(const Line& line, bool inLegend) {
         for (QLegendMarker* marker : chart_->legend()->markers(series)) marker->setVisible(false);
     // Many cell lines share a colour and some have no legend entry: the pointer names the line.
     connect(series, &QLineSeries::hovered, this,
-            [label = line.label, unit = QString::fromStdString(line.unit)](const QPointF& point, bool entered) {
+            [label = line.label, quantity = line.quantity](const QPointF& point, bool entered) {
                 if (!entered) return QToolTip::hideText();
                 QToolTip::showText(QCursor::pos(),
-                                   QStringLiteral("%1\n%2 %3 at %4")
-                                       .arg(label)
-                                       .arg(point.y(), 0, 'g', 4)
-                                       .arg(unit, QDateTime::fromMSecsSinceEpoch(qint64(point.x())).toString("HH:mm:ss")));
+                                   QStringLiteral("%1\n%2 at %3")
+                                       .arg(label, QString::fromStdString(quantity.reading(point.y())),
+                                            QDateTime::fromMSecsSinceEpoch(qint64(point.x())).toString("HH:mm:ss")));
             });
     return series;
 }
@@ -174,9 +213,9 @@ void SignalPlotWindow::refresh() {
     for (const std::string& key : sampler_.plotKeys()) {
         const auto& points = series.points(key);
         if (points.empty()) continue;
-        // A line is made once its key shows a value, so that its unit can be read.
+        // A line is made once its key shows a value and what it is is known.
         if (!lines_.count(key))
-            if (const std::optional<std::string> unit = sampler_.unit(key)) addLine(key, *unit);
+            if (const std::optional<SignalQuantity> quantity = sampler_.quantity(key)) addLine(key, *quantity);
         first_ = std::min(first_, points.front().timeMs);
         last_ = std::max(last_, points.back().timeMs);
     }
@@ -261,9 +300,7 @@ void SignalPlotWindow::draw() {
         const bool drawn = std::any_of(pieces.begin(), pieces.end(), [](const QList<QPointF>& p) { return !p.isEmpty(); });
         const std::optional<double> latest = series.latest(key);
         legend.push_back({line.series, drawn, latest.has_value()});
-        const QString unit = QString::fromStdString(line.unit);
-        line.series->setName(latest ? QStringLiteral("%1  %2 %3").arg(line.label).arg(*latest, 0, 'g', 4).arg(unit)
-                                    : line.label);
+        line.series->setName(latest ? line.label + "  " + QString::fromStdString(line.quantity.reading(*latest)) : line.label);
     }
     // The legend lists the lines drawn in the span, each with its latest reading. When they
     // are more than its column holds, the lines that have no reading now (cells no longer
@@ -285,9 +322,9 @@ void SignalPlotWindow::draw() {
     }
 
     // The marks in the span: a vertical line on the first value axis, its text at the top.
-    QValueAxis* markAxis = axes_.empty() ? nullptr : axes_.begin()->second;
+    QValueAxis* markAxis = axes_.empty() ? nullptr : axes_.begin()->second.axis;
     for (const auto& [unit, axis] : axes_)
-        if (axis->alignment() == Qt::AlignLeft) markAxis = axis;
+        if (axis.axis->alignment() == Qt::AlignLeft) markAxis = axis.axis;
     shownMarks_ = 0;
     for (const SignalSeries::Mark& mark : series.marks()) {
         if (!markAxis || mark.timeMs < start_ || mark.timeMs > end) continue;
@@ -378,7 +415,9 @@ QLineSeries* SignalPlotWindow::seriesOf(const std::string& key) const {
 
 bool SignalPlotWindow::exportCsv(const QString& path, std::string* error) const {
     // The command line's CSV of the whole session; the file appears only once complete.
-    const std::string text = SignalCsvWriter(sampler_.keys(), false).fromSeries(sampler_.series());
+    std::vector<std::string> titles;
+    for (const std::string& key : sampler_.keys()) titles.push_back(sampler_.columnTitle(key));
+    const std::string text = SignalCsvWriter(sampler_.keys(), false, titles).fromSeries(sampler_.series());
     QSaveFile file(path);
     if (!file.open(QIODevice::WriteOnly) || file.write(text.data(), qint64(text.size())) != qint64(text.size()) ||
         !file.commit()) {

@@ -181,7 +181,7 @@ void VantorelPaneController::setShowsTable(bool shown) {
 
 void VantorelPaneController::updateListView() {
     const bool table = ListTableModel::isList(_nodes) && Preferences::ownBool(kListTablesPreference).value_or(false);
-    if (table) listView_->setList(_nodes);
+    if (table) listView_->setList(_nodes, _keyPath);
     if (tableItem_) tableItem_->setChecked(table);
     if (table == showsTable_) return;
     showsTable_ = table;

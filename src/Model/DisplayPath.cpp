@@ -192,6 +192,17 @@ std::string DisplayPath::label(const std::string& path) {
     return said.empty() ? leaf : leaf + " (" + said + ")";
 }
 
+std::string DisplayPath::cellOf(const std::string& path, const PathDictionary& nodes) {
+    const size_t open = path.rfind("/[");
+    const size_t close = open == std::string::npos ? std::string::npos : path.find(']', open);
+    if (close == std::string::npos) return {};
+    const NodeRef entry = resolve(path.substr(0, close + 1), nodes);
+    std::string said;
+    for (const std::string& key : identityKeys())
+        if (const std::string* value = leafOf(entry, key)) said += (said.empty() ? "" : ", ") + shortName(key) + " " + *value;
+    return said;
+}
+
 bool DisplayPath::isRanked(const std::string& path) { return path.find("/[#") != std::string::npos; }
 
 }  // namespace vantorel

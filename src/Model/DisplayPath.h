@@ -36,6 +36,9 @@ public:
     // Readable names: "Filtered RSRP (Physical Cell ID 251)", "Filtered RSRP (2nd strongest)",
     // "Filter RSCP (Status ASET)"; a path without selectors gives its last component.
     static std::string label(const std::string& path);
+    // The cell that the path's last selector picks now, in label words ("PCI 251, EARFCN
+    // 6300"); "" when it picks none or the entry has no identity leaves.
+    static std::string cellOf(const std::string& path, const PathDictionary& nodes);
     // True for a path with a rank selector ("[#n ...]").
     static bool isRanked(const std::string& path);
 };

@@ -135,16 +135,32 @@ std::optional<double> SignalSampler::valueAt(const std::string& key, const PathD
     return text ? SignalValue::parse(*text) : std::nullopt;
 }
 
-std::optional<std::string> SignalSampler::unitAt(const std::string& key, const PathDictionary& nodes) {
-    if (lastComponent(key) == kBlerPercent) return "%";
-    const std::string* text = DisplayPath::leafText(key, nodes);
-    if (!text || !SignalValue::parse(*text)) return std::nullopt;
-    return SignalValue::unit(*text);
+std::optional<double> SignalSampler::readingAt(const std::string& technology, const std::string& key,
+                                               const PathDictionary& nodes) {
+    const std::optional<double> shown = valueAt(key, nodes);
+    if (!shown) return std::nullopt;
+    // The display string picks the form of a leaf some records show with a unit and others without.
+    const std::string* text = lastComponent(key) == kBlerPercent ? nullptr : DisplayPath::leafText(key, nodes);
+    const std::optional<SignalQuantity> quantity = SignalCatalogue::find(technology, key, text);
+    return quantity ? quantity->convert(*shown) : *shown;
 }
 
-std::optional<std::string> SignalSampler::unit(const std::string& key) const {
-    const auto it = units_.find(key);
-    return it == units_.end() ? std::nullopt : std::optional<std::string>(it->second);
+std::optional<SignalQuantity> SignalSampler::quantityAt(const std::string& technology, const std::string& key,
+                                                        const PathDictionary& nodes) {
+    if (std::optional<SignalQuantity> quantity = SignalCatalogue::find(technology, key)) return quantity;
+    if (lastComponent(key) == kBlerPercent) return SignalQuantity{"BLER", "", "%"};
+    const std::string* text = DisplayPath::leafText(key, nodes);
+    if (!text || !SignalValue::parse(*text)) return std::nullopt;
+    return SignalQuantity{lastComponent(key), "", SignalValue::unit(*text)};
+}
+
+std::optional<SignalQuantity> SignalSampler::quantity(const std::string& key) const {
+    const auto it = quantities_.find(key);
+    return it == quantities_.end() ? std::nullopt : std::optional<SignalQuantity>(it->second);
+}
+
+std::string SignalSampler::columnTitle(const std::string& key) const {
+    return SignalCatalogue::columnTitle(key, quantity(key));
 }
 
 std::vector<std::string> SignalSampler::plotKeys() const {
@@ -178,14 +194,14 @@ void SignalSampler::sampleCells(int64_t timeMs, const PathDictionary& nodes) {
                                        [&](const std::string& a, const std::string& b) { return cellSeen_[a] < cellSeen_[b]; });
         series_.remove(*oldest);
         cellSeen_.erase(*oldest);
-        units_.erase(*oldest);
+        quantities_.erase(*oldest);
         cellKeys_.erase(oldest);
     }
     for (const std::string& key : cellKeys_) {
-        const std::optional<double> value = strongest.count(key) ? valueAt(key, nodes) : std::nullopt;
+        const std::optional<double> value = strongest.count(key) ? readingAt(technology_, key, nodes) : std::nullopt;
         series_.add(key, timeMs, value);
-        if (value && !units_.count(key))
-            if (const std::optional<std::string> unit = unitAt(key, nodes)) units_[key] = *unit;
+        if (value && !quantities_.count(key))
+            if (std::optional<SignalQuantity> quantity = quantityAt(technology_, key, nodes)) quantities_[key] = *quantity;
     }
 }
 
@@ -209,10 +225,11 @@ void SignalSampler::sample(int64_t timeMs, const std::string& technology, const 
     series_.addTick(timeMs);
     lastRow_.assign(keys_.size(), std::nullopt);
     for (size_t i = 0; i < keys_.size(); ++i) {
-        lastRow_[i] = valueAt(keys_[i], nodes);
+        lastRow_[i] = readingAt(technology, keys_[i], nodes);
         series_.add(keys_[i], timeMs, lastRow_[i]);
-        if (lastRow_[i] && !units_.count(keys_[i]))
-            if (const std::optional<std::string> unit = unitAt(keys_[i], nodes)) units_[keys_[i]] = *unit;
+        // A catalogued key is known before its first value (a CSV header names its unit).
+        if (!quantities_.count(keys_[i]))
+            if (std::optional<SignalQuantity> quantity = quantityAt(technology, keys_[i], nodes)) quantities_[keys_[i]] = *quantity;
     }
     sampleCells(timeMs, nodes);
 

@@ -1,6 +1,7 @@
 // SignalSampler: takes the plotted values from the display tree at every display tick and marks technology changes and handovers.
 #pragma once
 
+#include "Model/SignalCatalogue.h"
 #include "Model/SignalSeries.h"
 #include "Model/VantorelModelNode.h"
 
@@ -16,7 +17,9 @@ namespace vantorel {
 // The keys are display-tree paths, list selectors included (DisplayPath): the CSV columns and
 // sparklines. Each tick reads the leaf at each key (SignalValue::parse of its display string;
 // a missing leaf or a text without a number is a gap); a key ending in a derived leaf
-// ("BLER %") is computed from its siblings. Besides the keys, the strongest cells of the
+// ("BLER %") is computed from its siblings. What the number is comes from SignalCatalogue,
+// which also converts it (TD-SCDMA RSCP to dBm); a key the catalogue does not hold keeps
+// the number as shown, in the unit word its first value showed. Besides the keys, the strongest cells of the
 // technology's neighbour lists get a line each, keyed by the cell's identity
 // ("/Neighbours/Measured Neighbor Cells/[Physical Cell ID=251]/Filtered RSRP"), so a plot
 // shows a neighbour appear, rise and take over; a cell out of the strongest is a gap in its
@@ -57,13 +60,20 @@ public:
     void sample(int64_t timeMs, const std::string& technology, const PathDictionary& nodes);
     // The number a key shows in the tree now (derived leaves computed), or none.
     static std::optional<double> valueAt(const std::string& key, const PathDictionary& nodes);
-    // The unit of a key's value ("dBm", "%", "" for a bare number); none while the key is not
-    // in the tree, so that a plot can wait to put it on an axis.
-    static std::optional<std::string> unitAt(const std::string& key, const PathDictionary& nodes);
+    // The value of a key on a technology's display: valueAt converted as the catalogue says.
+    static std::optional<double> readingAt(const std::string& technology, const std::string& key,
+                                           const PathDictionary& nodes);
+    // What a key's value is: the catalogue's entry, or for a key it does not hold the unit
+    // word of the display string ("dBm", "%", "" for a bare number); none while such a key
+    // shows no number, so that a plot can wait to put it on an axis.
+    static std::optional<SignalQuantity> quantityAt(const std::string& technology, const std::string& key,
+                                                    const PathDictionary& nodes);
 
     const SignalSeries& series() const { return series_; }
-    // The unit a key's values showed ("dBm", "" for bare numbers), known from its first value on.
-    std::optional<std::string> unit(const std::string& key) const;
+    // What a key's values are, known from the first tick that told (quantityAt).
+    std::optional<SignalQuantity> quantity(const std::string& key) const;
+    // The CSV header of a key's column: with its unit when the catalogue knows it.
+    std::string columnTitle(const std::string& key) const;
     // The values of the last tick, one per key (for CSV rows and sparklines).
     const std::vector<std::optional<double>>& lastRow() const { return lastRow_; }
 
@@ -78,7 +88,7 @@ private:
     std::vector<std::string> identity_;  // empty until a tick showed all identity leaves
     std::vector<std::string> cellKeys_;  // the cell lines, first seen first
     std::map<std::string, int64_t> cellSeen_;  // cell line -> the last tick it was among the strongest
-    std::map<std::string, std::string> units_;  // key -> the unit its first value showed
+    std::map<std::string, SignalQuantity> quantities_;  // key -> what its values are
     std::set<std::string> defaults_;            // keys that came with a technology, not chosen
 };
 

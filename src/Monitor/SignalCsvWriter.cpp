@@ -10,8 +10,8 @@
 
 namespace vantorel {
 
-SignalCsvWriter::SignalCsvWriter(std::vector<std::string> keys, bool positionColumns)
-    : keys_(std::move(keys)), positionColumns_(positionColumns) {}
+SignalCsvWriter::SignalCsvWriter(std::vector<std::string> keys, bool positionColumns, std::vector<std::string> titles)
+    : keys_(std::move(keys)), titles_(std::move(titles)), positionColumns_(positionColumns) {}
 
 SignalCsvWriter::~SignalCsvWriter() {
     if (file_) std::fclose(file_);
@@ -36,7 +36,7 @@ std::string SignalCsvWriter::field(const std::string& text) {
 
 std::string SignalCsvWriter::header() const {
     std::string line = "time";
-    for (const std::string& key : keys_) line += "," + field(key);
+    for (size_t i = 0; i < keys_.size(); ++i) line += "," + field(i < titles_.size() ? titles_[i] : keys_[i]);
     if (positionColumns_) line += ",latitude,longitude,speed";
     return line + "\r\n";
 }

@@ -12,7 +12,8 @@
 namespace vantorel {
 
 // Columns: "time" (ISO 8601 UTC with milliseconds, "2015-08-01T02:11:40.985Z"), one per
-// key named by its display-tree path, then "latitude", "longitude", "speed" (degrees,
+// key named by its display-tree path (or the title given for it: the path with its unit,
+// SignalSampler::columnTitle), then "latitude", "longitude", "speed" (degrees,
 // degrees, metres per second) when asked for. Numbers are written in the "C" format
 // whatever the locale; a gap is an empty cell. Lines end in CRLF; a field holding a
 // comma, a quote or a line break is quoted, its quotes doubled.
@@ -24,7 +25,8 @@ public:
         std::optional<double> speed;  // m/s
     };
 
-    SignalCsvWriter(std::vector<std::string> keys, bool positionColumns);
+    // `titles`: the header's names of the keys' columns, in their order; the keys themselves when missing.
+    SignalCsvWriter(std::vector<std::string> keys, bool positionColumns, std::vector<std::string> titles = {});
     ~SignalCsvWriter();
     SignalCsvWriter(const SignalCsvWriter&) = delete;
     SignalCsvWriter& operator=(const SignalCsvWriter&) = delete;
@@ -52,6 +54,7 @@ public:
 
 private:
     std::vector<std::string> keys_;
+    std::vector<std::string> titles_;
     bool positionColumns_;
     std::FILE* file_ = nullptr;
     uint64_t rows_ = 0;

@@ -1,7 +1,8 @@
 // Sparkline: the last ticks' values of one display leaf drawn with the eight block characters.
 #include "Monitor/Sparkline.h"
 
-#include "Model/SignalValue.h"
+#include "Model/DisplayPath.h"
+#include "Model/SignalSampler.h"
 #include "Monitor/TerminalNavigator.h"
 #include "Platform/TerminalText.h"
 
@@ -14,8 +15,10 @@ namespace {
 
 const char* const kBars[] = {"▁", "▂", "▃", "▄", "▅", "▆", "▇", "█"};
 
-// "Measured RSRP"; below a list, the entry's index too ("0/Filtered RSRP").
+// "Measured RSRP"; below a list, the entry's index too ("0/Filtered RSRP"), or what its
+// selector says ("Filtered RSRP (PCI 251)", "Filtered RSRP (2nd strongest)").
 std::string shortName(const std::string& key) {
+    if (key.find("/[") != std::string::npos) return DisplayPath::label(key);
     const size_t last = key.rfind('/');
     if (last == std::string::npos || last == 0) return key.substr(last == 0 ? 1 : 0);
     const size_t before = key.rfind('/', last - 1);
@@ -28,12 +31,31 @@ std::string shortName(const std::string& key) {
 
 Sparkline::Sparkline(std::string key) : key_(std::move(key)), label_(shortName(key_)) {}
 
-void Sparkline::sample(const PathDictionary& nodes) {
-    auto it = nodes.find(key_);
-    const std::string* text = it == nodes.end() || !it->second ? nullptr : it->second->value();
+void Sparkline::sample(const PathDictionary& nodes, const std::string& technology) {
+    const std::string* text = DisplayPath::leafText(key_, nodes);
     latest_ = text ? std::optional(*text) : std::nullopt;
-    values_.push_back(text ? SignalValue::parse(*text) : std::nullopt);
+    values_.push_back(SignalSampler::readingAt(technology, key_, nodes));
     if (values_.size() > kTicks) values_.pop_front();
+    if (!quantity_ || !quantity_->catalogued()) quantity_ = SignalSampler::quantityAt(technology, key_, nodes);
+
+    // The leaf's name as the catalogue has it; a ranked entry also names the cell it is now.
+    std::string label = shortName(key_);
+    const std::string leaf = key_.substr(key_.rfind('/') + 1);
+    if (quantity_ && quantity_->catalogued()) {
+        const size_t at = key_.find("/[") != std::string::npos ? 0 : label.size() - std::min(label.size(), leaf.size());
+        if (label.compare(at, leaf.size(), leaf) == 0) label.replace(at, leaf.size(), quantity_->name);
+    }
+    // An entry by rank or by position also names the cell it is now ("RSRP (2nd strongest:
+    // PCI 78)", "0/RSRP (PCI 236)"); one by its cell says so already.
+    std::string cell;
+    if (DisplayPath::isRanked(key_))
+        cell = DisplayPath::cellOf(key_, nodes);
+    else if (key_.find("/[") == std::string::npos)
+        if (const std::string followed = DisplayPath::following(key_, nodes); followed != key_)
+            cell = DisplayPath::cellOf(followed, nodes);
+    if (!cell.empty())
+        label = label.back() == ')' ? label.substr(0, label.size() - 1) + ": " + cell + ")" : label + " (" + cell + ")";
+    label_ = label;
 }
 
 std::string Sparkline::bars(const std::deque<std::optional<double>>& values) {
@@ -57,7 +79,9 @@ std::string Sparkline::bars(const std::deque<std::optional<double>>& values) {
 }
 
 std::string Sparkline::line(int width) const {
-    const std::string latest = latest_ ? TerminalText::visible(*latest_) : "(not in the display)";
+    std::string latest = latest_ ? TerminalText::visible(*latest_) : "(not in the display)";
+    // The catalogue's unit, not the display string's ("36 (level)" for a GSM "36 dBm").
+    if (quantity_ && quantity_->catalogued() && !values_.empty() && values_.back()) latest = quantity_->reading(*values_.back());
     return TerminalNavigator::cut(TerminalText::visible(label_) + " " + bars(values_) + " " + latest, width);
 }
 

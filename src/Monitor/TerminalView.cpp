@@ -31,7 +31,8 @@ void TerminalView::setModel(VantorelModel* model) {
         connect(model, &VantorelModel::displayTicked, this, [this, model] {
             if (sparklines_.empty()) return;
             const PathDictionary& nodes = model->pathIndex();
-            for (Sparkline& s : sparklines_) s.sample(nodes);
+            const std::string technology = model->sourceStatus().decoderTechnology;
+            for (Sparkline& s : sparklines_) s.sample(nodes, technology);
         });
     model_ = model;
     if (!connectionTimer_) {

@@ -2,6 +2,7 @@
 #include "cli/SignalExport.h"
 
 #include "Model/DisplayPath.h"
+#include "Model/SignalCatalogue.h"
 #include "Monitor/GpsPosition.h"
 
 #include <QCommandLineParser>
@@ -35,8 +36,9 @@ std::vector<std::string> SignalExport::splitKeys(const QString& list) {
     std::vector<std::string> keys;
     QString key;
     int depth = 0;
+    // A column's CSV header names its key with the unit after it: the key is taken.
     auto flush = [&] {
-        if (!key.trimmed().isEmpty()) keys.push_back(key.trimmed().toStdString());
+        if (!key.trimmed().isEmpty()) keys.push_back(SignalCatalogue::keyOfColumn(key.trimmed().toStdString()));
         key.clear();
     };
     for (const QChar c : list) {
@@ -85,7 +87,9 @@ bool SignalExport::openWriter(const std::string& technology) {
     if (writer_) return !failed_;
     std::vector<std::string> keys = chosenKeys_.empty() ? SignalSampler::defaultKeys(technology) : chosenKeys_;
     if (chosenKeys_.empty()) sampler_.setKeys(keys);  // the columns stay those of the first technology
-    writer_ = std::make_unique<SignalCsvWriter>(std::move(keys), gps_);
+    std::vector<std::string> titles;
+    for (const std::string& key : keys) titles.push_back(SignalCatalogue::columnTitle(key, SignalCatalogue::find(technology, key)));
+    writer_ = std::make_unique<SignalCsvWriter>(std::move(keys), gps_, std::move(titles));
     failed_ = !writer_->open(path_, &error_);
     return !failed_;
 }

@@ -24,7 +24,8 @@ public:
     // `live`: watch (wall-clock rows, --gps); otherwise decode (recorded time).
     static void addOptions(QCommandLineParser& parser, bool live);
     // "K1,K2" → the keys; empty parts are dropped, spaces inside a key are kept, and so are
-    // commas inside a key's list selector ("[UARFCN=10055,Cell ID=11]").
+    // commas inside a key's list selector ("[UARFCN=10055,Cell ID=11]"); a CSV header's
+    // unit after a key ("... Measured RSRP (dBm)") is dropped.
     static std::vector<std::string> splitKeys(const QString& list);
 
     SignalExport();

@@ -1,6 +1,7 @@
 // WatchCommand: `vantorel-cli watch` runs the monitor with the terminal view as its application object.
 #include "cli/WatchCommand.h"
 
+#include "Model/SignalCatalogue.h"
 #include "Model/VantorelModel.h"
 #include "Platform/SystemLog.h"
 #include "Monitor/MonitorLauncher.h"
@@ -24,7 +25,10 @@ int WatchCommand::run(const QStringList& args) {
     SignalExport::addOptions(parser, true);
     parser.addOption({"plot",
                       "Draw a sparkline of the value at this display path (the last 40 display ticks) "
-                      "under the status line; repeat for several values.",
+                      "under the status line, with its latest value in its unit; repeat for several values. "
+                      "A list entry by its cell, \"/Neighbours/Measured Neighbor Cells/[Physical Cell "
+                      "ID=251]/Filtered RSRP\", by rank, \"[#2 Filtered RSRP]\", or by position, as in --csv-keys; "
+                      "a CSV header with its unit is taken too.",
                       "KEY"});
     parser.addOption({"verbose", "Mirror the system log to stderr."});
     parser.process(QStringList{"vantorel-cli watch"} + args);
@@ -42,7 +46,8 @@ int WatchCommand::run(const QStringList& args) {
         return 2;
     }
     std::vector<std::string> plots;
-    for (const QString& key : parser.values("plot")) plots.push_back(key.toStdString());
+    // One key per --plot, commas in it included; a CSV column's header is its key and unit.
+    for (const QString& key : parser.values("plot")) plots.push_back(SignalCatalogue::keyOfColumn(key.trimmed().toStdString()));
 
     const int code = TerminalView::run(*source, "vantorel-cli watch", plots, [&csv](VantorelModel& model) {
         if (!csv.enabled()) return;

@@ -145,3 +145,25 @@ TEST(ListTablePane, AClickOnTheTableToggleSurvivesTheStatusTickBetweenPressAndRe
     EXPECT_EQ(pane.statusLabel()->text(), "Updated at 12:00:01");
     Preferences::setDirectory("");
 }
+
+// The display strings keep the decoders' unit words; a column header says what the values are.
+TEST(ListTableModel, ASignalColumnHeaderCarriesTheCataloguesUnit) {
+    const struct {
+        const char *path, *leaf, *shown, *header;
+    } rows[] = {
+        {"/Neighbours/Neighbor Cells List", "Srxlev", "22 dBm", "Srxlev (dB)"},
+        {"/Neighbours/Neighbor Cells List", "Measured RSRP", "-102.00 dBm", "Measured RSRP (dBm)"},
+        {"/GSM Neighbours/Neighboring Cells", "RSSI", "23", "RSSI (level)"},
+        {"/Cell Sets/Active Set", "RSCP", "-81 dB", "RSCP (dBm)"},
+        {"/Neighbours/Neighbor Cells List", "Frequency Offset", "270", "Frequency Offset"},
+        {"", "Srxlev", "22 dBm", "Srxlev"},  // a list whose path is not known
+    };
+    for (const auto& row : rows) {
+        auto list = Array::create();
+        list->append(dict({{row.leaf, row.shown}}));
+        ListTableModel model;
+        model.setList(panetest::makeTree(dict({{"List", Value(list)}}))->childNodes()->front(), row.path);
+        EXPECT_EQ(model.headerData(0, Qt::Horizontal).toString(), row.header) << row.path;
+        EXPECT_EQ(model.data(model.index(0, 0)).toString(), row.shown) << "the cell keeps the display string";
+    }
+}

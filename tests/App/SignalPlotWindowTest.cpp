@@ -2,6 +2,7 @@
 #include "App/SignalPlotWindow.h"
 
 #include "Model/SignalSampler.h"
+#include "Platform/TelephonyIdentifiers.h"
 #include "PaneTestSupport.h"
 
 #include <QChart>
@@ -11,6 +12,7 @@
 #include <QLineSeries>
 #include <QScrollBar>
 #include <QTemporaryDir>
+#include <QValueAxis>
 #include <gtest/gtest.h>
 
 using namespace vantorel;
@@ -93,4 +95,59 @@ TEST(SignalPlotWindow, ACrowdedLegendKeepsTheLinesThatHaveAReadingNow) {
         if (k < 5) EXPECT_TRUE(visible) << keys[k];
     }
     EXPECT_EQ(listed, 5) << "the cells without a reading leave the legend";
+}
+
+// Axes and legend take units from the catalogue: LTE's Srxlev ("37 dBm" on the display) is a
+// dB margin beside RSRQ, not a power beside RSRP; GSM's "36 dBm" RSSI is RxLev, a level;
+// TD-SCDMA's RSCP fraction is drawn in dBm.
+TEST(SignalPlotWindow, PutsEachValueOnTheAxisOfItsCatalogueUnit) {
+    const struct {
+        const char* technology;
+        std::vector<std::pair<const char*, const char*>> leaves;  // under "/Serving Cell/M"
+        const char* key;
+        QString axis, legend;
+    } rows[] = {
+        {kTSLogChannelTechnology_Morvek_LTE,
+         {{"Measured RSRP", "-87.75 dBm"}, {"Measured RSRQ", "-12.50 dB"}, {"Srxlev", "37 dBm"}},
+         "/Serving Cell/Serving Cell Measurements/Srxlev", "signal quality, margin (dB)", "Srxlev  37 dB"},
+        {kTSLogChannelTechnology_Morvek_LTE, {{"Measured RSRP", "-87.75 dBm"}, {"Srxlev", "37 dBm"}},
+         "/Serving Cell/Serving Cell Measurements/Measured RSRP", "received power (dBm)", "RSRP  -87.75 dBm"},
+        {kTSLogChannelTechnology_Morvek_GSM, {{"RSSI", "36 dBm"}}, "/Serving Cell/GSM Serving Cell/RSSI", "level",
+         "RxLev  36 (level)"},
+        {kTSLogChannelTechnology_Morvek_UTRAN2, {{"Filter RSCP", "0.183594"}}, "/Neighbours/Neighbor Cell List/0/Filter RSCP",
+         "received power (dBm)", "RSCP  -69 dBm"},
+        {"", {{"Load", "40 %"}}, "/Cell/Load", "%", "Load  40 %"},  // not catalogued: the display's unit
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.key);
+        SignalSampler sampler;
+        std::vector<std::string> keys;
+        const std::string key = row.key;
+        const std::string parent = key.substr(0, key.rfind('/') + 1);
+        for (const auto& [name, value] : row.leaves) keys.push_back(parent + name);
+        sampler.setKeys(keys);
+        SignalPlotWindow plot(sampler);
+        // The tree: the key's parents as nested dictionaries holding the leaves.
+        auto leaves = Dictionary::create();
+        for (const auto& [name, value] : row.leaves) leaves->set(name, Value(value));
+        Value tree(leaves);
+        const QStringList names = QString::fromStdString(parent).split('/', Qt::SkipEmptyParts);
+        for (auto name = names.rbegin(); name != names.rend(); ++name) {
+            auto above = Dictionary::create();
+            above->set(name->toStdString(), tree);
+            tree = Value(above);
+        }
+        PathDictionary paths;
+        VantorelModelNode::makeTreeFromObject(tree, paths);
+        sampler.sample(1'700'000'000'000, row.technology, paths);
+        plot.refresh();
+        QLineSeries* line = plot.seriesOf(row.key);
+        ASSERT_TRUE(line);
+        QValueAxis* axis = nullptr;
+        for (QAbstractAxis* a : line->attachedAxes())
+            if (auto* value = qobject_cast<QValueAxis*>(a)) axis = value;
+        ASSERT_TRUE(axis);
+        EXPECT_EQ(axis->titleText(), row.axis);
+        EXPECT_EQ(line->name(), row.legend);
+    }
 }

@@ -1,4 +1,5 @@
 // Tests the signal series: numbers read from display strings, the bounded series, the sampler's marks, and its keys on every emulated modem's tree.
+#include "Model/SignalCatalogue.h"
 #include "Model/SignalSampler.h"
 #include "Model/SignalValue.h"
 
@@ -14,6 +15,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <set>
 #include <clocale>
 #include <memory>
 
@@ -41,6 +43,66 @@ TEST(SignalValue, TakesTheLeadingNumberWhateverTheLocale) {
         }
     }
     std::setlocale(LC_ALL, previous.c_str());
+}
+
+// The display tree of `leaves` (path, display string), list entries as "0", "1", ...
+PathDictionary treeOf(const std::vector<std::pair<std::string, std::string>>& leaves) {
+    auto top = Dictionary::create();
+    for (const auto& [path, text] : leaves) {
+        DictionaryRef at = top;
+        const std::vector<std::string> names = SignalCatalogue::components(path);
+        for (size_t i = 0; i + 1 < names.size(); ++i) {
+            if (!at->get(names[i]).isDictionary()) at->set(names[i], Value(Dictionary::create()));
+            at = at->get(names[i]).asDictionary();
+        }
+        at->set(names.back(), Value(text));
+    }
+    PathDictionary index;
+    VantorelModelNode::makeTreeFromObject(Value(top), index);
+    return index;
+}
+
+// The display strings say "dBm" for a GSM level and an LTE margin, "dB" for a UMTS power, and
+// nothing for TD-SCDMA's RSCP: the values, their units and the CSV headers come from the
+// catalogue; a key it does not hold keeps the display string's unit.
+TEST(SignalSampler, TakesUnitsAndScalesFromTheCatalogueNotFromTheDisplayStrings) {
+    const std::string lte = kTSLogChannelTechnology_Morvek_LTE, gsm = kTSLogChannelTechnology_Morvek_GSM;
+    const struct {
+        std::string technology, key, leaf, shown;
+        double value;
+        std::string unit, title;
+    } rows[] = {
+        {lte, "/Serving Cell/Serving Cell Measurements/Srxlev", "", "37 dBm", 37, "dB", "(dB)"},
+        {lte, "/Serving Cell/Serving Cell Measurements/Measured RSRP", "", "-87.75 dBm", -87.75, "dBm", "(dBm)"},
+        {lte, "/Neighbours/Neighbor Cells List/[#1 Srxlev]/Srxlev", "/Neighbours/Neighbor Cells List/0/Srxlev", "22 dBm", 22, "dB", "(dB)"},
+        {gsm, "/Serving Cell/GSM Serving Cell/RSSI", "", "36 dBm", 36, "level", "(level)"},
+        {gsm, "/Cell Sets/Active Set/0/RSCP", "", "-81 dB", -81, "dBm", "(dBm)"},
+        {gsm, "/GSM Neighbours/Neighboring Cells/0/RSSI", "", "23", 23, "level", "(level)"},
+        {gsm, "/GSM Neighbours/Neighboring Cells/0/RSSI", "", "-70 dBm", 40, "level", "(level)"},  // the cell monitor's form
+        {kTSLogChannelTechnology_Morvek_UTRAN2, "/Neighbours/Neighbor Cell List/[Status=ASET]/Filter RSCP",
+         "/Neighbours/Neighbor Cell List/0/Filter RSCP", "0.183594", -69, "dBm", "(dBm)"},
+        {kTSLogChannelTechnology_Morvek_CDMA, "/Data Rates/Forward Link", "", "153.60 kbps", 153.6, "kbit/s", "(kbit/s)"},
+        {kTSLogChannelTechnology_IFX, "/Serving Cell/Measurement/RxLev", "", "31", 31, "level", "(level)"},
+        {lte, "/Serving Cell/Serving Cell Info/Download Bandwidth", "", "10 MHz", 10, "MHz", ""},  // not catalogued
+        {lte, "/Serving Cell/Serving Cell Measurements/Srxlev", "", "Not Present", 0, "dB", "(dB)"},  // no value, still dB
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.key + " = " + row.shown);
+        std::vector<std::pair<std::string, std::string>> leaves = {{row.leaf.empty() ? row.key : row.leaf, row.shown}};
+        if (!row.leaf.empty()) leaves.push_back({row.leaf.substr(0, row.leaf.rfind('/')) + "/Status", "ASET"});
+        SignalSampler sampler;
+        sampler.setKeys({row.key});
+        sampler.sample(0, row.technology, treeOf(leaves));
+        const bool shown = SignalValue::parse(row.shown).has_value();
+        EXPECT_EQ(sampler.lastRow().front(), shown ? std::optional<double>(row.value) : std::nullopt);
+        ASSERT_EQ(sampler.quantity(row.key).has_value(), shown || !row.title.empty());
+        if (sampler.quantity(row.key)) {
+            EXPECT_EQ(sampler.quantity(row.key)->unitLabel(), row.unit);
+        }
+        EXPECT_EQ(sampler.columnTitle(row.key), row.title.empty() ? row.key : row.key + " " + row.title);
+        // A CSV header given back as a key is the key.
+        EXPECT_EQ(SignalCatalogue::keyOfColumn(sampler.columnTitle(row.key)), row.key);
+    }
 }
 
 size_t valuesOf(const std::deque<SignalSeries::Point>& points) {
@@ -137,13 +199,28 @@ TEST(SignalSampler, DefaultKeysExistInEachDecodersTree) {
         auto decoder = LogGenerator::generatorFromTechnology(technology);
         Dictionary state;
         SignalSampler sampler;
+        // The catalogue's paths, "*" for any one component, against the tree's.
+        std::set<std::string> unseen;
+        for (const SignalCatalogue::Entry& entry : SignalCatalogue::entries(technology)) unseen.insert(entry.path);
         for (uint64_t tick = 0; tick < 150; ++tick) {
             for (const Bytes& record : scenario->recordsForTick(tick)) decoder->updateState(state, record);
             DictionaryRef display = decoder->generateLogUsingState(state);
             PathDictionary index;
             VantorelModelNode::makeTreeFromObject(display ? Value(display) : Value(), index);
             sampler.sample(int64_t(tick) * 2000, technology, index);
+            for (const auto& [path, node] : index)
+                for (auto it = unseen.begin(); it != unseen.end();) {
+                    const auto want = SignalCatalogue::components(*it), have = SignalCatalogue::components(path);
+                    bool same = node->value() && want.size() == have.size();
+                    for (size_t i = 0; same && i < want.size(); ++i) same = want[i] == "*" || want[i] == have[i];
+                    it = same ? unseen.erase(it) : std::next(it);
+                }
         }
+        // Not leaves of the tree: a list the UTRAN decoder keeps empty, and the BLER the
+        // sampler computes from the CRC counts.
+        for (const char* never : {"/Neighbours/GSM Neighbor Cell List/*/RSSI", "/Link Quality/BLER/Transport Channels/*/BLER %"})
+            unseen.erase(never);
+        EXPECT_EQ(unseen, std::set<std::string>{}) << "catalogue paths no tick of the modem showed";
         ASSERT_FALSE(SignalSampler::defaultKeys(technology).empty());
         for (const std::string& key : SignalSampler::defaultKeys(technology))
             EXPECT_FALSE(sampler.series().points(key).empty()) << key;

@@ -3,6 +3,9 @@
 #include "Monitor/SignalCsvWriter.h"
 #include "Monitor/Sparkline.h"
 
+#include "PropertyList/Array.h"
+#include "PropertyList/Dictionary.h"
+
 #include "support/EventLoopWait.h"
 
 #include <QElapsedTimer>
@@ -65,4 +68,44 @@ TEST(Sparkline, BarsSpanTheRangeShownWithGapsAsSpaces) {
         {{0, 1, 2, 3, 4, 5, 6, 7}, "▁▂▃▄▅▆▇█"}, {{-1e308, 1e308}, "▁█"},
     };
     for (const auto& [values, bars] : rows) EXPECT_EQ(Sparkline::bars(values), bars);
+}
+
+// --plot takes the keys --csv-keys takes: a list entry by its cell, its rank or its position,
+// each line naming its cell, with the value in the catalogue's unit (Srxlev is dB, whatever
+// its display string says).
+TEST(Sparkline, FollowsSelectedCellsNamesThemAndShowsTheCataloguesUnit) {
+    auto cell = [](const char* pci, const char* rsrp) {
+        auto entry = Dictionary::create();
+        entry->set("Physical Cell ID", Value(pci));
+        entry->set("Filtered RSRP", Value(rsrp));
+        return Value(entry);
+    };
+    auto cells = Array::create();
+    cells->append(cell("251", "-104.00 dBm"));
+    cells->append(cell("17", "-98.50 dBm"));
+    auto neighbours = Dictionary::create(), serving = Dictionary::create(),
+         measurements = Dictionary::create(), top = Dictionary::create();
+    neighbours->set("Measured Neighbor Cells", Value(cells));
+    measurements->set("Srxlev", Value("12 dBm"));
+    serving->set("Serving Cell Measurements", Value(measurements));
+    top->set("Neighbours", Value(neighbours));
+    top->set("Serving Cell", Value(serving));
+    PathDictionary nodes;
+    VantorelModelNode::makeTreeFromObject(Value(top), nodes);
+
+    const std::string list = "/Neighbours/Measured Neighbor Cells/";
+    const std::pair<std::string, std::string> rows[] = {
+        {list + "[Physical Cell ID=251]/Filtered RSRP", "RSRP (PCI 251) ▄ -104 dBm"},
+        {list + "[Physical Cell ID=17]/Filtered RSRP", "RSRP (PCI 17) ▄ -98.5 dBm"},
+        {list + "[#1 Filtered RSRP]/Filtered RSRP", "RSRP (strongest: PCI 17) ▄ -98.5 dBm"},
+        {list + "[#2 Filtered RSRP]/Physical Cell ID", "Physical Cell ID (2nd strongest: PCI 251) ▄ 251"},
+        {list + "0/Filtered RSRP", "0/RSRP (PCI 251) ▄ -104 dBm"},
+        {list + "[Physical Cell ID=99]/Filtered RSRP", "RSRP (PCI 99)   (not in the display)"},
+        {"/Serving Cell/Serving Cell Measurements/Srxlev", "Srxlev ▄ 12 dB"},
+    };
+    for (const auto& [key, line] : rows) {
+        Sparkline sparkline(key);
+        sparkline.sample(nodes);
+        EXPECT_EQ(sparkline.line(200), line) << key;
+    }
 }

@@ -32,9 +32,9 @@ TEST(SignalCsv, AReplayGivesOneRowPerRecordedTickWithTheSignalColumns) {
     ASSERT_EQ(run.code, 0) << run.err;
     const QStringList lines = csvLines(out);
     ASSERT_GT(lines.size(), 1000);  // 2 h 48 min of recording with gaps
-    // The serving cell's identity first, then the values.
+    // The serving cell's identity first, then the values with their units.
     EXPECT_TRUE(lines[0].startsWith("time,/Serving Cell/Serving Cell Info/Physical Cell ID,/Serving Cell/Serving Cell "
-                                    "Info/Download Frequency,/Serving Cell/Serving Cell Measurements/Measured RSRP,"))
+                                    "Info/Download Frequency,/Serving Cell/Serving Cell Measurements/Measured RSRP (dBm),"))
         << lines[0].toStdString();
     EXPECT_TRUE(lines.filter(QRegularExpression("^[^,]*,337,37900,")).size() > 100) << "the cell each row is of";
     const qsizetype columns = lines[0].count(',');
@@ -50,14 +50,15 @@ TEST(SignalCsv, AReplayGivesOneRowPerRecordedTickWithTheSignalColumns) {
     }
     EXPECT_EQ(lines[1].section(',', 0, 0), "2015-08-01T02:11:42.985Z");
 
-    // A capture with measurements fills the RSRP column; chosen keys replace the defaults.
+    // A capture with measurements fills the RSRP column; chosen keys replace the defaults, a
+    // header copied from a CSV (the key and its unit) names its key.
     const QString measured = dir.filePath("measured.csv");
     run = decode({"--technology", "lte", "--csv", measured, "--csv-keys",
-                  "/Serving Cell/Serving Cell Measurements/Measured RSRP, /No Such/[A=1,B=2]/Key",
+                  "/Serving Cell/Serving Cell Measurements/Measured RSRP (dBm), /No Such/[A=1,B=2]/Key",
                   kCaptures + "/offline_log_example.mi2log"});
     ASSERT_EQ(run.code, 0) << run.err;
     EXPECT_EQ(csvLines(measured),
-              (QStringList{"time,/Serving Cell/Serving Cell Measurements/Measured RSRP,\"/No Such/[A=1,B=2]/Key\"",
+              (QStringList{"time,/Serving Cell/Serving Cell Measurements/Measured RSRP (dBm),\"/No Such/[A=1,B=2]/Key\"",
                            "2016-03-23T21:55:50.881Z,-96.56,"}));
     EXPECT_NE(run.err.find("--csv-keys (their columns are empty):\n  /No Such/[A=1,B=2]/Key\n"), std::string::npos) << run.err;
 }
