@@ -18,19 +18,30 @@
 namespace {
 
 // Reads the options with `app` (a QCoreApplication or QApplication); prints the
-// problem and gives nothing on bad use.
-std::optional<vantorel::MonitorLauncher::Source> parseOptions(QCoreApplication& app, QCommandLineParser& parser) {
+// problem and gives nothing on bad use (exit code 2), or the help and exit code 0.
+std::optional<vantorel::MonitorLauncher::Source> parseOptions(QCoreApplication& app, QCommandLineParser& parser,
+                                                              int* exitCode) {
     QCoreApplication::setApplicationName("vantorel");
     parser.setApplicationDescription(
         "Vantorel: watch, live, what a cellular modem reports, as drill-down panes.\n"
         "Without a source, the built-in modem emulator runs in-process (UTRAN).\n"
         "Keys: arrows move, Enter drills down, Backspace or Alt+Left goes back\n"
         "(in the terminal view also PgUp/PgDn to scroll and q to quit).");
-    parser.addHelpOption();
+    const QCommandLineOption helpOption = parser.addHelpOption();
     vantorel::MonitorLauncher::addOptions(parser);
     parser.addOption({"allow-save", "Offer the snapshot save button (also: AllowSaveButton in the settings)."});
     parser.addOption({"verbose", "Mirror the system log to stderr."});
-    parser.process(app);
+    // parse(), not process(): a usage error is exit code 2, as in vantorel-cli.
+    *exitCode = 2;
+    if (!parser.parse(app.arguments())) {
+        std::fprintf(stderr, "vantorel: %s (see --help)\n", qPrintable(parser.errorText()));
+        return std::nullopt;
+    }
+    if (parser.isSet(helpOption) || parser.isSet("help-all")) {
+        std::fputs(qPrintable(parser.helpText()), stdout);
+        *exitCode = 0;
+        return std::nullopt;
+    }
     vantorel::SystemLog::setMirrorToStderr(parser.isSet("verbose"));
     std::string error;
     auto source = vantorel::MonitorLauncher::sourceFrom(parser, &error);
@@ -47,8 +58,9 @@ int main(int argc, char** argv) {
     TerminalFallback display;
     if (const auto why = display.check()) {
         QCoreApplication app(argc, argv);
-        auto source = parseOptions(app, parser);
-        if (!source) return 2;
+        int exitCode = 0;
+        auto source = parseOptions(app, parser, &exitCode);
+        if (!source) return exitCode;
         std::fprintf(stderr, "vantorel: %s: showing the terminal view\n", why->c_str());
         return TerminalView::run(*source, "vantorel");
     }
@@ -62,8 +74,9 @@ int main(int argc, char** argv) {
     QApplication app(argc, argv);
     if (fallbackPlatform) qunsetenv("QT_QPA_PLATFORM");
     display.release();
-    auto source = parseOptions(app, parser);
-    if (!source) return 2;
+    int exitCode = 0;
+    auto source = parseOptions(app, parser, &exitCode);
+    if (!source) return exitCode;
     if (fallbackPlatform && QGuiApplication::platformName() != QStringLiteral("xcb")) {
         std::fprintf(stderr, "vantorel: display %s refused the window's connection: showing the terminal view\n",
                      TerminalText::visible(qgetenv("DISPLAY").toStdString()).c_str());

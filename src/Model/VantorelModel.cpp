@@ -117,9 +117,36 @@ void VantorelModel::destroyPorts() {
 }
 
 std::optional<Bytes> VantorelModel::receiveCallback(int32_t messageId, const Bytes& data) {
+    if (messageId == TelephonyServiceConnection::kDisplayTickMessageId) {
+        recordedTick(data);
+        return std::nullopt;
+    }
     if (messageId != 0) return std::nullopt;
+    // The first data of a run is shown at once, not at the next tick of the display timer.
+    if (messagesThisRun_++ == 0) QMetaObject::invokeMethod(this, [this] { refresh(false); }, Qt::QueuedConnection);
     updateWithData(data);  // whole and unchanged
     return std::nullopt;
+}
+
+// A replay marks the display ticks of its recording: from the first one on, they are
+// the ticks observers sample (at any replay speed, one per recorded tick that brought
+// messages, whether or not this decoder reads them, as `decode --csv` does), stamped with
+// the recorded time; the display timer goes on redrawing the view at its own pace.
+void VantorelModel::recordedTick(const Bytes& data) {
+    recordedTicks_ = true;
+    if (data.size() == 8) {
+        uint64_t bits = 0;
+        for (size_t i = 0; i < 8; ++i) bits |= uint64_t{data[i]} << (8 * i);
+        recordedTickMs_ = static_cast<int64_t>(bits);
+    }
+    if (_updated) {
+        _nodes.reset();
+        _nodesByPath.clear();
+        _updated = false;
+        viewStale_ = true;
+    }
+    newSinceTick_ = false;
+    emit displayTicked();
 }
 
 void VantorelModel::invalidationCallback(LocalMessagePort* port) {
@@ -176,9 +203,26 @@ void VantorelModel::readBackendState(const Value& info) {
     const std::string* identifier = technology ? technology->asString() : nullptr;
     if (identifier && _logGenerator && *identifier != status_.decoderTechnology &&
         TechnologyNames::shortName(*identifier) != *identifier) {
-        SystemLog::log(SystemLog::kNotice, "The modem is now on %s: restarting with its decoder", identifier->c_str());
-        QMetaObject::invokeMethod(this, [this] { restartMonitor(); }, Qt::QueuedConnection);
+        SystemLog::log(SystemLog::kNotice, "The modem is now on %s: switching to its decoder", identifier->c_str());
+        switchDecoder(*identifier);
     }
+}
+
+// On the same channel: closing it would stop a replay, which the next channel would
+// start over in its first technology.
+void VantorelModel::switchDecoder(const std::string& technology) {
+    std::unique_ptr<LogGenerator> chosen = LogGenerator::generatorFromTechnology(technology);
+    DictionaryRef command = chosen ? chosen->getStartCommand() : nullptr;
+    std::optional<Bytes> xml =
+        command ? PropertyListSerialization::write(Value(command), PropertyListSerialization::Format::XML) : std::nullopt;
+    if (!xml || !_sendPort || _sendPort->sendRequest(0, *xml, kRequestTimeoutSeconds, 0, nullptr) != 0) {
+        QMetaObject::invokeMethod(this, [this] { restartMonitor(); }, Qt::QueuedConnection);
+        return;
+    }
+    LogGenerator::forgetDisplay(*_state);
+    status_.decoderTechnology = technology;
+    _logGenerator = std::move(chosen);
+    _updated = true;
 }
 
 void VantorelModel::setSource(std::string description, bool isReplay, bool authoritative) {
@@ -230,6 +274,7 @@ SourceStatus VantorelModel::sourceStatus() const {
 }
 
 int64_t VantorelModel::tickTimeMs() const {
+    if (recordedTickMs_) return *recordedTickMs_;
     if (status_.isReplay && status_.recordedAt.isValid()) return status_.recordedAt.toMSecsSinceEpoch();
     return std::chrono::duration_cast<std::chrono::milliseconds>(MonitorClock::current().now().time_since_epoch()).count();
 }
@@ -290,7 +335,7 @@ void VantorelModel::startMonitor() {
     SystemLog::log(SystemLog::kError, "Starting the display update timer");
     _displayUpdateTimer = new QTimer(this);
     _displayUpdateTimer->setInterval(MonitorClock::current().displayUpdateInterval());
-    connect(_displayUpdateTimer, &QTimer::timeout, this, [this] { refresh(); });
+    connect(_displayUpdateTimer, &QTimer::timeout, this, [this] { refresh(!recordedTicks_); });
     _displayUpdateTimer->start();
     // Back from a lost channel: the stale mark goes at the next tick, data or not.
     if (status_.phase == SourceStatus::Phase::Disconnected || !status_.connectProblem.empty()) statusChanged_ = true;
@@ -298,6 +343,9 @@ void VantorelModel::startMonitor() {
     status_.connectProblem.clear();
     failedStarts_ = 0;
     streamingSince_ = lastActivity_ = MonitorClock::current().now();
+    messagesThisRun_ = 0;
+    recordedTicks_ = false;
+    recordedTickMs_.reset();
 }
 
 void VantorelModel::restartMonitor() {
@@ -364,8 +412,9 @@ void VantorelModel::refresh(bool displayTick) {
         _nodesByPath.clear();
         newSinceTick_ = true;
     }
-    const bool changed = _updated || statusChanged_;
+    const bool changed = _updated || statusChanged_ || viewStale_;
     _updated = false;
+    viewStale_ = false;
     statusChanged_ = false;
     // Samples are taken on the timer's ticks only, so they come at its pace whatever the
     // service's notifications show in between.

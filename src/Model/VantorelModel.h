@@ -11,6 +11,7 @@
 #include <chrono>
 #include <functional>
 #include <memory>
+#include <optional>
 #include <string>
 
 class QTimer;
@@ -79,7 +80,8 @@ public:
     void setSource(std::string description, bool isReplay, bool authoritative);
     SourceStatus sourceStatus() const;
     // The time a display tick stands for, in ms since 1970: for a replay, the recorded time
-    // of its last message as the service last told it; the wall clock otherwise.
+    // of the tick it marked (or of its last message as the service last told it); the
+    // wall clock otherwise.
     int64_t tickTimeMs() const;
 
 signals:
@@ -99,6 +101,8 @@ private:
     void readBackendState(const Value& info);
     // The channel port's notifications: the records the service dropped for us.
     void channelNotificationCallback(const Bytes& data);
+    void recordedTick(const Bytes& data);
+    void switchDecoder(const std::string& technology);
     bool noRecordForDecoder() const;
     bool frozen() const;
     void tellApplication();
@@ -131,6 +135,10 @@ private:
     bool sourceFixed_ = false;
     bool statusChanged_ = false;
     bool newSinceTick_ = false;  // data shown since the last display tick's displayTicked
+    uint64_t messagesThisRun_ = 0;         // since the channel started streaming
+    bool recordedTicks_ = false;           // the replay marks the display ticks
+    std::optional<int64_t> recordedTickMs_;  // the last one's recorded time
+    bool viewStale_ = false;               // a recorded tick took new data the view has not shown
     std::chrono::system_clock::time_point streamingSince_;
     std::chrono::system_clock::time_point lastData_;      // the last record; epoch before any
     std::chrono::system_clock::time_point lastActivity_;  // the last record or progress of the service

@@ -49,8 +49,8 @@ void MonitorLauncher::addOptions(QCommandLineParser& parser) {
                       "PATH"});
     parser.addOption({"service", "Watch a running vantorel-telephonyd listening on port NAME.", "NAME"});
     parser.addOption({"technology",
-                      "Technology of a replayed file that does not carry one, or of the --device modem\n"
-                      "(default: learnt from its serving-cell records) (" + techs + ").",
+                      "Technology of a replay or of the --device modem (default: learnt from the\n"
+                      "serving-cell records, following the modem when it moves) (" + techs + ").",
                       "TECH"});
     parser.addOption({"speed", "Replay pace: 1 = as recorded, 2 = twice as fast, 0 = as fast as taken.", "X", "1"});
     parser.addOption({"loop", "Start the replay again at its end."});

@@ -23,7 +23,7 @@ public:
         std::string replay;      // --replay FILE
         std::string service;     // --service NAME: a running vantorel-telephonyd
         std::string device;      // --device PATH: a modem's DIAG port (tty, character device, tcp:HOST:PORT)
-        std::string technology;  // --technology TECH (replays of files that carry none)
+        std::string technology;  // --technology TECH (else the serving-cell records tell)
         double speed = 1.0;
         bool loop = false;
     };

@@ -13,6 +13,11 @@ class RemoteMessagePort;
 
 class TelephonyServiceConnection {
 public:
+    // On a client's receive port: message id 0 is a record; this id marks a replay's
+    // display tick on its recorded time, in order with the records (data: the tick's
+    // time, s64 LE ms since 1970; empty for a stream without times).
+    static constexpr int32_t kDisplayTickMessageId = 2;
+
     // A notification's name ("BackendStateChanged", ...) and its info dictionary.
     using NotificationCallback = std::function<void(const std::string& name, const Value& info)>;
 

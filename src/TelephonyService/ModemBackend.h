@@ -74,6 +74,9 @@ signals:
     void stateChanged(vantorel::ModemBackend::State state);
     // technology() now answers differently (a modem that moved to another radio technology).
     void technologyChanged();
+    // A replay's display tick on its recorded time (RecordedTicks): the messages emitted
+    // since the last one make up the display at recordedMs (none: the stream has no times).
+    void displayTick(std::optional<int64_t> recordedMs);
     // A line for the service's status output ("device ...: 12 log codes enabled").
     void statusLine(const std::string& line);
 

@@ -2,6 +2,7 @@
 #include "TelephonyService/ReplayBackend.h"
 
 #include "Platform/StringFormat.h"
+#include "TelephonyService/LogMask.h"
 
 #include <algorithm>
 #include <cmath>
@@ -11,6 +12,8 @@ namespace vantorel {
 
 ReplayBackend::ReplayBackend(RecordedStream stream, double speed, bool loop, std::string name, QObject* parent)
     : ModemBackend(parent), stream_(std::move(stream)), speed_(std::max(0.0, speed)), loop_(loop), name_(std::move(name)) {
+    technology_ = stream_.technology();
+    nextSpan_ = 1;
     timer_.setSingleShot(true);
     timer_.setTimerType(Qt::PreciseTimer);
     connect(&timer_, &QTimer::timeout, this, &ReplayBackend::run);
@@ -19,7 +22,7 @@ ReplayBackend::ReplayBackend(RecordedStream stream, double speed, bool loop, std
 ReplayBackend::~ReplayBackend() = default;
 
 std::string ReplayBackend::technology() const {
-    return stream_.technology();
+    return technology_;
 }
 
 std::string ReplayBackend::description() const {
@@ -40,12 +43,36 @@ std::optional<int64_t> ReplayBackend::recordedTime() const {
 
 void ReplayBackend::start() {
     if (state() == State::Streaming) return;
-    index_ = 0;
+    rewind();
+    ticks_ = RecordedTicks();
     lastTime_ = 0;
     clock_.start();
     dueMicros_ = 0;
     setState(State::Streaming);
     schedule();
+}
+
+void ReplayBackend::rewind() {
+    index_ = 0;
+    wantedSent_ = false;
+    nextSpan_ = 1;
+    const std::string first = stream_.technology();
+    if (first != technology_) {
+        technology_ = first;
+        emit technologyChanged();
+    }
+}
+
+void ReplayBackend::endPass() {
+    if (const auto tick = ticks_.end()) emit displayTick(tick->timeMs);
+}
+
+bool ReplayBackend::wanted(const TimedMessage& message) const {
+    // No client (a recording alone) or one that takes everything: the pace holds from the start.
+    if (!codes_ || codes_->empty()) return true;
+    const auto record = LogMask::classify(message.data);
+    if (!record) return true;  // what no decoder can classify goes to every client
+    return record->isOrdinary() && codes_->count(record->code) > 0;
 }
 
 void ReplayBackend::stop() {
@@ -65,7 +92,7 @@ void ReplayBackend::pausedChanged() {
 }
 
 double ReplayBackend::gapBefore(size_t i) const {
-    if (speed_ == 0 || i == 0) return 0;
+    if (speed_ == 0 || i == 0 || !wantedSent_) return 0;
     const auto& messages = stream_.messages();
     // Differences of garbage time stamps can overflow: compare before subtracting.
     const int64_t later = messages[i].timeMicros;
@@ -87,21 +114,37 @@ void ReplayBackend::schedule() {
 void ReplayBackend::run() {
     if (state() != State::Streaming || isPaused()) return;
     const auto& messages = stream_.messages();
+    const auto& spans = stream_.technologySpans();
     size_t sent = 0;
     while (sent < kBatch) {
         if (index_ >= messages.size()) {
+            endPass();
             if (!loop_ || messages.empty()) {
                 setState(State::Finished);
                 return;
             }
-            index_ = 0;  // the next pass follows at once
+            rewind();  // the next pass follows at once
+            if (state() != State::Streaming || isPaused()) return;
         }
         const double now = static_cast<double>(clock_.nsecsElapsed()) / 1000.0;
         if (dueMicros_ > now) break;
-        const TimedMessage& message = messages[index_++];
+        const TimedMessage& message = messages[index_];
+        if (const auto tick = ticks_.before(message.timeMicros)) {
+            emit displayTick(tick->timeMs);
+            if (state() != State::Streaming || isPaused()) return;
+        }
+        // The modem moved: clients switch decoders before its first record there.
+        if (nextSpan_ < spans.size() && spans[nextSpan_].from <= index_) {
+            technology_ = spans[nextSpan_++].technology;
+            emit technologyChanged();
+            if (state() != State::Streaming || isPaused()) return;
+        }
+        ++index_;
+        wantedSent_ = wantedSent_ || wanted(message);
         if (index_ < messages.size()) dueMicros_ += gapBefore(index_);
         ++sent;
         lastTime_ = message.timeMicros;
+        ticks_.after();
         emitMessage(message.messageId, message.data);
         // A slot may have paused or stopped us between two messages.
         if (state() != State::Streaming || isPaused()) return;

@@ -106,14 +106,16 @@ std::unique_ptr<ModemBackend> TelephonyService::createBackend(const TelephonySer
         return fail(StringFormat::format("speed %g: give 0 (as fast as the client takes it) or more", options.speed));
     RecordedStream stream = RecordedStream::open(options.replay, technology);
     if (!stream.ok()) return fail(stream.error());
+    if (!stream.holdsRecords())
+        return fail(StringFormat::format("%s: no record in it (read as %s)", options.replay.c_str(), stream.formatName()));
     if (stream.technology().empty())
         return fail(StringFormat::format(
-            "%s is a %s file, which does not say which modem recorded it: --technology TECH is needed (names: %s)",
-            options.replay.c_str(), stream.formatName(), TechnologyNames::listing().c_str()));
-    if (stream.technologyFromFile() && !technology.empty() && technology != stream.technology())
+            "%s: no serving-cell record tells which modem recorded it: --technology TECH is needed (names: %s)",
+            options.replay.c_str(), TechnologyNames::listing().c_str()));
+    if (!technology.empty() && !stream.declaredTechnology().empty() && technology != stream.declaredTechnology())
         SystemLog::log(SystemLog::kWarning, "Telephony service: --technology %s ignored, the capture %s says %s",
                        options.technology.c_str(), options.replay.c_str(),
-                       TechnologyNames::displayName(stream.technology()).c_str());
+                       TechnologyNames::displayName(stream.declaredTechnology()).c_str());
     const std::string name = QFileInfo(QString::fromStdString(options.replay)).fileName().toStdString();
     return std::make_unique<ReplayBackend>(std::move(stream), options.speed, options.loop, name);
 }
@@ -207,6 +209,7 @@ bool TelephonyService::start(std::string* error) {
     connect(backend_.get(), &ModemBackend::stateChanged, this, &TelephonyService::backendStateChanged);
     connect(backend_.get(), &ModemBackend::statusLine, this, &TelephonyService::statusLine);
     connect(backend_.get(), &ModemBackend::technologyChanged, this, [this] { notifyBackendState(); });
+    connect(backend_.get(), &ModemBackend::displayTick, this, &TelephonyService::sendDisplayTick);
     healthTimer_.start(kHealthIntervalMs);
     // A recording starts with the modem, not with the first client; so does a modem whose
     // technology is learnt from its stream.
@@ -238,6 +241,7 @@ void TelephonyService::stop() {
         disconnect(backend_.get(), &ModemBackend::messageReady, this, nullptr);
         disconnect(backend_.get(), &ModemBackend::stateChanged, this, nullptr);
         disconnect(backend_.get(), &ModemBackend::technologyChanged, this, nullptr);
+        disconnect(backend_.get(), &ModemBackend::displayTick, this, nullptr);
         backend_->stop();
         backend_->finishStopping(kBackendStopMs);
         disconnect(backend_.get(), nullptr, this, nullptr);
@@ -503,6 +507,25 @@ void TelephonyService::sendMessage(int32_t messageId, const Bytes& data) {
         if (channel->congested || !channel->queue.empty()) {
             enqueue(*channel, messageId, data);
         } else if (deliver(number, *channel, messageId, data)) {
+            congestion = congestion || channel->congested;
+        }
+    }
+    if (congestion) updateFlow();
+}
+
+void TelephonyService::sendDisplayTick(std::optional<int64_t> recordedMs) {
+    // Not recorded: a replay of the recording marks its own ticks.
+    Bytes data;
+    if (recordedMs) {
+        const uint64_t bits = static_cast<uint64_t>(*recordedMs);
+        for (int shift = 0; shift < 64; shift += 8) data.push_back(static_cast<uint8_t>(bits >> shift));
+    }
+    bool congestion = false;
+    for (auto& [number, channel] : channels_) {
+        if (!channel->streaming || channel->closing) continue;
+        if (channel->congested || !channel->queue.empty()) {
+            enqueue(*channel, TelephonyServiceConnection::kDisplayTickMessageId, data);
+        } else if (deliver(number, *channel, TelephonyServiceConnection::kDisplayTickMessageId, data)) {
             congestion = congestion || channel->congested;
         }
     }

@@ -38,7 +38,7 @@ struct TelephonyServiceOptions {
     std::string replay;      // --replay FILE
     std::string device;      // --device PATH or tcp:HOST:PORT: a modem's DIAG port
     std::string recordQmdl;  // --record-qmdl FILE: the device's raw DIAG stream (device only)
-    std::string technology;  // --technology TECH, for files that do not carry one
+    std::string technology;  // --technology TECH, instead of what a replay's serving-cell records say
     double speed = 1.0;      // --speed X (replay)
     bool loop = false;       // --loop (replay)
     std::string record;      // --record FILE: every message the backend produces, as a capture
@@ -61,7 +61,9 @@ struct TelephonyServiceOptions {
 //     command {"SetState": "Streaming", "SetMorvekLogCodes": [...], "SetTsExtraCodes": [...]}
 //     as the channel's log mask (LogMask); another "SetState" stops the channel's stream;
 //   - messages go to the client's receive port as Message frames, one record each, only
-//     while the channel streams and only those its mask forwards;
+//     while the channel streams and only those its mask forwards; a replay's recorded
+//     display ticks go with them as messages with id kDisplayTickMessageId
+//     (TelephonyServiceConnection);
 //   - a channel that dropped records tells its client so on the channel port, as a
 //     Notification frame (id 0) {"Name": "ChannelStatus", "Info": {"Dropped", "Sent"}}, at
 //     most every half second while the count grows;
@@ -128,7 +130,8 @@ public:
     ~TelephonyService() override;
 
     // The backend the options ask for; null with *error set (unknown technology, file
-    // missing or unreadable, a QMDL / DLF file without --technology, ...).
+    // missing or unreadable, a file without a record, or without a serving-cell record
+    // and no --technology, ...).
     static std::unique_ptr<ModemBackend> createBackend(const TelephonyServiceOptions& options, std::string* error);
 
     // Builds the backend and the recorder and listens on the well-known port; false with
@@ -180,6 +183,8 @@ private:
     void scheduleClose(uint64_t number, const char* why);
     void closeChannel(uint64_t number, const std::string& why);
     void sendMessage(int32_t messageId, const Bytes& data);
+    // A replay's recorded display tick to every streaming channel, in order with its records.
+    void sendDisplayTick(std::optional<int64_t> recordedMs);
     // Posts to the client; false when the client is gone (the channel is then closing).
     bool deliver(uint64_t number, Channel& channel, int32_t messageId, const Bytes& data);
     void enqueue(Channel& channel, int32_t messageId, const Bytes& data);

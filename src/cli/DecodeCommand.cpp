@@ -1,13 +1,13 @@
-// DecodeCommand: `vantorel-cli decode --technology TECH FILE...`: every message to the decoder, then the display it builds.
+// DecodeCommand: `vantorel-cli decode [--technology TECH] FILE...`: every message to the decoder, then the display it builds.
 #include "cli/DecodeCommand.h"
 
 #include "LogGenerator/LogGenerator.h"
-#include "Model/MonitorClock.h"
 #include "Platform/SystemLog.h"
 #include "Platform/TechnologyNames.h"
 #include "PropertyList/Dictionary.h"
-#include "TelephonyService/Replay/DiagPacket.h"
+#include "TelephonyService/LogMask.h"
 #include "TelephonyService/Replay/RecordedStream.h"
+#include "TelephonyService/Replay/RecordedTicks.h"
 #include "cli/SignalExport.h"
 #include "cli/StdoutToStderr.h"
 #include "Monitor/TreeFormatter.h"
@@ -20,60 +20,80 @@ namespace vantorel {
 
 namespace {
 
-// The display ticks of a replay, on the messages' recorded times: a tick every
-// MonitorClock::kDisplayUpdateInterval that brought new messages (as the model only
-// redraws after new data), stamped with its recorded time. A message without a time
-// (a zero DIAG time stamp) joins the tick it arrives in; a stream in which no message
-// has a time gives one row, at the end, with an empty time cell. The last messages'
-// tick is at the 2 s mark after them, as a replay would show it.
+// The display ticks of a replay, on the messages' recorded times (RecordedTicks, as a
+// replay marks them): each samples the display into the CSV. Each file has a grid of its
+// own, from its first message.
 class ReplayTicks {
 public:
     explicit ReplayTicks(SignalExport& out) : out_(out) {}
 
     void beforeMessage(const TimedMessage& m, LogGenerator& decoder, Dictionary& state, const std::string& technology) {
-        if (m.timeMicros == kNoTime) return;
-        const int64_t ms = m.timeMicros / 1000;
-        if (!next_) {
-            next_ = ms + kInterval;
-        } else if (ms >= *next_) {
-            if (pending_) tick(*next_, decoder, state, technology);
-            *next_ += ((ms - *next_) / kInterval + 1) * kInterval;  // the first mark after ms
-        }
+        if (const auto due = ticks_.before(m.timeMicros)) tick(due->timeMs, decoder, state, technology);
     }
-    void afterMessage() { pending_ = true; }
+    void afterMessage() { ticks_.after(); }
+    // The messages so far get their tick (a file ends, the decoder changes) and the next
+    // message starts a new grid: the next file's recorded time may lie before the last one's.
     void atEnd(LogGenerator& decoder, Dictionary& state, const std::string& technology) {
-        if (pending_) tick(next_, decoder, state, technology);
+        if (const auto due = ticks_.end()) tick(due->timeMs, decoder, state, technology);
     }
 
 private:
-    static constexpr int64_t kInterval = MonitorClock::kDisplayUpdateInterval.count();
-    static inline const int64_t kNoTime = DiagPacket::microsecondsSince1970(0);
-
     void tick(std::optional<int64_t> timeMs, LogGenerator& decoder, Dictionary& state, const std::string& technology) {
         DictionaryRef display = decoder.generateLogUsingState(state);
         if (!display) display = decoder.generateLogUsingState(state);  // the call that builds it returns null
         PathDictionary index;
         VantorelModelNode::makeTreeFromObject(display ? Value(display) : Value(), index);
         out_.tick(timeMs, technology, index);
-        pending_ = false;
     }
 
     SignalExport& out_;
-    std::optional<int64_t> next_;
-    bool pending_ = false;
+    RecordedTicks ticks_;
+};
+
+// The decoder of the technology in effect, and its log mask: a stream whose serving cell
+// moves to another technology goes on in that technology's decoder, on the same state
+// (the monitor does the same).
+struct CurrentDecoder {
+    std::unique_ptr<LogGenerator> decoder;
+    std::string technology;
+    LogMask mask;
+
+    // False when there is no decoder for the technology.
+    bool use(const std::string& wanted, Dictionary& state) {
+        if (decoder && wanted == technology) return true;
+        std::unique_ptr<LogGenerator> next = LogGenerator::generatorFromTechnology(wanted);
+        if (!next) return false;
+        if (decoder) {
+            StdoutToStderr teardown;  // "Deallocing ClassIndex" is not part of the output
+            decoder.reset();
+        }
+        LogGenerator::forgetDisplay(state);
+        decoder = std::move(next);
+        technology = wanted;
+        const DictionaryRef start = decoder->getStartCommand();
+        mask = start ? LogMask::fromStartCommand(*start) : LogMask::all();
+        return true;
+    }
+    // A message this decoder reads: one of its log codes, or anything for a decoder
+    // that asks for everything (IFX).
+    bool reads(const TimedMessage& m) const {
+        return m.messageId == 0 && (mask.forwardsAll() || (LogMask::classify(m.data) && mask.forwards(m.data)));
+    }
 };
 
 }  // namespace
 
 int DecodeCommand::run(const QStringList& args) {
+    static constexpr const char* kPrefix = "vantorel-cli decode";
     QCommandLineParser parser;
     parser.setApplicationDescription(
         "Decode recorded streams and print the display the monitor would show after them.\n"
         "Every message is handed to the decoder as the monitor does; records that the live\n"
-        "modem would not have been asked for are decoded too (no log mask is applied).");
-    parser.addHelpOption();
+        "modem would not have been asked for are decoded too (no log mask is applied).\n"
+        "The decoder follows the technology of the stream's serving-cell records.");
+    const QCommandLineOption helpOption = parser.addHelpOption();
     parser.addOption({"technology", "Decoder to use (" + QString::fromStdString(TechnologyNames::listing()) +
-                                        "); needed unless every FILE is a capture.", "TECH"});
+                                        ") instead of the one the serving-cell records name.", "TECH"});
     parser.addOption({"format",
                       "Output: tree (as the panes show it), json or plist (the tree's names in its order),\n"
                       "or display (the display dictionary as the decoder keeps it, as JSON).",
@@ -82,24 +102,32 @@ int DecodeCommand::run(const QStringList& args) {
     parser.addOption({"verbose", "Mirror the system log to stderr."});
     parser.addPositionalArgument("FILE", "QXDM DLF, QMDL/mi2log or Vantorel capture files, decoded in order.",
                                  "FILE...");
-    parser.process(QStringList{"vantorel-cli decode"} + args);
+    // parse(), not process(): a usage error is exit code 2, as everywhere.
+    if (!parser.parse(QStringList{kPrefix} + args)) {
+        std::fprintf(stderr, "%s: %s (see --help)\n", kPrefix, qPrintable(parser.errorText()));
+        return 2;
+    }
+    if (parser.isSet(helpOption) || parser.isSet("help-all")) {
+        std::fputs(qPrintable(parser.helpText()), stdout);
+        return 0;
+    }
     SystemLog::setMirrorToStderr(parser.isSet("verbose"));
 
     const auto format = TreeFormatter::parse(parser.value("format").toStdString());
     if (!format) {
-        std::fprintf(stderr, "vantorel-cli decode: unknown --format '%s' (tree, json, plist or display)\n",
+        std::fprintf(stderr, "%s: unknown --format '%s' (tree, json, plist or display)\n", kPrefix,
                      qPrintable(parser.value("format")));
         return 2;
     }
     if (parser.positionalArguments().isEmpty()) {
-        std::fprintf(stderr, "vantorel-cli decode: no FILE given (see --help)\n");
+        std::fprintf(stderr, "%s: no FILE given (see --help)\n", kPrefix);
         return 2;
     }
     std::string technology;
     if (parser.isSet("technology")) {
         auto id = TechnologyNames::identifierFor(parser.value("technology").toStdString());
         if (!id) {
-            std::fprintf(stderr, "vantorel-cli decode: unknown technology '%s' (%s)\n",
+            std::fprintf(stderr, "%s: unknown technology '%s' (%s)\n", kPrefix,
                          qPrintable(parser.value("technology")), TechnologyNames::listing().c_str());
             return 2;
         }
@@ -108,77 +136,94 @@ int DecodeCommand::run(const QStringList& args) {
     SignalExport csv;
     std::string csvError;
     if (!csv.configure(parser, false, &csvError)) {
-        std::fprintf(stderr, "vantorel-cli decode: %s\n", csvError.c_str());
+        std::fprintf(stderr, "%s: %s\n", kPrefix, csvError.c_str());
         return 2;
     }
     ReplayTicks ticks(csv);
 
-    std::unique_ptr<LogGenerator> decoder;
-    std::string decoderTechnology;
+    CurrentDecoder current;
     Dictionary state;
     uint64_t read = 0, skipped = 0, badFrames = 0;
     int failures = 0;
+    size_t filesDecoded = 0;  // files with a record for the decoder
     for (const QString& path : parser.positionalArguments()) {
         RecordedStream stream = RecordedStream::open(path.toStdString(), technology);
         if (!stream.ok()) {
-            std::fprintf(stderr, "vantorel-cli decode: %s\n", stream.error().c_str());
+            std::fprintf(stderr, "%s: %s\n", kPrefix, stream.error().c_str());
             ++failures;
             continue;
         }
-        if (!technology.empty() && stream.technologyFromFile() && stream.technology() != technology) {
-            std::fprintf(stderr, "vantorel-cli decode: %s is a %s capture: --technology %s contradicts it\n",
-                         qPrintable(path), TechnologyNames::displayName(stream.technology()).c_str(),
+        if (!technology.empty() && !stream.declaredTechnology().empty() && stream.declaredTechnology() != technology) {
+            std::fprintf(stderr, "%s: %s is a %s capture: --technology %s contradicts it\n", kPrefix,
+                         qPrintable(path), TechnologyNames::displayName(stream.declaredTechnology()).c_str(),
                          qPrintable(parser.value("technology")));
             return 2;
         }
         const RecordedLog& report = stream.report();
         badFrames += report.badCrc + report.malformed + report.truncated;
+        // One line per file the decoders have nothing of, whatever the reason.
+        if (!stream.holdsRecords()) {
+            std::fprintf(stderr, "%s: %s: no record in it (%s file; %zu bad frames)\n", kPrefix, qPrintable(path),
+                         stream.formatName(), report.badCrc + report.malformed + report.truncated);
+            ++failures;
+            continue;
+        }
         if (stream.technology().empty()) {
-            std::fprintf(stderr, "vantorel-cli decode: %s is a %s file, which does not say its technology: add --technology (%s)\n",
-                         qPrintable(path), stream.formatName(), TechnologyNames::listing().c_str());
+            std::fprintf(stderr, "%s: %s: no serving-cell record tells its technology: add --technology (%s)\n",
+                         kPrefix, qPrintable(path), TechnologyNames::listing().c_str());
             ++failures;
             continue;
         }
-        if (!decoder) {
-            decoder = LogGenerator::generatorFromTechnology(stream.technology());
-            decoderTechnology = stream.technology();
-            if (!decoder) {
-                std::fprintf(stderr, "vantorel-cli decode: no decoder for %s\n",
-                             TechnologyNames::displayName(stream.technology()).c_str());
-                return 1;
+        if (current.decoder && csv.enabled()) ticks.atEnd(*current.decoder, state, current.technology);
+        size_t forDecoder = 0;
+        const std::vector<TimedMessage>& messages = stream.messages();
+        for (size_t i = 0; i < messages.size(); ++i) {
+            const TimedMessage& m = messages[i];
+            const std::string at = stream.technologyAt(i);
+            if (at != current.technology) {
+                if (current.decoder && csv.enabled()) ticks.atEnd(*current.decoder, state, current.technology);
+                if (!current.use(at, state)) {
+                    std::fprintf(stderr, "%s: no decoder for %s\n", kPrefix, TechnologyNames::displayName(at).c_str());
+                    return 1;
+                }
             }
-        } else if (stream.technology() != decoderTechnology) {
-            std::fprintf(stderr, "vantorel-cli decode: %s is %s, the files before it %s: skipped\n", qPrintable(path),
-                         TechnologyNames::displayName(stream.technology()).c_str(),
-                         TechnologyNames::displayName(decoderTechnology).c_str());
-            ++failures;
-            continue;
-        }
-        for (const TimedMessage& m : stream.messages()) {
             ++read;
             // As the receive callback: only message id 0 reaches the decoder.
             if (m.messageId != 0) {
                 ++skipped;
                 continue;
             }
-            if (csv.enabled()) ticks.beforeMessage(m, *decoder, state, decoderTechnology);
-            decoder->updateState(state, m.data);
+            forDecoder += current.reads(m);
+            if (csv.enabled()) ticks.beforeMessage(m, *current.decoder, state, current.technology);
+            current.decoder->updateState(state, m.data);
             ticks.afterMessage();
         }
+        if (forDecoder == 0) {
+            std::fprintf(stderr, "%s: %s: no record for the %s decoder among its %zu messages\n", kPrefix,
+                         qPrintable(path), TechnologyNames::displayName(current.technology).c_str(), messages.size());
+            ++failures;
+        } else {
+            ++filesDecoded;
+        }
     }
-    if (decoder && csv.enabled()) ticks.atEnd(*decoder, state, decoderTechnology);
-    if (!csv.finish(decoderTechnology, &csvError)) {
-        std::fprintf(stderr, "vantorel-cli decode: %s\n", csvError.c_str());
+    if (current.decoder && csv.enabled()) ticks.atEnd(*current.decoder, state, current.technology);
+    if (!csv.finish(current.technology, &csvError)) {
+        std::fprintf(stderr, "%s: %s\n", kPrefix, csvError.c_str());
         ++failures;
     }
-    if (!decoder) return failures ? 1 : 0;
+    // Nothing was read: the lines above said why; no empty screen is printed.
+    if (!current.decoder || filesDecoded == 0) {
+        StdoutToStderr teardown;  // "Deallocing ClassIndex" is not part of the output
+        current.decoder.reset();
+        return 1;
+    }
 
-    DictionaryRef display = decoder->generateLogUsingState(state);
-    if (!display) display = decoder->generateLogUsingState(state);  // the call that builds it returns null
+    DictionaryRef display = current.decoder->generateLogUsingState(state);
+    if (!display) display = current.decoder->generateLogUsingState(state);  // the call that builds it returns null
     const std::string text = TreeFormatter::format(*format, display ? Value(display) : Value());
     {
         StdoutToStderr teardown;  // "Deallocing ClassIndex" is not part of the output
-        decoder.reset();
+        current.decoder.reset();
     }
     std::fwrite(text.data(), 1, text.size(), stdout);
     std::fprintf(stderr, "%llu messages read, %llu skipped (message id not 0), %llu bad frames\n",
@@ -190,8 +235,8 @@ int DecodeCommand::run(const QStringList& args) {
     // The IFX decoder shows only messages that are whole displays: a file of log records
     // gives it none, which is said rather than printed as an empty screen.
     if (!display) {
-        std::fprintf(stderr, "vantorel-cli decode: no display: the %s decoder could read none of these messages\n",
-                     TechnologyNames::displayName(decoderTechnology).c_str());
+        std::fprintf(stderr, "%s: no record for the %s decoder: it could read none of these messages\n", kPrefix,
+                     TechnologyNames::displayName(current.technology).c_str());
         return 1;
     }
     return failures ? 1 : 0;

@@ -12,13 +12,21 @@ namespace vantorel {
 
 int InfoCommand::run(const QStringList& args) {
     QCommandLineParser parser;
-    parser.setApplicationDescription("Describe recorded streams: format, technology if known, message count,\n"
-                                     "time span, counts per log code with its name and record versions\n"
-                                     "(property lists for IFX), and every bad frame. A file in which nothing\n"
-                                     "is found is not a capture (exit 1).");
-    parser.addHelpOption();
+    parser.setApplicationDescription("Describe recorded streams: format, the technologies their serving-cell\n"
+                                     "records name, message count, time span (earliest to latest), counts per\n"
+                                     "log code with its name and record versions (property lists for IFX), and\n"
+                                     "every bad frame. A file in which no record is found is an error (exit 1).");
+    const QCommandLineOption helpOption = parser.addHelpOption();
     parser.addPositionalArgument("FILE", "QXDM DLF, QMDL/mi2log or Vantorel capture files.", "FILE...");
-    parser.process(QStringList{"vantorel-cli info"} + args);
+    // parse(), not process(): a usage error is exit code 2, as everywhere.
+    if (!parser.parse(QStringList{"vantorel-cli info"} + args)) {
+        std::fprintf(stderr, "vantorel-cli info: %s (see --help)\n", qPrintable(parser.errorText()));
+        return 2;
+    }
+    if (parser.isSet(helpOption) || parser.isSet("help-all")) {
+        std::fputs(qPrintable(parser.helpText()), stdout);
+        return 0;
+    }
     if (parser.positionalArguments().isEmpty()) {
         std::fprintf(stderr, "vantorel-cli info: no FILE given (see --help)\n");
         return 2;
@@ -32,8 +40,9 @@ int InfoCommand::run(const QStringList& args) {
             continue;
         }
         if (!stream.holdsRecords()) {
-            std::fprintf(stderr, "vantorel-cli info: %s: not a capture (no capture header, DLF record or QMDL frame)\n",
-                         qPrintable(path));
+            const RecordedLog& report = stream.report();
+            std::fprintf(stderr, "vantorel-cli info: %s: no record in it (read as %s; %zu bad frames)\n",
+                         qPrintable(path), stream.formatName(), report.badCrc + report.malformed + report.truncated);
             ++failures;
             continue;
         }

@@ -15,8 +15,8 @@ namespace vantorel {
 
 void SignalExport::addOptions(QCommandLineParser& parser, bool live) {
     parser.addOption({"csv",
-                      live ? "Write the signal values to FILE as CSV, one row per display tick (wall-clock time, "
-                             "each row flushed)."
+                      live ? "Write the signal values to FILE as CSV, one row per display tick (wall-clock time; "
+                             "for a replay, per tick of its recorded time at any --speed), each row flushed."
                            : "Write the signal values to FILE as CSV, one row per 2 s of recorded time that "
                              "brought messages, stamped with that recorded time.",
                       "FILE"});

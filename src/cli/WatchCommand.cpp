@@ -20,7 +20,7 @@ int WatchCommand::run(const QStringList& args) {
         "Watch the monitor's display in the terminal, refreshed every 2 s when new data arrived.\n"
         "Without a source, the built-in modem emulator runs in-process (UTRAN); Ctrl-C ends.\n"
         "Keys in a terminal: arrows move, Enter opens, Backspace goes back, PgUp/PgDn scroll, q quits.");
-    parser.addHelpOption();
+    const QCommandLineOption helpOption = parser.addHelpOption();
     MonitorLauncher::addOptions(parser);
     SignalExport::addOptions(parser, true);
     parser.addOption({"plot",
@@ -31,7 +31,15 @@ int WatchCommand::run(const QStringList& args) {
                       "a CSV header with its unit is taken too.",
                       "KEY"});
     parser.addOption({"verbose", "Mirror the system log to stderr."});
-    parser.process(QStringList{"vantorel-cli watch"} + args);
+    // parse(), not process(): a usage error is exit code 2, as everywhere.
+    if (!parser.parse(QStringList{"vantorel-cli watch"} + args)) {
+        std::fprintf(stderr, "vantorel-cli watch: %s (see --help)\n", qPrintable(parser.errorText()));
+        return 2;
+    }
+    if (parser.isSet(helpOption) || parser.isSet("help-all")) {
+        std::fputs(qPrintable(parser.helpText()), stdout);
+        return 0;
+    }
     SystemLog::setMirrorToStderr(parser.isSet("verbose"));
 
     std::string error;

@@ -15,10 +15,11 @@ const char* const kUsage =
     "Usage: vantorel-cli COMMAND [options]\n"
     "\n"
     "Commands:\n"
-    "  decode --technology TECH FILE...  decode recorded streams and print the display\n"
+    "  decode [--technology TECH] FILE...\n"
+    "                                    decode recorded streams and print the display\n"
     "                                    (--format tree|json|plist|display;\n"
     "                                    --csv OUT: signal values per 2 s tick)\n"
-    "  info FILE...                      format, technology, message count, counts per\n"
+    "  info FILE...                      format, technologies, message count, counts per\n"
     "                                    log code and bad frames of recorded streams\n"
     "  watch [--emulate TECH | --replay FILE | --service NAME]\n"
     "                                    the live display in the terminal\n"
@@ -28,7 +29,8 @@ const char* const kUsage =
     "                                    binary log to OUT\n"
     "\n"
     "Recorded streams: QXDM DLF, QMDL / mi2log, and Vantorel captures (.vcap).\n"
-    "TECH: ifx, gsm, cdma, lte, utran (or the full identifier).\n"
+    "TECH: ifx, gsm, cdma, lte, utran (or the full identifier); by default the\n"
+    "technology the stream's serving-cell records name.\n"
     "'vantorel-cli COMMAND --help' tells more.\n";
 
 }  // namespace

@@ -4,6 +4,7 @@
 #include "TelephonyService/ReplayBackend.h"
 
 #include "Platform/RecordBuilder.h"
+#include "Platform/TechnologyNames.h"
 #include "Platform/TelephonyIdentifiers.h"
 #include "PropertyList/PropertyListSerialization.h"
 #include "TelephonyService/ServiceTestSupport.h"
@@ -11,6 +12,8 @@
 #include <QElapsedTimer>
 #include <gtest/gtest.h>
 
+#include <optional>
+#include <set>
 #include <string>
 #include <vector>
 
@@ -65,6 +68,55 @@ TEST(ReplayBackend, ThePaceFollowsTheRecordedGapsDividedByTheSpeed) {
         EXPECT_EQ(c.messages, records);
         EXPECT_EQ(c.states, (std::vector<State>{State::Streaming, State::Finished}));
     }
+}
+
+TEST(ReplayBackend, TheSilenceBeforeTheFirstRecordAClientWantsIsNotWaitedOut) {
+    const Bytes other = RecordBuilder::ordinary(0xB0C0, 16).build(), wanted = RecordBuilder::ordinary(0xD00A, 16).build();
+    struct Row { const char* name; std::vector<Bytes> records; std::vector<int64_t> times; std::optional<std::set<uint16_t>> codes; int minMs, maxMs; };
+    const std::vector<Row> rows = {
+        {"records nobody asked for, 9 s of them", {other, other, wanted, wanted}, {0, 5000000, 9000000, 9300000},
+         std::set<uint16_t>{0xD00A}, 295, 2000},
+        {"after the first wanted record the pace holds", {wanted, other, wanted}, {0, 200000, 400000},
+         std::set<uint16_t>{0xD00A}, 395, 2000},
+        {"a client that takes everything", {other, other}, {0, 400000}, std::nullopt, 395, 2000},
+    };
+    for (const Row& row : rows) {
+        SCOPED_TRACE(row.name);
+        ReplayBackend backend(streamOf(row.records, row.times), 1.0, false);
+        backend.setLogCodes(row.codes);
+        QElapsedTimer clock;
+        clock.start();
+        backend.start();
+        ASSERT_TRUE(waitUntil([&] { return backend.state() == State::Finished; }, 3000));
+        EXPECT_GE(clock.elapsed(), row.minMs);
+        EXPECT_LT(clock.elapsed(), row.maxMs);
+    }
+}
+
+TEST(ReplayBackend, TheTechnologyFollowsTheServingCellAndTicksMarkTheRecordedTime) {
+    // A UTRAN capture whose modem moves to LTE at message 2 and back at message 4.
+    const std::vector<Bytes> records = {
+        RecordBuilder::ordinary(0xD00A, 16).build(), RecordBuilder::ordinary(0xD00A, 16).build(),
+        RecordBuilder::ordinary(0xB0C2, 16).build(), RecordBuilder::ordinary(0xB0C0, 16).build(),
+        RecordBuilder::ordinary(0xD0E2, 16).build()};
+    const int64_t t0 = 1700000000000000;
+    ReplayBackend backend(streamOf(records, {t0, t0 + 500000, t0 + 2100000, t0 + 2200000, t0 + 7000000}), 0, true);
+    std::vector<std::string> events;  // "message <technology>", "technology", "tick <ms after t0>"
+    QObject::connect(&backend, &ModemBackend::messageReady,
+                     [&](int32_t, const Bytes&) { events.push_back("message " + TechnologyNames::shortName(backend.technology())); });
+    QObject::connect(&backend, &ModemBackend::technologyChanged, [&] { events.push_back("technology"); });
+    QObject::connect(&backend, &ModemBackend::displayTick, [&](std::optional<int64_t> ms) {
+        events.push_back(ms ? "tick " + std::to_string(*ms - t0 / 1000) : "tick");
+    });
+    EXPECT_EQ(backend.technology(), kTSLogChannelTechnology_Morvek_UTRAN2);
+    backend.start();
+    ASSERT_TRUE(waitUntil([&] { return events.size() >= 15; }));
+    backend.stop();
+    const std::vector<std::string> pass = {"message utran", "message utran", "tick 2000", "technology", "message lte",
+                                           "message lte", "tick 4000", "technology", "message utran", "tick 8000"};
+    EXPECT_EQ(std::vector<std::string>(events.begin(), events.begin() + 10), pass);
+    // The next pass starts over in the first technology.
+    EXPECT_EQ(std::vector<std::string>(events.begin() + 10, events.begin() + 12), (std::vector<std::string>{"message utran", "message utran"}));
 }
 
 TEST(ReplayBackend, ALoopingReplayWaitsWhilePausedAndStartsOverAtItsEnd) {

@@ -68,6 +68,60 @@ TEST(RecordedStream, RealCapturesReadAsTheirReadmeCounts) {
     }
 }
 
+Bytes qmdlOf(std::initializer_list<uint16_t> codes) {
+    Bytes file;
+    uint64_t stamp = 0x00D0B23E36510000ull;
+    for (uint16_t code : codes) append(file, hdlcFrame(logPacketBody(code, stamp += 0x10000, {0x02})));
+    return file;
+}
+
+Bytes captureOf(const std::string& technology, std::initializer_list<uint16_t> codes) {
+    Bytes file = CaptureWriter::headerBytes(technology);
+    for (uint16_t code : codes) append(file, CaptureWriter::messageBytes(1700000000000000, 0, morvekRecord(code, 1, {2})));
+    return file;
+}
+
+TEST(RecordedStream, TheServingCellRecordsNameTheTechnologyAndFollowTheModem) {
+    using Span = RecordedStream::TechnologySpan;
+    const std::string lte = kTSLogChannelTechnology_Morvek_LTE, gsm = kTSLogChannelTechnology_Morvek_GSM,
+                      utran = kTSLogChannelTechnology_Morvek_UTRAN2;
+    struct Row { const char* name; Bytes file; std::string override; std::vector<Span> spans; const char* says; };
+    const std::vector<Row> rows = {
+        {"LTE, then GSM, then LTE again", qmdlOf({0x7130, 0xB0C2, 0x7130, 0x5134, 0x4127, 0xB0C1}), "",
+         {{0, lte}, {3, gsm}, {5, lte}}, "QMDL, technologies LTE, GSM/UMTS, 6 messages\n"},
+        {"no serving cell", qmdlOf({0x7130, 0x7131}), "", {}, "QMDL, technology unknown, 2 messages\n"},
+        {"--technology holds for the whole file", qmdlOf({0xB0C2, 0x5134}), utran, {{0, utran}},
+         "QMDL, technology UTRAN (TD-SCDMA), 2 messages\n"},
+        {"a capture's header until its modem moves", captureOf(utran, {0xD00A, 0xB0C2}), "", {{0, utran}, {1, lte}},
+         "capture, technologies UTRAN (TD-SCDMA), LTE, 2 messages\n"},
+        {"a serving cell first corrects the header", captureOf(lte, {0x5134, 0xD00A}), "", {{0, gsm}},
+         "capture, technology GSM/UMTS, 2 messages\n"},
+    };
+    for (const Row& row : rows) {
+        SCOPED_TRACE(row.name);
+        const RecordedStream stream = RecordedStream::fromBytes(row.file, row.override);
+        EXPECT_EQ(stream.technologySpans(), row.spans);
+        EXPECT_EQ(stream.summary().rfind(row.says, 0), 0u) << stream.summary();
+        for (const Span& span : row.spans) EXPECT_EQ(stream.technologyAt(span.from), span.technology);
+    }
+    for (const char* file : {"qmdl_example.qmdl", "offline_log_example.mi2log", "cmcc.mi2log", "sprint.mi2log"})
+        EXPECT_EQ(RecordedStream::open(capturePath(file)).technologySpans(), (std::vector<Span>{{0, lte}})) << file;
+}
+
+TEST(RecordedStream, TheTimeSpanRunsFromTheEarliestToTheLatestTimeHoweverFarApart) {
+    const struct { const char* name; std::vector<int64_t> times; const char* says; } rows[] = {
+        {"time going back", {1700000005000000, 1700000001000000, 1700000003000000},
+         "time span 2023-11-14 22:13:21.000 to 2023-11-14 22:13:25.000 UTC (4.000 s)\n"},
+        {"garbage stamps at both ends", {INT64_MIN + 1, INT64_MAX}, "UTC (18446744073709.55"},
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.name);
+        std::vector<Bytes> records(row.times.size(), morvekRecord(0xD00A, 1, {}));
+        const std::string summary = servicetest::streamOf(records, row.times).summary();
+        EXPECT_NE(summary.find(row.says), std::string::npos) << summary;
+    }
+}
+
 TEST(DiagPacket, BodiesAreClassifiedAndLogPacketsSplit) {
     const Bytes good = logPacketBody(0x7130, 0x1122, {0xA1, 0xA2});
     Bytes wrapped{0x98, 0x01, 0x00, 0x00, 0x07, 0x00, 0x00, 0x00};

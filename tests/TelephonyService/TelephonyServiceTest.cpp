@@ -400,11 +400,18 @@ TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
                                        ", backend replay of qmdl_example.qmdl (QMDL, 336 messages, speed 1), technology GSM/UMTS");
     QTemporaryDir dir;  // an earlier recording, which no failed start may touch
     const std::string existing = dir.filePath("old.vcap").toStdString();
-    const Bytes oldBytes = CaptureWriter::headerBytes(kTSLogChannelTechnology_Morvek_UTRAN2);
-    QFile oldFile(QString::fromStdString(existing));
-    ASSERT_TRUE(oldFile.open(QIODevice::WriteOnly));
-    oldFile.write(reinterpret_cast<const char*>(oldBytes.data()), static_cast<qint64>(oldBytes.size()));
-    oldFile.close();
+    Bytes oldBytes = CaptureWriter::headerBytes(kTSLogChannelTechnology_Morvek_UTRAN2);
+    servicetest::append(oldBytes, CaptureWriter::messageBytes(1, 0, servicetest::morvekRecord(0xD00A, 1, {})));
+    auto write = [](const std::string& path, const Bytes& bytes) {
+        QFile file(QString::fromStdString(path));
+        ASSERT_TRUE(file.open(QIODevice::WriteOnly));
+        file.write(reinterpret_cast<const char*>(bytes.data()), static_cast<qint64>(bytes.size()));
+    };
+    write(existing, oldBytes);
+    // A capture without a message, and log packets of codes no technology owns.
+    const std::string bare = dir.filePath("bare.vcap").toStdString(), mobility = dir.filePath("mobility.qmdl").toStdString();
+    write(bare, CaptureWriter::headerBytes(kTSLogChannelTechnology_Morvek_UTRAN2));
+    write(mobility, servicetest::hdlcFrame(servicetest::logPacketBody(0x7130, 1, {2})));
 
     auto with = [](auto change) {
         TelephonyServiceOptions o = options();
@@ -416,7 +423,8 @@ TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
         {with([](auto& o) { o.emulate = "wimax"; }), "unknown technology \"wimax\" (names: ifx, gsm, cdma, lte, utran"},
         {with([](auto&) {}), "give exactly one of --emulate TECH, --replay FILE and --device PATH"},
         {with([](auto& o) { o.replay = "/nonexistent-vantorel.qmdl"; }), "/nonexistent-vantorel.qmdl: No such file or directory"},
-        {with([&](auto& o) { o.replay = qmdl; }), qmdl + " is a QMDL file, which does not say which modem recorded it"},
+        {with([&](auto& o) { o.replay = bare; }), bare + ": no record in it (read as capture)"},
+        {with([&](auto& o) { o.replay = mobility; }), mobility + ": no serving-cell record tells which modem recorded it"},
         {with([](auto& o) { o.replay = "x"; o.speed = -1; }), "speed -1: give 0"},
         {with([](auto& o) { o.emulate = "utran"; o.record = "/nonexistent-dir-of-vantorel/x.vcap"; }),
          "/nonexistent-dir-of-vantorel/x.vcap: "},
@@ -439,6 +447,7 @@ TEST(TelephonyService, StartsOnItsOwnThreadOrSaysWhyNotAndLeavesThePortFree) {
         // Nothing is left listening after a failed start.
         EXPECT_TRUE(failing.portName == running.portName || !RemoteMessagePort::lookup(failing.portName, 100));
     }
+    QFile oldFile(QString::fromStdString(existing));
     ASSERT_TRUE(oldFile.open(QIODevice::ReadOnly));
     EXPECT_EQ(oldFile.readAll().toStdString(), std::string(oldBytes.begin(), oldBytes.end()));
 

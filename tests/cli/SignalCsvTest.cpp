@@ -4,6 +4,10 @@
 #include "support/CommandOutput.h"
 
 #include <QDateTime>
+#include <QElapsedTimer>
+#include <QFileInfo>
+#include <QProcess>
+#include <QThread>
 #include <QFile>
 #include <QRegularExpression>
 #include <QTemporaryDir>
@@ -61,6 +65,45 @@ TEST(SignalCsv, AReplayGivesOneRowPerRecordedTickWithTheSignalColumns) {
               (QStringList{"time,/Serving Cell/Serving Cell Measurements/Measured RSRP (dBm),\"/No Such/[A=1,B=2]/Key\"",
                            "2016-03-23T21:55:50.881Z,-96.56,"}));
     EXPECT_NE(run.err.find("--csv-keys (their columns are empty):\n  /No Such/[A=1,B=2]/Key\n"), std::string::npos) << run.err;
+}
+
+TEST(SignalCsv, SeveralCapturesGiveTheRowsOfEachAndAFastReplayWatchedGivesTheRowsOfItsRecording) {
+    QTemporaryDir dir;
+    // cmcc's recorded time lies after qmdl_example's: time goes back between the files.
+    const QStringList files = {kCaptures + "/cmcc.mi2log", kCaptures + "/qmdl_example.qmdl"};
+    // The rows' times (the values differ: the second file starts from the display the first left).
+    auto times = [](const QStringList& lines) {
+        QStringList out;
+        for (const QString& line : lines.mid(1)) out += line.section(',', 0, 0);
+        return out;
+    };
+    QStringList each;
+    for (const QString& file : files) {
+        const QString out = dir.filePath(QFileInfo(file).fileName() + ".csv");
+        ASSERT_EQ(decode({"--csv", out, file}).code, 0) << file.toStdString();
+        each += times(csvLines(out));
+    }
+    const QString both = dir.filePath("both.csv");
+    ASSERT_EQ(decode({"--csv", both, files[0], files[1]}).code, 0);
+    const QStringList together = times(csvLines(both));
+    EXPECT_EQ(together.size(), each.size());
+    EXPECT_TRUE(together == each);
+
+    // The replay as fast as the monitor takes it, one row per tick of the recording.
+    const QString decoded = dir.filePath(QFileInfo(files[0]).fileName() + ".csv"), watched = dir.filePath("watched.csv");
+    const QStringList expected = csvLines(decoded);
+    QProcess cli;
+    cli.start(VANTOREL_CLI_PROGRAM, {"watch", "--replay", files[0], "--speed", "0", "--csv", watched});
+    QElapsedTimer clock;
+    clock.start();
+    while (csvLines(watched).size() < expected.size() && clock.elapsed() < 90000) QThread::msleep(200);
+    QThread::msleep(500);  // nothing more comes
+    cli.terminate();
+    ASSERT_TRUE(cli.waitForFinished(10000));
+    const QStringList rows = csvLines(watched);
+    EXPECT_EQ(rows.size(), expected.size());
+    EXPECT_TRUE(rows == expected) << (rows.isEmpty() ? "" : rows.last().toStdString()) << "\n"
+                                  << (expected.isEmpty() ? "" : expected.last().toStdString());
 }
 
 TEST(SignalCsv, MisuseIsRefusedBeforeDecoding) {

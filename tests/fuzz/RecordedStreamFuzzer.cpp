@@ -10,6 +10,12 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     const RecordedStream stream = RecordedStream::fromBytes(input, kTSLogChannelTechnology_Morvek_UTRAN2);
     FUZZ_CHECK(stream.format() == RecordedStream::detect(input));
     (void)stream.summary();
+    // Without an override, the serving-cell records name the technologies: spans in order.
+    const RecordedStream detected = RecordedStream::fromBytes(input);
+    (void)detected.summary();
+    const auto& spans = detected.technologySpans();
+    for (size_t i = 0; i < spans.size(); ++i)
+        FUZZ_CHECK((i == 0 ? spans[i].from == 0 : spans[i].from > spans[i - 1].from) && !spans[i].technology.empty());
     // QMDL and DLF records reach the decoders as ordinary records with message id 0.
     if (stream.format() != RecordedStream::Format::Capture)
         for (const TimedMessage& m : stream.messages()) FUZZ_CHECK(m.messageId == 0 && !m.data.empty() && m.data[0] == 1);

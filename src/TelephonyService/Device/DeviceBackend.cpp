@@ -2,6 +2,7 @@
 #include "TelephonyService/Device/DeviceBackend.h"
 
 #include "Platform/LogCodes.h"
+#include "Platform/ServingCellCodes.h"
 #include "Platform/StringFormat.h"
 #include "Platform/SystemLog.h"
 #include "Platform/TechnologyNames.h"
@@ -15,17 +16,6 @@
 namespace vantorel {
 
 namespace {
-
-// The serving-cell records that say which radio the modem is on.
-const std::map<uint16_t, const char*>& servingCells() {
-    static const std::map<uint16_t, const char*> codes{
-        {LogCode::kLTEMasterInfoBlock, "lte"},     {LogCode::kLTEServingCellInfo, "lte"},
-        {LogCode::kUMTSCellIdentity, "gsm"},       {LogCode::kGSMServingCellIdentity, "gsm"},
-        {LogCode::kC2K1xStatus, "cdma"},           {LogCode::kC2KHDRStatus, "cdma"},
-        {LogCode::kUTRANServingCell, "utran"},
-    };
-    return codes;
-}
 
 std::string codeList(const std::set<uint16_t>& codes) {
     std::string text;
@@ -61,19 +51,9 @@ DeviceBackend::~DeviceBackend() {
     port_.reset();
 }
 
-const std::set<uint16_t>& DeviceBackend::servingCellCodes() {
-    static const std::set<uint16_t> codes = [] {
-        std::set<uint16_t> set;
-        for (const auto& entry : servingCells()) set.insert(entry.first);
-        return set;
-    }();
-    return codes;
-}
+const std::set<uint16_t>& DeviceBackend::servingCellCodes() { return ServingCellCodes::codes(); }
 
-std::string DeviceBackend::technologyOfServingCell(uint16_t code) {
-    const auto it = servingCells().find(code);
-    return it == servingCells().end() ? std::string() : TechnologyNames::identifierFor(it->second).value_or("");
-}
+std::string DeviceBackend::technologyOfServingCell(uint16_t code) { return ServingCellCodes::technologyOf(code); }
 
 bool DeviceBackend::recordQmdl(const std::string& path, bool replace, std::string* error) {
     auto file = std::make_unique<QFile>(QString::fromStdString(path));

@@ -6,7 +6,12 @@
 #include "Platform/StringFormat.h"
 
 #include <QFile>
-#include <QFileInfo>
+
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <cstring>
 
 #include <utility>
 
@@ -61,15 +66,20 @@ std::optional<Bytes> RecordedLog::loadFile(const std::string& path, std::string*
         if (error) *error = path + ": " + reason.toStdString();
         return std::nullopt;
     };
-    const QString qpath = QString::fromStdString(path);
-    // QFile opens a directory on some platforms and then reads nothing: say so instead.
-    if (QFileInfo(qpath).isDir()) return fail(QStringLiteral("is a directory"));
-    QFile file(qpath);
+    // What the path is decides how it is read: a regular file to its size; a pipe or a
+    // socket (`<(zcat x.qmdl.gz)`) to its end, at most kMaxStreamBytes; a device
+    // (/dev/zero, a modem's port) never ends and is no recording: refused.
+    struct stat info {};
+    if (::stat(path.c_str(), &info) != 0) return fail(QString::fromLocal8Bit(std::strerror(errno)));
+    if (S_ISDIR(info.st_mode)) return fail(QStringLiteral("is a directory"));
+    if (S_ISCHR(info.st_mode) || S_ISBLK(info.st_mode))
+        return fail(QStringLiteral("is a device, not a recorded file (a live modem is watched with --device)"));
+    QFile file(QString::fromStdString(path));
     if (!file.open(QIODevice::ReadOnly)) return fail(file.errorString());
     Bytes data;
-    const qint64 size = file.size();
-    if (size > 0) {
-        data.resize(static_cast<size_t>(size));
+    if (S_ISREG(info.st_mode)) {
+        const qint64 size = file.size();
+        data.resize(static_cast<size_t>(std::max<qint64>(size, 0)));
         qint64 done = 0;
         while (done < size) {
             const qint64 n = file.read(reinterpret_cast<char*>(data.data()) + done, size - done);
@@ -78,12 +88,20 @@ std::optional<Bytes> RecordedLog::loadFile(const std::string& path, std::string*
             done += n;
         }
         data.resize(static_cast<size_t>(done));
-    } else {
-        // Size unknown (a pipe or special file): read to the end.
-        const QByteArray all = file.readAll();
-        data.assign(all.begin(), all.end());
+        return data;
     }
-    return data;
+    constexpr qint64 kChunk = 1 << 16;
+    for (;;) {
+        const size_t done = data.size();
+        if (done > kMaxStreamBytes)
+            return fail(QStringLiteral("more than %1 MiB without an end: not a recorded file")
+                            .arg(static_cast<qulonglong>(kMaxStreamBytes >> 20)));
+        data.resize(done + kChunk);
+        const qint64 n = file.read(reinterpret_cast<char*>(data.data()) + done, kChunk);
+        if (n < 0) return fail(file.errorString());
+        data.resize(done + static_cast<size_t>(n));
+        if (n == 0) return data;  // QFile reads a pipe blocking: 0 is its end
+    }
 }
 
 }  // namespace vantorel

@@ -57,7 +57,11 @@ public:
     // "  (version 2: 12, version 3: 1729)"); the error or the problems, when there are any.
     std::string summary() const;
 
-    // The whole file at path, or nothing with *error set to "<path>: <reason>".
+    // The most read from a pipe or socket, whose size is not known beforehand.
+    static constexpr size_t kMaxStreamBytes = size_t{256} << 20;
+
+    // The whole file at path, or nothing with *error set to "<path>: <reason>": a
+    // directory, a device, a pipe that brings more than kMaxStreamBytes are refused.
     static std::optional<Bytes> loadFile(const std::string& path, std::string* error);
 };
 

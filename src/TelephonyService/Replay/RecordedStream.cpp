@@ -3,16 +3,19 @@
 
 #include "Platform/ByteReader.h"
 #include "Platform/LogCodes.h"
+#include "Platform/ServingCellCodes.h"
 #include "Platform/StringFormat.h"
 #include "Platform/TechnologyNames.h"
 #include "Platform/TelephonyIdentifiers.h"
 #include "PropertyList/PropertyListSerialization.h"
+#include "TelephonyService/LogMask.h"
 #include "TelephonyService/Replay/DiagPacket.h"
 #include "TelephonyService/Replay/DlfReader.h"
 #include "TelephonyService/Replay/QmdlReader.h"
 
 #include <QDateTime>
 
+#include <algorithm>
 #include <utility>
 
 namespace vantorel {
@@ -74,18 +77,19 @@ RecordedStream RecordedStream::open(const std::string& path, const std::string& 
 RecordedStream RecordedStream::fromBytes(ByteView data, const std::string& technology) {
     RecordedStream stream;
     stream.format_ = detect(data);
-    stream.technology_ = technology;
+    auto widen = [&stream](int64_t time) {
+        stream.timeSpan_ = stream.timeSpan_ ? std::pair{std::min(stream.timeSpan_->first, time),
+                                                        std::max(stream.timeSpan_->second, time)}
+                                            : std::pair{time, time};
+    };
     if (stream.format_ == Format::Capture) {
         Capture capture = CaptureReader::readBytes(data);
         stream.report_ = std::move(capture.report);
         if (!stream.ok()) return stream;
-        if (!capture.technology.empty()) {
-            stream.technology_ = std::move(capture.technology);
-            stream.technologyFromFile_ = true;
-        }
+        stream.declared_ = std::move(capture.technology);
         stream.messages_ = std::move(capture.messages);
-        if (!stream.messages_.empty())
-            stream.timeSpan_ = {stream.messages_.front().timeMicros, stream.messages_.back().timeMicros};
+        for (const TimedMessage& m : stream.messages_) widen(m.timeMicros);
+        stream.findTechnologies(technology);
         return stream;
     }
     stream.report_ = stream.format_ == Format::Dlf ? DlfReader::readBytes(data) : QmdlReader::readBytes(data);
@@ -93,25 +97,60 @@ RecordedStream RecordedStream::fromBytes(ByteView data, const std::string& techn
     for (RecordedEntry& entry : stream.report_.entries) {
         const int64_t time = DiagPacket::microsecondsSince1970(entry.timeStamp);
         // A zero time stamp (our DLF writer's version report) carries no time.
-        if (entry.timeStamp != 0)
-            stream.timeSpan_ = {stream.timeSpan_ ? stream.timeSpan_->first : time, time};
+        if (entry.timeStamp != 0) widen(time);
         stream.messages_.push_back(TimedMessage{time, 0, std::move(entry.record)});
     }
     stream.report_.entries.clear();
     stream.report_.entries.shrink_to_fit();
+    stream.findTechnologies(technology);
     return stream;
 }
 
-bool RecordedStream::holdsRecords() const {
-    return format_ == Format::Capture || report_.frames > 0 || report_.logPackets > 0 || report_.otherPackets > 0;
+void RecordedStream::findTechnologies(const std::string& override) {
+    if (!override.empty() && (declared_.empty() || declared_ == override)) {
+        spans_ = {TechnologySpan{0, override}};
+        return;
+    }
+    if (!declared_.empty()) spans_ = {TechnologySpan{0, declared_}};
+    for (size_t i = 0; i < messages_.size(); ++i) {
+        if (messages_[i].messageId != 0) continue;  // only records reach a decoder
+        const auto record = LogMask::classify(messages_[i].data);
+        if (!record || !record->isOrdinary()) continue;
+        const std::string technology = ServingCellCodes::technologyOf(record->code);
+        if (technology.empty() || (!spans_.empty() && spans_.back().technology == technology)) continue;
+        // The first serving cell tells what the records before it were, unless a header
+        // did; one on the first message corrects the header.
+        if (!spans_.empty() && spans_.back().from == i)
+            spans_.back().technology = technology;
+        else
+            spans_.push_back(TechnologySpan{spans_.empty() ? 0 : i, technology});
+    }
+    technologyFromFile_ = !spans_.empty();
+}
+
+std::string RecordedStream::technologyAt(size_t index) const {
+    // Spans are in message order: the last one starting at or before index.
+    const auto after = std::upper_bound(spans_.begin(), spans_.end(), index,
+                                        [](size_t i, const TechnologySpan& span) { return i < span.from; });
+    return after == spans_.begin() ? std::string() : std::prev(after)->technology;
+}
+
+std::vector<std::string> RecordedStream::technologies() const {
+    std::vector<std::string> out;
+    for (const TechnologySpan& span : spans_)
+        if (std::find(out.begin(), out.end(), span.technology) == out.end()) out.push_back(span.technology);
+    return out;
 }
 
 std::string RecordedStream::summary() const {
-    std::string out = StringFormat::format(
-        "%s, technology %s, %zu messages\n", formatName(),
-        technology_.empty() ? "unknown" : TechnologyNames::displayName(technology_).c_str(), messages_.size());
+    std::string names;
+    for (const std::string& technology : technologies())
+        names += (names.empty() ? "" : ", ") + TechnologyNames::displayName(technology);
+    std::string out = StringFormat::format("%s, %s %s, %zu messages\n", formatName(),
+                                           technologies().size() > 1 ? "technologies" : "technology",
+                                           names.empty() ? "unknown" : names.c_str(), messages_.size());
 
-    if (technology_ != kTSLogChannelTechnology_IFX || !ok()) return out + report_.summary() + timeSpanText();
+    if (technology() != kTSLogChannelTechnology_IFX || !ok()) return out + report_.summary() + timeSpanText();
     // The IFX modem sends property lists, not log records: count those instead of log codes.
     size_t lists = 0;
     for (const TimedMessage& m : messages_) lists += PropertyListSerialization::read(m.data).value.has_value();
@@ -123,9 +162,10 @@ std::string RecordedStream::summary() const {
 
 std::string RecordedStream::timeSpanText() const {
     if (!timeSpan_) return std::string();
+    // Garbage time stamps lie centuries apart: the difference is taken unsigned (latest >= earliest).
+    const uint64_t micros = static_cast<uint64_t>(timeSpan_->second) - static_cast<uint64_t>(timeSpan_->first);
     return StringFormat::format("time span %s to %s UTC (%.3f s)\n", timeText(timeSpan_->first).c_str(),
-                                timeText(timeSpan_->second).c_str(),
-                                static_cast<double>(timeSpan_->second - timeSpan_->first) / 1e6);
+                                timeText(timeSpan_->second).c_str(), static_cast<double>(micros) / 1e6);
 }
 
 }  // namespace vantorel

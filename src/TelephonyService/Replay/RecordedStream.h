@@ -13,20 +13,34 @@
 namespace vantorel {
 
 // Detection, in this order:
-//   - "VNTRLCAP" at the start: a capture (CaptureReader); its technology is the file's.
+//   - "VNTRLCAP" at the start: a capture (CaptureReader); its header names a technology.
 //   - a chain of DLF records (DlfReader's layout): the first record's length is at least
 //     12 and fits in the file, and either its code is LogCode::kDlfVersionReport (the version report the monitor's
 //     writer puts first) or at least 2 records chain exactly to the end of the file.
 //   - anything else: QMDL / mi2log (HDLC-framed DIAG, QmdlReader).
 // QMDL and DLF records become Morvek records (type byte 1 + DLF record, message id 0)
-// timed by their DIAG time stamps (DiagPacket::microsecondsSince1970); they carry no
-// technology, so the one passed in (from --technology) is used.
+// timed by their DIAG time stamps (DiagPacket::microsecondsSince1970).
+//
+// Technology: a modem logs its serving cell only on the radio it is on, so the stream's
+// serving-cell records (ServingCellCodes, the rule of the live modem) say which decoder
+// reads it, and when it moves: the technology of the first one holds from the first
+// message on (a capture's header instead, up to its first serving-cell record of another
+// technology), each later one of another technology starts a span of its own. A
+// technology passed in (--technology) holds for the whole stream instead, unless a
+// capture's header names another (callers refuse that contradiction).
 class RecordedStream {
 public:
     enum class Format { Capture, Dlf, Qmdl };
 
-    // Reads and parses the whole file. technology: the identifier to use when the file
-    // does not carry one (may be empty). On failure ok() is false and error() says why.
+    // The part of the stream, from message `from` on, that one technology's decoder reads.
+    struct TechnologySpan {
+        size_t from = 0;
+        std::string technology;
+        bool operator==(const TechnologySpan&) const = default;
+    };
+
+    // Reads and parses the whole file. technology: an identifier that overrides what the
+    // stream's records say (may be empty). On failure ok() is false and error() says why.
     static RecordedStream open(const std::string& path, const std::string& technology = {});
     static RecordedStream fromBytes(ByteView data, const std::string& technology = {});
 
@@ -38,32 +52,48 @@ public:
     const std::string& error() const { return report_.error; }
     Format format() const { return format_; }
     const char* formatName() const { return formatName(format_); }
-    // The capture's technology, else the one passed in; empty when neither is known.
-    const std::string& technology() const { return technology_; }
-    // True when the technology came from the file itself (a capture).
+    // The technology at the first message; empty when neither the override, nor a
+    // capture's header, nor a serving-cell record names one.
+    std::string technology() const { return spans_.empty() ? std::string() : spans_.front().technology; }
+    // The technology in effect at message `index` (the last span starting at or before it).
+    std::string technologyAt(size_t index) const;
+    // The spans in message order, the first from message 0; one for an override; none when
+    // no technology is known.
+    const std::vector<TechnologySpan>& technologySpans() const { return spans_; }
+    // Every technology of the spans, in the order they first appear.
+    std::vector<std::string> technologies() const;
+    // A capture's header technology (empty for DLF and QMDL, which carry none).
+    const std::string& declaredTechnology() const { return declared_; }
+    // True when the technology came from the file (its header or its serving-cell records).
     bool technologyFromFile() const { return technologyFromFile_; }
     const std::vector<TimedMessage>& messages() const { return messages_; }
     // Counts per log code and bad frames (RecordedLog's counters; its entries are empty,
     // their records are in messages()).
     const RecordedLog& report() const { return report_; }
 
-    // False for content in which no reader found anything: an empty file, random bytes
-    // (neither a capture header, nor a DLF record, nor a good QMDL frame).
-    bool holdsRecords() const;
-    // The times of the first and last message that carries one, microseconds since 1970
-    // (arrival times in a capture, DIAG time stamps in DLF and QMDL); empty when none does.
+    // False when no message came out: an empty file, random bytes, a capture header
+    // alone, a QMDL file of text and event packets only.
+    bool holdsRecords() const { return !messages_.empty(); }
+    // The earliest and the latest time of the messages that carry one, microseconds
+    // since 1970 (arrival times in a capture, DIAG time stamps in DLF and QMDL; recorded
+    // time may go back, between files or after a modem's clock reset); empty when none does.
     std::optional<std::pair<int64_t, int64_t>> timeSpan() const { return timeSpan_; }
 
-    // "<format>, technology <name>, <n> messages", then the report's summary (for the
-    // IFX channel, whose messages are property lists, the count of those that parse
-    // instead), then "time span <first> to <last> UTC (<s> s)" when messages carry times.
+    // "<format>, technology <name>, <n> messages" ("technologies <a>, <b>" when the modem
+    // moved, "technology unknown" when no serving-cell record tells), then the report's
+    // summary (for the IFX channel, whose messages are property lists, the count of those
+    // that parse instead), then "time span <earliest> to <latest> UTC (<s> s)" when
+    // messages carry times.
     std::string summary() const;
 
 private:
     std::string timeSpanText() const;
 
+    void findTechnologies(const std::string& override);
+
     Format format_ = Format::Qmdl;
-    std::string technology_;
+    std::string declared_;
+    std::vector<TechnologySpan> spans_;
     bool technologyFromFile_ = false;
     std::vector<TimedMessage> messages_;
     RecordedLog report_;
