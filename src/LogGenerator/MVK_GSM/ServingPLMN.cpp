@@ -76,11 +76,8 @@ void ServingPLMN::updateFromCellMonitor(ByteView data) const {
     const auto outcome = CellMonitor::showServingCell(
         data, {kTSCellMonitorRadioAccessTechnologyUMTS, kTSCellMonitorRadioAccessTechnologyGSM},
         CellMonitor::Pick::FirstCell, kFields, [this](const std::string& key, const std::string& text) { setValue(key, text); });
-    // A payload that does not parse leaves no list: both lines.
-    if (outcome == CellMonitor::Outcome::NotParsed) {
-        SystemLog::log(SystemLog::kError, "%s", "Cell Info Array data could not be constructed");
-        SystemLog::log(SystemLog::kError, "%s", "Failed to get Cell Array\n");
-    }
+    // A payload without a list of cells says why, in the lines UMTS Set uses too.
+    CellMonitor::logMissingList(outcome);
 }
 
 }  // namespace vantorel
