@@ -51,6 +51,15 @@ bool CellMonitor::matches(const Value& cell, std::initializer_list<const char*> 
     return false;
 }
 
+bool CellMonitor::logMissingList(Outcome outcome) {
+    if (outcome == Outcome::Read) return false;
+    // Nothing parsed means no array either: both lines, in the order they happen.
+    if (outcome == Outcome::NotParsed)
+        SystemLog::log(SystemLog::kError, "%s", "Cell Info Array data could not be constructed");
+    SystemLog::log(SystemLog::kError, "%s", "Failed to get Cell Array\n");
+    return true;
+}
+
 std::optional<int32_t> CellMonitor::number(const Value& cell, const char* key) {
     auto dict = cell.asDictionary();
     if (!dict) return std::nullopt;

@@ -44,6 +44,12 @@ public:
     static Outcome forEachCell(ByteView record, std::initializer_list<const char*> technologies, const char* cellType,
                                const Visit& visit);
 
+    // True when the outcome holds no cell list, after logging why at error priority: for
+    // a payload that is not a property list "Cell Info Array data could not be
+    // constructed" and then "Failed to get Cell Array\n", for a root that is not an array
+    // the second line alone. Nothing is logged for Read.
+    static bool logMissingList(Outcome outcome);
+
     // The cell's value under key as a signed 32-bit integer; empty when missing or
     // not a number.
     static std::optional<int32_t> number(const Value& cell, const char* key);

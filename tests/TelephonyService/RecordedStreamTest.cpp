@@ -288,6 +288,53 @@ TEST(DlfReader, SnapshotDlfsReadBackMessageByMessage) {
     }
 }
 
+TEST(DlfReader, OnlyOurOwnDlfsHoldMessageHeadersAnywhereElseAStrayByteStopsReading) {
+    const Bytes a = morvekRecord(0x7130, 1, {1}), b = morvekRecord(0xB0C1, 2, {});
+    Bytes extra = morvekRecord(0x0001, 3, {9});
+    extra[0] = LogCode::kExtraType;
+    Bytes version(kDLFVersionReportLength, 0);
+    unsigned written = 0;
+    ASSERT_EQ(DLFAddVersionReport(version.data(), kDLFVersionReportLength, &written, 1, 1, "(none)", "X", "Jan", 0, 0, 0), 0);
+    const Bytes versionEntry = [&] { Bytes m{LogCode::kOrdinaryType}; append(m, version); return m; }();
+    // Records after the first one, each behind a message header: [1], [0x81 0x00 1], [255].
+    const auto behindHeaders = [&](Bytes file) {
+        append(file, dlfOf(a));
+        append(file, Bytes{0x01});
+        append(file, dlfOf(b));
+        append(file, Bytes{0x81, 0x00});
+        append(file, a);
+        append(file, extra);
+        return file;
+    };
+    // A fuzzer's find: 0xFF, then a record of 37 bytes, then one of 15: read whole, the first
+    // record's length (0x25FF) runs past the end.
+    const Bytes typeByteFirst{
+        0xFF, 0x25, 0x00, 0xC2, 0xB0, 0x00, 0x00, 0x0D, 0x5E, 0x3E, 0xB2, 0xD0, 0x00, 0x02, 0x57, 0x00,
+        0x94, 0x16, 0xE4, 0x5C, 0x32, 0x32, 0x0F, 0x0B, 0x6D, 0x08, 0x40, 0x87, 0x11, 0x00, 0x00, 0x00,
+        0x36, 0x01, 0x03, 0x9A, 0x01, 0x00, 0x0F, 0x00, 0x32, 0x4F, 0xA9, 0x43, 0x00, 0x71, 0x00, 0xB2,
+        0xD0, 0xFF, 0xFF, 0xEF, 0xFF, 0x01, 0x01, 0xFF, 0xFF, 0x00, 0x03, 0x00, 0x00, 0x0F, 0x00, 0x30,
+        0x00, 0x03, 0x1E, 0x00, 0x71};
+    const struct {
+        const char* name;
+        Bytes file;
+        std::vector<Bytes> entries;
+        size_t problems;
+    } rows[] = {
+        {"our own DLF", behindHeaders(version), {versionEntry, a, b, a, extra}, 0},
+        {"a QXDM DLF", behindHeaders({}), {a}, 1},
+        {"a type byte before the first record", typeByteFirst, {}, 1},
+    };
+    for (const auto& row : rows) {
+        SCOPED_TRACE(row.name);
+        const RecordedLog log = DlfReader::readBytes(row.file);
+        std::vector<Bytes> entries;
+        for (const RecordedEntry& e : log.entries) entries.push_back(e.record);
+        EXPECT_EQ(entries, row.entries);
+        EXPECT_EQ(log.malformed + log.truncated, row.problems);
+        EXPECT_EQ(log.logPackets + log.otherPackets, row.entries.size());
+    }
+}
+
 TEST(RecordedStream, FormatIsDetectedFromTheContent) {
     const Bytes a = dlfOf(morvekRecord(0x7130, 1, {0x01}));
     Bytes chain = a;

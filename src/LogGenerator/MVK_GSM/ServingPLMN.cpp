@@ -2,6 +2,7 @@
 #include "LogGenerator/MVK_GSM/ServingPLMN.h"
 
 #include "LogGenerator/CellMonitor.h"
+#include "LogGenerator/MVK_GSM/BCDPLMN.h"
 #include "Platform/ByteReader.h"
 #include "Platform/LogCodes.h"
 #include "Platform/StringFormat.h"
@@ -19,18 +20,6 @@ const char* const kPLMNSelectionMode[] = {
 const char* const kServiceType[] = {
     "NO_SERVICE", "CS_ONLY", "PS_ONLY", "CS_PS_SERVICE", "LIMITED_SERVICE",
 };
-
-// BCD digit characters; a nibble above 9 (the 0xF filler) shows as a blank. The
-// high nibble is tested through the whole byte (< 0xA0), which is the same as the
-// nibble being below 10.
-char lowDigit(uint8_t byte) {
-    const uint8_t nibble = byte & 0x0F;
-    return nibble < 10 ? static_cast<char>('0' + nibble) : ' ';
-}
-
-char highDigit(uint8_t byte) {
-    return byte < 0xA0 ? static_cast<char>('0' + (byte >> 4)) : ' ';
-}
 
 }  // namespace
 
@@ -66,11 +55,11 @@ void ServingPLMN::updateRegistrationState(ByteView data) const {
 void ServingPLMN::updateServingPLMN(ByteView data) const {
     const ByteReader r(data);
     if (r.size() < 28) return;
-    const uint8_t b15 = r.u8(15).value_or(0);
-    const uint8_t b16 = r.u8(16).value_or(0);
-    const uint8_t b17 = r.u8(17).value_or(0);
-    setValue("Mobile Country Code", StringFormat::format("%c%c%c", lowDigit(b15), highDigit(b15), lowDigit(b16)));
-    setValue("Mobile Network Code", StringFormat::format("%c%c%c", lowDigit(b17), highDigit(b17), highDigit(b16)));
+    // A two-digit MNC keeps the blank of its filler ("10 "), as this display always showed it.
+    const BCDPLMN plmn = BCDPLMN::read(r.u8(15).value_or(0), r.u8(16).value_or(0), r.u8(17).value_or(0),
+                                       BCDPLMN::Filler::Blank);
+    setValue("Mobile Country Code", plmn.mcc);
+    setValue("Mobile Network Code", plmn.mnc);
     setValue("Location Area Code", StringFormat::format("%d", static_cast<int>(r.u16be(18).value_or(0))));
     setValue("Routing Area Code", StringFormat::format("%d", static_cast<int>(r.u8(20).value_or(0))));
     setValue("Service Type", tableText(kServiceType, r.u8(14).value_or(0)));
@@ -87,11 +76,8 @@ void ServingPLMN::updateFromCellMonitor(ByteView data) const {
     const auto outcome = CellMonitor::showServingCell(
         data, {kTSCellMonitorRadioAccessTechnologyUMTS, kTSCellMonitorRadioAccessTechnologyGSM},
         CellMonitor::Pick::FirstCell, kFields, [this](const std::string& key, const std::string& text) { setValue(key, text); });
-    // A payload that does not parse leaves no list: both lines.
-    if (outcome == CellMonitor::Outcome::NotParsed) {
-        SystemLog::log(SystemLog::kError, "%s", "Cell Info Array data could not be constructed");
-        SystemLog::log(SystemLog::kError, "%s", "Failed to get Cell Array\n");
-    }
+    // A payload without a list of cells says why, in the lines UMTS Set uses too.
+    CellMonitor::logMissingList(outcome);
 }
 
 }  // namespace vantorel

@@ -96,10 +96,8 @@ void UMTSSet::updateFromCellMonitor(ByteView data) const {
             rows->append(Value(row));
             return true;
         });
-    if (outcome != CellMonitor::Outcome::Read) {
-        SystemLog::log(SystemLog::kError, "%s", "Failed to get Cell Array\n");
-        return;
-    }
+    // A payload without a list of cells leaves the list empty.
+    if (CellMonitor::logMissingList(outcome)) return;
     replaceSectionArray(*rows);
 }
 

@@ -32,6 +32,15 @@ size_t messageHeaderAt(const ByteReader& r, size_t offset) {
     return 0;
 }
 
+// True for a file the monitor's own DLF writer made: it always leads with its version
+// report, of this code and length. Only such a file holds message headers between its
+// records; any other DLF is records back to back, so a record there that does not chain
+// on is damage to report, not a header to step over.
+bool isOwnSnapshotDlf(const ByteReader& r) {
+    return recordFits(r, 0) && r.u16(0) == DlfReader::kOwnVersionReportLength &&
+           r.u16(2) == uint16_t{LogCode::kDlfVersionReport};
+}
+
 // Where the record that follows a record boundary starts, and its type: the boundary
 // itself for a plain DLF (type 1), or past a message header (our own snapshot DLFs store
 // whole messages after an entry's first record). A header is skipped only when the
@@ -64,9 +73,11 @@ RecordedLog DlfReader::readFile(const std::string& path) {
 RecordedLog DlfReader::readBytes(ByteView data) {
     RecordedLog log;
     const ByteReader r(data);
+    const bool headersBetweenRecords = isOwnSnapshotDlf(r);
     size_t offset = 0;
     while (offset < r.size()) {
-        const auto [start, type] = recordStart(r, offset);
+        const auto [start, type] =
+            headersBetweenRecords ? recordStart(r, offset) : std::pair{offset, LogCode::kOrdinaryType};
         offset = start;
         if (!r.has(offset, 2)) {
             ++log.truncated;

@@ -14,14 +14,17 @@ namespace vantorel {
 // read like any other record. After it come the messages each display entry kept: an
 // entry's first record without its type byte, then whole messages
 //   [0x81 0x00] (optional prefix) | type u8 (1 ordinary, 255 extra) | record
-// so at a record boundary such a header is skipped when the record behind it is
-// well formed and chains on (see recordStart). Each record becomes the Morvek record
-// type byte 1 + the record. Records carry no sync marks, so at the first record with
-// len < 12 (malformed) or running past the end of the file (truncated) reading stops;
-// the records before it are kept.
+// so in a file led by that version report, at a record boundary such a header is
+// skipped when the record behind it is well formed and chains on (see recordStart).
+// Each record becomes the Morvek record type byte 1 + the record (255 + the record for
+// an extra record behind its header). Records carry no sync marks, so at the first
+// record with len < 12 (malformed) or running past the end of the file (truncated)
+// reading stops; the records before it are kept.
 class DlfReader {
 public:
     static constexpr size_t kRecordHeaderLength = 12;
+    // The length the monitor's DLF writer gives the version report it leads with.
+    static constexpr uint16_t kOwnVersionReportLength = 161;
 
     // A file that cannot be read gives a log with `error` set ("<path>: <reason>").
     static RecordedLog readFile(const std::string& path);

@@ -102,9 +102,9 @@ TEST(CapturedRecords, CmccServingPLMNWithoutServiceShowsEveryBCDNibbleAndTheLACA
                                          "Routing Area Code=100, Service Type=NO_SERVICE}");
 }
 
-// The captured 0x7150 records carry BCD PLMNs; the single-digit reading, kept on
-// purpose, makes these numbers of them.
-TEST(CapturedRecords, EquivalentPLMNRecordsDecodeWithTheSingleDigitReading) {
+// The phones' 0x7150 records carry BCD PLMN identities: the registered PLMN at 13..15,
+// the count at 16, the equivalent PLMNs from 17, then 0xFF filler.
+TEST(CapturedRecords, EquivalentPLMNRecordsShowThePhonesBCDPLMNs) {
     const RecordedLog cmcc = readCapture("cmcc.mi2log");
     const RecordedLog sprint = readCapture("sprint.mi2log");
     ASSERT_TRUE(cmcc.ok() && sprint.ok());
@@ -113,9 +113,10 @@ TEST(CapturedRecords, EquivalentPLMNRecordsDecodeWithTheSingleDigitReading) {
         const char* expected;
     };
     const Row rows[] = {
-        {firstEntry(cmcc, 0x7150, 3, 0x01), "[{Mobile Country Code=11375, Mobile Network Code=26805}]"},  // 64 F0 70 FF FF FF
-        {firstEntry(cmcc, 0x7150, 3, 0x00), "[]"},                                                         // count 0
-        {firstEntry(sprint, 0x7150, 1, 0x00), "[{Mobile Country Code=3635, Mobile Network Code=2905}]"},  // 13 01 94 FF FF FF
+        {firstEntry(cmcc, 0x7150, 3, 0x01), "[{Mobile Country Code=460, Mobile Network Code=07}]"},  // 64 F0 70
+        {firstEntry(cmcc, 0x7150, 3, 0x00), "[]"},                                                  // count 0
+        {firstEntry(sprint, 0x7150, 1, 0x00), "[{Mobile Country Code=311, Mobile Network Code=490}]"},  // 13 01 94
+        {firstEntry(sprint, 0x7150, 1, 0x01), "[{Mobile Country Code=310, Mobile Network Code=120}]"},  // 13 00 21
     };
     CapturedCodesIndex index;
     for (const Row& row : rows) {

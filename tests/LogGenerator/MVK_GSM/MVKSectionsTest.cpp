@@ -133,6 +133,28 @@ TEST(EquivalentPLMNListSection, EntriesOverlapStopAtTheRecordsEndAndEachRecordRe
         EXPECT_EQ(Bound<EquivalentPLMNList>(true).feed(records, 0x7150).shown(), expected);
 }
 
+TEST(EquivalentPLMNListSection, EntriesWithBytesAboveNineAreBCDPLMNIdentities) {
+    const auto list = [](uint8_t count, std::initializer_list<uint8_t> from17, size_t length) {
+        return Bound<EquivalentPLMNList>(true).feed(plmnListRecord(count, from17, length), 0x7150).shown();
+    };
+    const char* const sprint = "[{Mobile Country Code=311, Mobile Network Code=490}]";
+    const std::pair<std::string, const char*> rows[] = {
+        // As a phone writes it: 311-490 followed by unused 0xFF bytes.
+        {list(1, {0x13, 0x01, 0x94, 0xFF, 0xFF, 0xFF}, 30), sprint},
+        {list(2, {0x13, 0x00, 0x21, 0x13, 0x01, 0x94}, 23),
+         "[{Mobile Country Code=310, Mobile Network Code=120}, {Mobile Country Code=311, Mobile Network Code=490}]"},
+        // Leading zeros stay; a two-digit MNC drops its 0xF filler.
+        {list(2, {0x02, 0xF8, 0x10, 0x00, 0xF1, 0x10}, 23),
+         "[{Mobile Country Code=208, Mobile Network Code=01}, {Mobile Country Code=001, Mobile Network Code=01}]"},
+        // A BCD entry needs only its three bytes inside the record; the list ends at the next.
+        {list(3, {0x13, 0x01, 0x94}, 20), sprint},
+        {list(2, {0x13, 0x01, 0x94, 0x13}, 22), sprint},
+        // Six single-digit bytes keep the digit-per-byte reading, without leading zeros.
+        {list(1, {0, 0, 0, 1, 1, 0, 0xFF}, 24), "[{Mobile Country Code=1, Mobile Network Code=10}]"},
+    };
+    for (const auto& [shown, expected] : rows) EXPECT_EQ(shown, expected);
+}
+
 Bytes pdpRecord(Value root) { return RecordBuilder::extraPropertyList(2, root); }
 
 Value context(const char* apn) {

@@ -3,6 +3,7 @@
 #include "LogGenerator/MVK_GSM/DetectedSet.h"
 #include "LogGenerator/MVK_GSM/GSMSet.h"
 #include "LogGenerator/MVK_GSM/MonitoredSet.h"
+#include "LogGenerator/MVK_GSM/ServingPLMN.h"
 #include "LogGenerator/MVK_GSM/UMTSRRInfo.h"
 #include "LogGenerator/MVK_GSM/UMTSSet.h"
 #include "LogGenerator/MVK_GSM/VirtualActiveSet.h"
@@ -114,6 +115,32 @@ TEST(RankingSets, UMTSSetListsCellMonitorNeighboursAndNamesWhatIsMissing) {
     b.feed(RecordBuilder::extraPropertyList(1, Value(Dictionary::create())), 0xFF0001);
     EXPECT_EQ(b.shown(), "[]");
     EXPECT_EQ(errorLines(log), std::vector<std::string>{"Failed to get Cell Array\n"});
+}
+
+template <class Section>
+std::vector<std::string> linesForCellMonitor(const Bytes& record, bool asList) {
+    SystemLogCapture log;
+    Bound<Section>(asList).feed(record, 0xFF0001);
+    return errorLines(log);
+}
+
+TEST(RankingSets, UMTSSetAndServingPLMNSayAlikeWhyACellMonitorPayloadHoldsNoCells) {
+    const std::string constructed = "Cell Info Array data could not be constructed";
+    const std::string noArray = "Failed to get Cell Array\n";
+    const std::pair<Bytes, std::vector<std::string>> rows[] = {
+        {RecordBuilder::extra(1, 20).bytes(13, {'n', 'o', 't', ' ', 'a', 'n', 'y'}).build(), {constructed, noArray}},
+        {RecordBuilder::extra(1, 13).build(), {constructed, noArray}},
+        {RecordBuilder::extraPropertyList(1, Value(Dictionary::create())), {noArray}},
+        {cellMonitor({}), {}},
+    };
+    for (const auto& [record, lines] : rows) {
+        EXPECT_EQ(linesForCellMonitor<UMTSSet>(record, true), lines);
+        EXPECT_EQ(linesForCellMonitor<ServingPLMN>(record, false), lines);
+    }
+    // The list is emptied all the same.
+    Bound<UMTSSet> b(true);
+    b.feed(cellMonitor({cell(kUMTS, kNeighbour, {{kTSCellMonitorSCN, 12}})}), 0xFF0001);
+    EXPECT_EQ(b.feed(rows[0].first, 0xFF0001).shown(), "[]");
 }
 
 // 0x4031: 14 count, samples of 14 bytes from 16 with the s16 raw value at 4.
