@@ -1,6 +1,8 @@
 // DecodeCommand: `vantorel-cli decode [--technology TECH] FILE...`: every message to the decoder, then the display it builds.
 #include "cli/DecodeCommand.h"
 
+#include "cli/CommandOptions.h"
+
 #include "LogGenerator/LogGenerator.h"
 #include "Platform/SystemLog.h"
 #include "Platform/TechnologyNames.h"
@@ -102,15 +104,7 @@ int DecodeCommand::run(const QStringList& args) {
     parser.addOption({"verbose", "Mirror the system log to stderr."});
     parser.addPositionalArgument("FILE", "QXDM DLF, QMDL/mi2log or Vantorel capture files, decoded in order.",
                                  "FILE...");
-    // parse(), not process(): a usage error is exit code 2, as everywhere.
-    if (!parser.parse(QStringList{kPrefix} + args)) {
-        std::fprintf(stderr, "%s: %s (see --help)\n", kPrefix, qPrintable(parser.errorText()));
-        return 2;
-    }
-    if (parser.isSet(helpOption) || parser.isSet("help-all")) {
-        std::fputs(qPrintable(parser.helpText()), stdout);
-        return 0;
-    }
+    if (const auto exitCode = CommandOptions::parse(parser, helpOption, kPrefix, args)) return *exitCode;
     SystemLog::setMirrorToStderr(parser.isSet("verbose"));
 
     const auto format = TreeFormatter::parse(parser.value("format").toStdString());
@@ -225,13 +219,6 @@ int DecodeCommand::run(const QStringList& args) {
         StdoutToStderr teardown;  // "Deallocing ClassIndex" is not part of the output
         current.decoder.reset();
     }
-    std::fwrite(text.data(), 1, text.size(), stdout);
-    std::fprintf(stderr, "%llu messages read, %llu skipped (message id not 0), %llu bad frames\n",
-                 static_cast<unsigned long long>(read), static_cast<unsigned long long>(skipped),
-                 static_cast<unsigned long long>(badFrames));
-    if (csv.enabled())
-        std::fprintf(stderr, "%llu CSV rows written to %s\n", static_cast<unsigned long long>(csv.rows()),
-                     qPrintable(parser.value("csv")));
     // The IFX decoder shows only messages that are whole displays: a file of log records
     // gives it none, which is said rather than printed as an empty screen.
     if (!display) {
@@ -239,6 +226,13 @@ int DecodeCommand::run(const QStringList& args) {
                      TechnologyNames::displayName(current.technology).c_str());
         return 1;
     }
+    std::fwrite(text.data(), 1, text.size(), stdout);
+    std::fprintf(stderr, "%llu messages read, %llu skipped (message id not 0), %llu bad frames\n",
+                 static_cast<unsigned long long>(read), static_cast<unsigned long long>(skipped),
+                 static_cast<unsigned long long>(badFrames));
+    if (csv.enabled())
+        std::fprintf(stderr, "%llu CSV rows written to %s\n", static_cast<unsigned long long>(csv.rows()),
+                     qPrintable(parser.value("csv")));
     return failures ? 1 : 0;
 }
 

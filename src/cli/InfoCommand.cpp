@@ -1,6 +1,8 @@
 // InfoCommand: `vantorel-cli info`, an account of every frame of recorded streams (RecordedStream's report).
 #include "cli/InfoCommand.h"
 
+#include "cli/CommandOptions.h"
+
 #include "Platform/TechnologyNames.h"
 #include "TelephonyService/Replay/RecordedStream.h"
 
@@ -18,15 +20,7 @@ int InfoCommand::run(const QStringList& args) {
                                      "every bad frame. A file in which no record is found is an error (exit 1).");
     const QCommandLineOption helpOption = parser.addHelpOption();
     parser.addPositionalArgument("FILE", "QXDM DLF, QMDL/mi2log or Vantorel capture files.", "FILE...");
-    // parse(), not process(): a usage error is exit code 2, as everywhere.
-    if (!parser.parse(QStringList{"vantorel-cli info"} + args)) {
-        std::fprintf(stderr, "vantorel-cli info: %s (see --help)\n", qPrintable(parser.errorText()));
-        return 2;
-    }
-    if (parser.isSet(helpOption) || parser.isSet("help-all")) {
-        std::fputs(qPrintable(parser.helpText()), stdout);
-        return 0;
-    }
+    if (const auto exitCode = CommandOptions::parse(parser, helpOption, "vantorel-cli info", args)) return *exitCode;
     if (parser.positionalArguments().isEmpty()) {
         std::fprintf(stderr, "vantorel-cli info: no FILE given (see --help)\n");
         return 2;

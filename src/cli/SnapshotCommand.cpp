@@ -1,6 +1,8 @@
 // SnapshotCommand: `vantorel-cli snapshot`: reads a VantorelSnapshot-*.vantorel file with libplist, lists it and writes out its DLF.
 #include "cli/SnapshotCommand.h"
 
+#include "cli/CommandOptions.h"
+
 #include "Monitor/TreeFormatter.h"
 #include "Platform/TerminalText.h"
 #include "PropertyList/Array.h"
@@ -147,15 +149,7 @@ int SnapshotCommand::run(const QStringList& args) {
     parser.addOption({"format", "Each entry's display: tree (as the panes show it), json, plist or display.",
                       "FORMAT", "tree"});
     parser.addPositionalArgument("FILE", "A snapshot file (property list).", "FILE");
-    // parse(), not process(): a usage error is an exit code, not an exit from inside.
-    if (!parser.parse(QStringList{kPrefix} + args)) {
-        std::fprintf(stderr, "%s: %s (see --help)\n", kPrefix, qPrintable(parser.errorText()));
-        return 2;
-    }
-    if (parser.isSet(helpOption) || parser.isSet("help-all")) {
-        std::fputs(qPrintable(parser.helpText()), stdout);
-        return 0;
-    }
+    if (const auto exitCode = CommandOptions::parse(parser, helpOption, kPrefix, args)) return *exitCode;
     const QStringList files = parser.positionalArguments();
     if (files.size() != 1) {
         std::fprintf(stderr, "%s: %s (see --help)\n", kPrefix,

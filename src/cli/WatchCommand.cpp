@@ -1,6 +1,8 @@
 // WatchCommand: `vantorel-cli watch` runs the monitor with the terminal view as its application object.
 #include "cli/WatchCommand.h"
 
+#include "cli/CommandOptions.h"
+
 #include "Model/SignalCatalogue.h"
 #include "Model/VantorelModel.h"
 #include "Platform/SystemLog.h"
@@ -31,15 +33,7 @@ int WatchCommand::run(const QStringList& args) {
                       "a CSV header with its unit is taken too.",
                       "KEY"});
     parser.addOption({"verbose", "Mirror the system log to stderr."});
-    // parse(), not process(): a usage error is exit code 2, as everywhere.
-    if (!parser.parse(QStringList{"vantorel-cli watch"} + args)) {
-        std::fprintf(stderr, "vantorel-cli watch: %s (see --help)\n", qPrintable(parser.errorText()));
-        return 2;
-    }
-    if (parser.isSet(helpOption) || parser.isSet("help-all")) {
-        std::fputs(qPrintable(parser.helpText()), stdout);
-        return 0;
-    }
+    if (const auto exitCode = CommandOptions::parse(parser, helpOption, "vantorel-cli watch", args)) return *exitCode;
     SystemLog::setMirrorToStderr(parser.isSet("verbose"));
 
     std::string error;
