@@ -21,7 +21,7 @@ class DiagSession;
 // The technology: --technology when given; otherwise the one whose serving-cell record came
 // last (servingCellCodes()), which the backend always asks the modem for; before the first
 // one, kDefaultTechnology (most modems in use are on LTE; a wrong guess is corrected by the
-// first serving-cell record, and technologyChanged() restarts the monitor's decoder). The
+// first serving-cell record, and technologyChanged() tells the monitors, whose decoders follow). The
 // mobility records 0x7130-0x7150 belong to several technologies and decide nothing.
 //
 // Life: start() opens the port (an error there fails the start at once: the user typed a

@@ -59,8 +59,8 @@ int main(int argc, char** argv) {
     const QCommandLineOption loop(QStringLiteral("loop"), QStringLiteral("Start the replay over at its end."));
     const QCommandLineOption technology(
         QStringLiteral("technology"),
-        QStringLiteral("The technology of a replayed file that does not carry one (QMDL, DLF), or of the --device "
-                       "modem (default: learnt from its serving-cell records): %1.").arg(names),
+        QStringLiteral("The technology of a replayed file or of the --device modem, over what their "
+                       "serving-cell records say (default: learnt from those records): %1.").arg(names),
         QStringLiteral("TECH"));
     const QCommandLineOption record(
         QStringLiteral("record"),
