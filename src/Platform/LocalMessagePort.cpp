@@ -128,7 +128,12 @@ bool LocalMessagePort::listen(CreateFailure* failure) {
 bool LocalMessagePort::shareWithGroup(gid_t group, std::string* error) {
     const std::string path = socketPath();
     // Read and write for the group: connecting to a Unix socket takes write permission.
-    if (path.empty() || ::chown(path.c_str(), static_cast<uid_t>(-1), group) != 0 || ::chmod(path.c_str(), 0660) != 0) {
+    // lchown, and chmod only on what lstat shows is our socket: a link put in its place is
+    // never followed (the directory itself may not be writable by others: foreignDirectory).
+    struct stat st {};
+    const bool ours = !path.empty() && ::lstat(path.c_str(), &st) == 0 && S_ISSOCK(st.st_mode) && st.st_uid == ::geteuid();
+    if (!ours) errno = EPERM;
+    if (!ours || ::lchown(path.c_str(), static_cast<uid_t>(-1), group) != 0 || ::chmod(path.c_str(), 0660) != 0) {
         if (error)
             *error = StringFormat::format("cannot give the socket %s to group %u: %s", path.c_str(),
                                           static_cast<unsigned>(group), std::strerror(errno));

@@ -103,12 +103,10 @@ std::string PortDirectory::path(std::string* error) {
     // Once per directory and process: the sockets a killed process left there.
     static std::mutex mutex;
     static std::set<std::string> swept;
-    bool first = false;
-    {
-        const std::lock_guard<std::mutex> lock(mutex);
-        first = swept.insert(directory).second;
-    }
-    if (first) removeStaleSockets(directory);
+    // Held through the sweep: a port another thread of this process binds meanwhile waits
+    // for it, rather than being taken for stale between its bind and its listen.
+    const std::lock_guard<std::mutex> lock(mutex);
+    if (swept.insert(directory).second) removeStaleSockets(directory);
     return directory;
 }
 
@@ -121,7 +119,12 @@ std::string PortDirectory::socketPathFor(const std::string& name, std::string* e
 std::string PortDirectory::foreignDirectory(const std::string& directory) {
     struct stat st {};
     if (::stat(directory.c_str(), &st) != 0) return "";
-    return st.st_uid == ::geteuid() || st.st_uid == 0 ? "" : notOurs("the directory", directory, st.st_uid);
+    if (st.st_uid != ::geteuid() && st.st_uid != 0) return notOurs("the directory", directory, st.st_uid);
+    // Where others may rename or replace files, a socket's name could be swapped for a link
+    // to another file before it is given to a group: only the sticky bit prevents that.
+    if ((st.st_mode & (S_IWGRP | S_IWOTH)) && !(st.st_mode & S_ISVTX))
+        return "the directory " + directory + " is writable by other users";
+    return "";
 }
 
 int PortDirectory::removeStaleSockets(const std::string& directory, const std::string& prefix) {
@@ -142,7 +145,11 @@ int PortDirectory::removeStaleSockets(const std::string& directory, const std::s
         const bool live = probe.waitForConnected(kProbeTimeoutMs);
         const bool refused = !live && probe.error() == QLocalSocket::ConnectionRefusedError;
         probe.abort();
-        if (refused && ::unlink(file.c_str()) == 0) ++removed;
+        if (!refused) continue;
+        // A port bound since the list was read refuses until it listens: read it again.
+        const std::optional<std::set<std::string>> boundNow = boundSocketPaths();
+        if (boundNow && boundNow->count(file)) continue;
+        if (::unlink(file.c_str()) == 0) ++removed;
     }
     if (removed > 0)
         SystemLog::log(SystemLog::kNotice, "Message ports: %d stale sockets left by stopped processes removed from %s",

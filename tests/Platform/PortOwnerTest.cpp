@@ -122,7 +122,7 @@ int requestAs(const std::string& path, uid_t uid, gid_t gid) {
 TEST(PortOwner, ASecondUsersSquatterIsRefusedWhereverItSitsAndNeverAnswersInOurPlace) {
     SKIP_UNLESS_ROOT();
     struct Scene {
-        Scene() { ::chmod(dir.path().toLocal8Bit().constData(), 0777); }  // the squatters may reach into it
+        Scene() { ::chmod(dir.path().toLocal8Bit().constData(), 01777); }  // the squatters may reach into it, as into /tmp
         QTemporaryDir dir;
         std::vector<std::unique_ptr<ScopedEnv>> env;
         Listeners squatters;
@@ -159,6 +159,11 @@ TEST(PortOwner, ASecondUsersSquatterIsRefusedWhereverItSitsAndNeverAnswersInOurP
              s.squatters.add(s.at("live"), kNobody, kNogroup);
              return s.at("live");
          }, "the socket @/live belongs to uid 65534"},
+        {"a socket under an absolute name in a directory others can rename in", [](Scene& s) {
+             ::mkdir(s.at("open").c_str(), 0777);
+             ::chmod(s.at("open").c_str(), 0777);  // no sticky bit
+             return s.at("open/port");
+         }, "the directory @/open is writable by other users"},
         {"another user's stale socket", [](Scene& s) {
              leaveStaleSocket(s.at("stale"), kNobody);
              return s.at("stale");
@@ -188,7 +193,7 @@ TEST(PortOwner, ASecondUsersSquatterIsRefusedWhereverItSitsAndNeverAnswersInOurP
 TEST(PortOwner, APortServesItsUserAndRootAndAnotherUserOnlyThroughTheGroupItIsSharedWith) {
     SKIP_UNLESS_ROOT();
     QTemporaryDir dir;
-    ::chmod(dir.path().toLocal8Bit().constData(), 0777);
+    ::chmod(dir.path().toLocal8Bit().constData(), 01777);  // as /tmp: anyone may add, nobody may swap
     const group* daemonGroup = ::getgrnam("daemon");  // a group nobody is not in
     ASSERT_TRUE(daemonGroup);
     const std::vector<std::tuple<const char*, uid_t, std::optional<gid_t>, int>> rows = {
