@@ -124,14 +124,15 @@ bool MonitorLauncher::startService(const Source& source, std::string* error) {
     return false;
 }
 
-std::optional<std::string> MonitorLauncher::deviceService(const Source& source, std::string* error) {
+std::optional<std::string> MonitorLauncher::deviceService(const Source& source, std::string* error, int joinWaitMs) {
     // The device's service may be another monitor's: join it rather than take the port from
     // under it. Tried again when another monitor took the device meanwhile.
     for (int attempt = 0;; ++attempt) {
         if (const std::optional<DeviceLock::Holder> holder = DeviceLock::holder(source.device)) {
-            if (!serviceAnswers(holder->servicePort, kJoinWaitMs)) {
-                *error = StringFormat::format("%s is in use by %s (pid %d), whose service does not answer",
-                                              source.device.c_str(), holder->program.c_str(), int(holder->pid));
+            if (!serviceAnswers(holder->servicePort, joinWaitMs)) {
+                DeviceLock::Holder named = *holder;
+                named.servicePort.clear();  // no advice to watch a service that does not answer
+                *error = DeviceLock::describe(source.device, named) + ", whose service does not answer";
                 return std::nullopt;
             }
             description_ = StringFormat::format("device %s, with the service of %s (pid %d)", source.device.c_str(),
@@ -182,7 +183,8 @@ bool MonitorLauncher::start(const Source& source, ApplicationObject* application
         model->setServiceResolver([this, source, joined = serviceName] {
             if (service_) return service_->portName();
             std::string why;
-            const std::optional<std::string> name = deviceService(source, &why);
+            // On the event loop: one look, no waiting; the model's retry timer waits.
+            const std::optional<std::string> name = deviceService(source, &why, 0);
             if (!name) {
                 SystemLog::log(SystemLog::kError, "Device %s: %s", source.device.c_str(), why.c_str());
                 return joined;

@@ -58,7 +58,7 @@ private:
     bool startService(const Source& source, std::string* error);
     // The port of the device's service: another process's that answers, else one started
     // here; none with *error (a holder that does not answer, a device that cannot be opened).
-    std::optional<std::string> deviceService(const Source& source, std::string* error);
+    std::optional<std::string> deviceService(const Source& source, std::string* error, int joinWaitMs = kJoinWaitMs);
 
     std::unique_ptr<TelephonyServiceThread> service_;
     std::unique_ptr<VantorelModel> model_;

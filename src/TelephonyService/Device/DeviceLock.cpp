@@ -58,6 +58,9 @@ bool alive(pid_t pid) { return ::kill(pid, 0) == 0 || errno == EPERM; }
 // Reads the holder of a lock held by someone else, waiting a little for one still writing.
 std::optional<DeviceLock::Holder> heldBy(int fd, const std::string& path) {
     for (int waited = 0;; waited += kRetryStepMs) {
+        // Unlinked: its holder has left (it unlinks before it unlocks); the name is free.
+        struct stat st {};
+        if (::fstat(fd, &st) == 0 && st.st_nlink == 0) return std::nullopt;
         if (const auto holder = readHolder(fd); holder && alive(holder->pid)) return holder;
         // Free after all (a holder that just left, or one only looking): nobody to name.
         if (::flock(fd, LOCK_SH | LOCK_NB) == 0) {
@@ -73,7 +76,14 @@ std::optional<DeviceLock::Holder> heldBy(int fd, const std::string& path) {
 
 std::string DeviceLock::lockPathFor(const std::string& device, std::string* error) {
     const std::string dir = PortDirectory::path(error);
-    return dir.empty() ? std::string() : dir + "/device-" + keyOf(device) + ".lock";
+    if (dir.empty()) return std::string();
+    // A folder of their own: no port name in the runtime directory can take a lock's place.
+    const std::string locks = dir + "/locks";
+    if (::mkdir(locks.c_str(), 0700) != 0 && errno != EEXIST) {
+        if (error) *error = StringFormat::format("cannot make %s: %s", locks.c_str(), std::strerror(errno));
+        return std::string();
+    }
+    return locks + "/device-" + keyOf(device) + ".lock";
 }
 
 std::unique_ptr<DeviceLock> DeviceLock::acquire(const std::string& device, const std::string& servicePort,

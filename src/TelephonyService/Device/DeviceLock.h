@@ -12,7 +12,7 @@ namespace vantorel {
 // Two services on one DIAG port take each other's replies and switch logging off under each
 // other; the service that opens a device therefore holds this lock for its whole life (also
 // while no client streams and the port itself is closed). The lock is flock(2) on
-// <directory>/device-<key>.lock, which the kernel releases when the holder dies, so a lock
+// <directory>/locks/device-<key>.lock, which the kernel releases when the holder dies, so a lock
 // file left behind by a crash never blocks anyone. Its content, written by the holder:
 //
 //   <pid>\n<program>\n<service port name>\n
