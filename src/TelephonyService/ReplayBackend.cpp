@@ -119,6 +119,7 @@ void ReplayBackend::run() {
     while (sent < kBatch) {
         if (index_ >= messages.size()) {
             endPass();
+            if (state() != State::Streaming || isPaused()) return;  // stopped from the last tick's slot
             if (!loop_ || messages.empty()) {
                 setState(State::Finished);
                 return;

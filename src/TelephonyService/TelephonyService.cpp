@@ -106,12 +106,7 @@ std::unique_ptr<ModemBackend> TelephonyService::createBackend(const TelephonySer
         return fail(StringFormat::format("speed %g: give 0 (as fast as the client takes it) or more", options.speed));
     RecordedStream stream = RecordedStream::open(options.replay, technology);
     if (!stream.ok()) return fail(stream.error());
-    if (!stream.holdsRecords())
-        return fail(StringFormat::format("%s: no record in it (read as %s)", options.replay.c_str(), stream.formatName()));
-    if (stream.technology().empty())
-        return fail(StringFormat::format(
-            "%s: no serving-cell record tells which modem recorded it: --technology TECH is needed (names: %s)",
-            options.replay.c_str(), TechnologyNames::listing().c_str()));
+    if (const std::string why = stream.unusable(true); !why.empty()) return fail(options.replay + ": " + why);
     if (!technology.empty() && !stream.declaredTechnology().empty() && technology != stream.declaredTechnology())
         SystemLog::log(SystemLog::kWarning, "Telephony service: --technology %s ignored, the capture %s says %s",
                        options.technology.c_str(), options.replay.c_str(),

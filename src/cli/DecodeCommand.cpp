@@ -33,8 +33,8 @@ public:
         if (const auto due = ticks_.before(m.timeMicros)) tick(due->timeMs, decoder, state, technology);
     }
     void afterMessage() { ticks_.after(); }
-    // The messages so far get their tick (a file ends, the decoder changes) and the next
-    // message starts a new grid: the next file's recorded time may lie before the last one's.
+    // The messages so far get their tick (a file ends) and the next message starts a new
+    // grid: the next file's recorded time may lie before the last one's.
     void atEnd(LogGenerator& decoder, Dictionary& state, const std::string& technology) {
         if (const auto due = ticks_.end()) tick(due->timeMs, decoder, state, technology);
     }
@@ -156,15 +156,8 @@ int DecodeCommand::run(const QStringList& args) {
         const RecordedLog& report = stream.report();
         badFrames += report.badCrc + report.malformed + report.truncated;
         // One line per file the decoders have nothing of, whatever the reason.
-        if (!stream.holdsRecords()) {
-            std::fprintf(stderr, "%s: %s: no record in it (%s file; %zu bad frames)\n", kPrefix, qPrintable(path),
-                         stream.formatName(), report.badCrc + report.malformed + report.truncated);
-            ++failures;
-            continue;
-        }
-        if (stream.technology().empty()) {
-            std::fprintf(stderr, "%s: %s: no serving-cell record tells its technology: add --technology (%s)\n",
-                         kPrefix, qPrintable(path), TechnologyNames::listing().c_str());
+        if (const std::string why = stream.unusable(true); !why.empty()) {
+            std::fprintf(stderr, "%s: %s: %s\n", kPrefix, qPrintable(path), why.c_str());
             ++failures;
             continue;
         }
@@ -175,7 +168,8 @@ int DecodeCommand::run(const QStringList& args) {
             const TimedMessage& m = messages[i];
             const std::string at = stream.technologyAt(i);
             if (at != current.technology) {
-                if (current.decoder && csv.enabled()) ticks.atEnd(*current.decoder, state, current.technology);
+                // A tick this message closes is the last decoder's, as in a replay (one grid per file).
+                if (current.decoder && csv.enabled()) ticks.beforeMessage(m, *current.decoder, state, current.technology);
                 if (!current.use(at, state)) {
                     std::fprintf(stderr, "%s: no decoder for %s\n", kPrefix, TechnologyNames::displayName(at).c_str());
                     return 1;

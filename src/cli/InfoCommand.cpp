@@ -33,10 +33,8 @@ int InfoCommand::run(const QStringList& args) {
             ++failures;
             continue;
         }
-        if (!stream.holdsRecords()) {
-            const RecordedLog& report = stream.report();
-            std::fprintf(stderr, "vantorel-cli info: %s: no record in it (read as %s; %zu bad frames)\n",
-                         qPrintable(path), stream.formatName(), report.badCrc + report.malformed + report.truncated);
+        if (const std::string why = stream.unusable(false); !why.empty()) {
+            std::fprintf(stderr, "vantorel-cli info: %s: %s\n", qPrintable(path), why.c_str());
             ++failures;
             continue;
         }

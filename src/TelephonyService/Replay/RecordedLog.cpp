@@ -79,6 +79,10 @@ std::optional<Bytes> RecordedLog::loadFile(const std::string& path, std::string*
     Bytes data;
     if (S_ISREG(info.st_mode)) {
         const qint64 size = file.size();
+        if (static_cast<uint64_t>(size) > kMaxFileBytes)
+            return fail(QStringLiteral("%1 MiB: larger than the %2 MiB a recording is read whole up to")
+                            .arg(static_cast<qulonglong>(size >> 20))
+                            .arg(static_cast<qulonglong>(kMaxFileBytes >> 20)));
         data.resize(static_cast<size_t>(std::max<qint64>(size, 0)));
         qint64 done = 0;
         while (done < size) {

@@ -59,6 +59,9 @@ public:
 
     // The most read from a pipe or socket, whose size is not known beforehand.
     static constexpr size_t kMaxStreamBytes = size_t{256} << 20;
+    // A file is held whole while it is read (its records too): one larger than this is
+    // refused rather than exhausting memory (a sparse or runaway file says any size).
+    static constexpr size_t kMaxFileBytes = size_t{2} << 30;
 
     // The whole file at path, or nothing with *error set to "<path>: <reason>": a
     // directory, a device, a pipe that brings more than kMaxStreamBytes are refused.

@@ -74,6 +74,15 @@ RecordedStream RecordedStream::open(const std::string& path, const std::string& 
     return stream;
 }
 
+std::string RecordedStream::unusable(bool needTechnology) const {
+    if (!holdsRecords())
+        return StringFormat::format("no record in it (read as %s; %zu bad frames)", formatName(),
+                                    report_.badCrc + report_.malformed + report_.truncated);
+    if (needTechnology && technology().empty())
+        return "no serving-cell record tells its technology: add --technology (" + TechnologyNames::listing() + ")";
+    return "";
+}
+
 RecordedStream RecordedStream::fromBytes(ByteView data, const std::string& technology) {
     RecordedStream stream;
     stream.format_ = detect(data);
@@ -125,7 +134,6 @@ void RecordedStream::findTechnologies(const std::string& override) {
         else
             spans_.push_back(TechnologySpan{spans_.empty() ? 0 : i, technology});
     }
-    technologyFromFile_ = !spans_.empty();
 }
 
 std::string RecordedStream::technologyAt(size_t index) const {

@@ -27,7 +27,8 @@ namespace vantorel {
 // message on (a capture's header instead, up to its first serving-cell record of another
 // technology), each later one of another technology starts a span of its own. A
 // technology passed in (--technology) holds for the whole stream instead, unless a
-// capture's header names another (callers refuse that contradiction).
+// capture's header names another (decode refuses that contradiction; the service keeps
+// the header's and says so).
 class RecordedStream {
 public:
     enum class Format { Capture, Dlf, Qmdl };
@@ -64,8 +65,10 @@ public:
     std::vector<std::string> technologies() const;
     // A capture's header technology (empty for DLF and QMDL, which carry none).
     const std::string& declaredTechnology() const { return declared_; }
-    // True when the technology came from the file (its header or its serving-cell records).
-    bool technologyFromFile() const { return technologyFromFile_; }
+    // Why no decoder can be given this stream, in one line for the user ("no record in it
+    // (read as QMDL; 3 bad frames)", "no serving-cell record tells its technology: add
+    // --technology (...)"); empty when it can. The technology only when `needTechnology`.
+    std::string unusable(bool needTechnology) const;
     const std::vector<TimedMessage>& messages() const { return messages_; }
     // Counts per log code and bad frames (RecordedLog's counters; its entries are empty,
     // their records are in messages()).
@@ -94,7 +97,6 @@ private:
     Format format_ = Format::Qmdl;
     std::string declared_;
     std::vector<TechnologySpan> spans_;
-    bool technologyFromFile_ = false;
     std::vector<TimedMessage> messages_;
     RecordedLog report_;
     std::optional<std::pair<int64_t, int64_t>> timeSpan_;
