@@ -114,10 +114,12 @@ QVariant ListTableModel::data(const QModelIndex& index, int role) const {
 QVariant ListTableModel::headerData(int section, Qt::Orientation orientation, int role) const {
     if (orientation == Qt::Horizontal && section >= 0 && section < columnCount() &&
         (role == Qt::DisplayRole || role == Qt::ToolTipRole)) {
-        // The unit from the catalogue: the display strings may carry another word ("Srxlev 22 dBm" is dB).
+        // The unit from the catalogue: the display strings may carry another word ("Srxlev 22 dBm"
+        // is dB). Only where the cells' numbers are in it: a value the catalogue converts
+        // (TD-SCDMA's RSCP report, RxLev from dBm) keeps the plain key over its display strings.
         const std::optional<SignalQuantity> quantity =
-            path_.empty() ? std::nullopt : SignalCatalogue::find("", path_ + "/0/" + key(section));
-        if (!quantity) return QString::fromStdString(key(section));
+            path_.empty() ? std::nullopt : SignalCatalogue::find("", path_ + "/0/" + key(section), leaf(0, key(section)));
+        if (!quantity || quantity->scale != 1 || quantity->offset != 0) return QString::fromStdString(key(section));
         if (role == Qt::ToolTipRole)
             return QString::fromStdString(quantity->name + ": " + quantity->quantity +
                                           (quantity->unit.empty() ? "" : ", " + quantity->unit));

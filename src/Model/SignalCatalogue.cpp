@@ -5,6 +5,7 @@
 #include "Platform/StringFormat.h"
 #include "Platform/TelephonyIdentifiers.h"
 
+#include <algorithm>
 #include <cmath>
 #include <iterator>
 
@@ -61,9 +62,10 @@ constexpr SignalCatalogue::Entry kCatalogue[] = {
     {UTRAN, "/Link Quality/CCTRCH SIR/*/SIR/*", nullptr, "SIR", kQuality, "dB", 1, 0},
     {UTRAN, "/Link Quality/TRCH BLER/*/TRCH BLER Measurement", nullptr, "BLER", kErrorRate, "%", 1, 0},
 
-    // GSM/UMTS. Record 0x5137's received level is RxLev (0..63, -110 dBm and up in 1 dB
-    // steps), shown as "RSSI ... dBm" in the serving cell and bare in the neighbours; the
-    // cell monitor fills the same neighbour list in dBm, taken back to RxLev by + 110.
+    // GSM/UMTS. Record 0x5137's received level is RxLev (0..63: 0 below -110 dBm, n for
+    // n - 111 <= dBm < n - 110, 63 from -48 dBm), shown as "RSSI ... dBm" in the serving cell
+    // and bare in the neighbours; the cell monitor fills the same neighbour list in dBm,
+    // taken back to RxLev by + 111 (and held to 0..63).
     // UMTS RSCP (RSSI + Ec/Io) is a power whichever unit word it shows.
     {GSM, "/Serving Cell/GSM Serving Cell/RSSI", nullptr, "RxLev", kLevel, "", 1, 0},
     {GSM, "/Serving Cell/GSM Serving Cell/C1 Value", nullptr, "C1", kMargin, "dB", 1, 0},
@@ -74,7 +76,7 @@ constexpr SignalCatalogue::Entry kCatalogue[] = {
     {GSM, "/Cell Sets/*/*/Rank Cell RSCP", nullptr, "ranking RSCP", kPower, "dBm", 1, 0},
     {GSM, "/Cell Sets/*/*/Energy Per Chip", nullptr, "Ec/Io", kQuality, "dB", 1, 0},
     {GSM, "/Cell Sets/*/*/RSSI", nullptr, "RSSI", kPower, "dBm", 1, 0},
-    {GSM, "/GSM Neighbours/Neighboring Cells/*/RSSI", "dBm", "RxLev", kLevel, "", 1, 110},
+    {GSM, "/GSM Neighbours/Neighboring Cells/*/RSSI", "dBm", "RxLev", kLevel, "", 1, 111},
     {GSM, "/GSM Neighbours/Neighboring Cells/*/RSSI", nullptr, "RxLev", kLevel, "", 1, 0},
     {GSM, "/GSM Neighbours/Neighboring Cells/*/C1 Value", nullptr, "C1", kMargin, "dB", 1, 0},
     {GSM, "/Link Quality/BLER/Transport Channels/*/BLER %", nullptr, "BLER", kErrorRate, "%", 1, 0},
@@ -122,7 +124,8 @@ bool matches(const std::vector<std::string>& pattern, const std::vector<std::str
 }  // namespace
 
 double SignalQuantity::convert(double shown) const {
-    const double value = shown * scale + offset;
+    double value = shown * scale + offset;
+    if (quantity == kLevel) value = std::clamp(value, 0.0, 63.0);  // RxLev has no other values
     return scale == 1 ? value : std::round(value * 1000) / 1000;
 }
 

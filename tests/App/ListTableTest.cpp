@@ -156,6 +156,9 @@ TEST(ListTableModel, ASignalColumnHeaderCarriesTheCataloguesUnit) {
         {"/GSM Neighbours/Neighboring Cells", "RSSI", "23", "RSSI (level)"},
         {"/Cell Sets/Active Set", "RSCP", "-81 dB", "RSCP (dBm)"},
         {"/Neighbours/Neighbor Cells List", "Frequency Offset", "270", "Frequency Offset"},
+        // Converted for the plot, shown as they are here: no unit their cells are not in.
+        {"/GSM Neighbours/Neighboring Cells", "RSSI", "-70 dBm", "RSSI"},
+        {"/Neighbours/Neighbor Cell List", "Filter RSCP", "0.183594", "Filter RSCP"},
         {"", "Srxlev", "22 dBm", "Srxlev"},  // a list whose path is not known
     };
     for (const auto& row : rows) {

@@ -78,7 +78,8 @@ TEST(SignalSampler, TakesUnitsAndScalesFromTheCatalogueNotFromTheDisplayStrings)
         {gsm, "/Serving Cell/GSM Serving Cell/RSSI", "", "36 dBm", 36, "level", "(level)"},
         {gsm, "/Cell Sets/Active Set/0/RSCP", "", "-81 dB", -81, "dBm", "(dBm)"},
         {gsm, "/GSM Neighbours/Neighboring Cells/0/RSSI", "", "23", 23, "level", "(level)"},
-        {gsm, "/GSM Neighbours/Neighboring Cells/0/RSSI", "", "-70 dBm", 40, "level", "(level)"},  // the cell monitor's form
+        {gsm, "/GSM Neighbours/Neighboring Cells/0/RSSI", "", "-70 dBm", 41, "level", "(level)"},  // the cell monitor's form
+        {gsm, "/GSM Neighbours/Neighboring Cells/0/RSSI", "", "-115 dBm", 0, "level", "(level)"},  // below RxLev 1
         {kTSLogChannelTechnology_Morvek_UTRAN2, "/Neighbours/Neighbor Cell List/[Status=ASET]/Filter RSCP",
          "/Neighbours/Neighbor Cell List/0/Filter RSCP", "0.183594", -69, "dBm", "(dBm)"},
         {kTSLogChannelTechnology_Morvek_CDMA, "/Data Rates/Forward Link", "", "153.60 kbps", 153.6, "kbit/s", "(kbit/s)"},
