@@ -40,7 +40,15 @@ double dBm(const std::string& text) {
 std::map<std::string, std::string> rows(const DictionaryRef& display, const char* list, const char* level) {
     std::map<std::string, std::string> out;
     Value v(display);
-    for (const char* key : {"2;Neighbours", list}) v = *v.asDictionary()->find(key);
+    for (const char* key : {"2;Neighbours", list}) {
+        const Value* next = v.asDictionary() ? v.asDictionary()->find(key) : nullptr;
+        if (!next) {
+            ADD_FAILURE() << "no " << key << " in the display";
+            return out;
+        }
+        v = *next;
+    }
+    if (!v.asArray()) return out;
     for (const Value& row : *v.asArray()) {
         const DictionaryRef d = row.asDictionary();
         out[sectiontest::render(d->get("Physical Cell ID"))] = level ? sectiontest::render(d->get(level)) : "";

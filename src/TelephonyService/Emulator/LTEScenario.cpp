@@ -610,7 +610,7 @@ Bytes LTEScenario::servingMeasurementRecord(uint64_t tick) {
 }
 
 Bytes LTEScenario::neighbourMeasurementRecord(uint64_t tick) const {
-    const size_t n = std::min<size_t>(measured_.size(), 32);  // 1..32 (step() sends none without neighbours)
+    const size_t n = measured_.size();  // 1..kMeasuredCells (step() sends none without neighbours)
     const Carrier& carrier = kCarriers[carrier_];
     const uint32_t rssi = clampRaw(roundedDiv(rssi_, 50) + 280, 8);  // one wideband RSSI for every cell
     RecordBuilder b = RecordBuilder::ordinary(LogCode::kLTEIdleNeighbourMeasurements, 21 + 20 * n);
